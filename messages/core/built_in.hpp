@@ -1,0 +1,101 @@
+// The rules of all messages for the built-in decoders and visitors. Only the sources of the messages include
+// this: each compiles them for its types, with one line per type, and whoever includes a message's header
+// compiles none of them.
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <span>
+#include <string>
+
+#include "messages/core/message.hpp"
+
+namespace orv {
+
+template <class M>
+BinaryDecoder::Result Message<M>::decodeMessage(BinaryDecoder& decoder) {
+  return decodeFields(decoder);
+}
+
+template <class M>
+BinaryEncoder::Result Message<M>::traverse(BinaryEncoder& visitor) const {
+  return visitFields(visitor);
+}
+
+template <class M>
+SizeCounter::Result Message<M>::traverse(SizeCounter& visitor) const {
+  return visitFields(visitor);
+}
+
+template <class M>
+HashVisitor::Result Message<M>::traverse(HashVisitor& visitor) const {
+  return visitFields(visitor);
+}
+
+template <class M>
+TextRenderer::Result Message<M>::traverse(TextRenderer& visitor) const {
+  return visitFields(visitor);
+}
+
+template <class M>
+void Message<M>::hash(Hasher& into) const {
+  HashVisitor visitor(into);
+  (void)traverse(visitor);
+}
+
+template <class M>
+std::uint64_t Message<M>::hashValue() const {
+  Hasher hasher;
+  hash(hasher);
+  return hasher.finish();
+}
+
+template <class M>
+std::string Message<M>::debugDescription() const {
+  std::string text;
+  TextRenderer renderer(text, _protobuf_nameMap());
+  (void)traverse(renderer);
+  return text;
+}
+
+template <class M>
+std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes) {
+  std::expected<M, DecodeError> message;
+  if (auto merged = message->merge(bytes); !merged) message = std::unexpected(merged.error());
+  return message;
+}
+
+template <class M>
+std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
+  BinaryDecoder decoder(bytes);
+  return decodeMessage(decoder);
+}
+
+template <class M>
+std::expected<std::string, EncodeError> Message<M>::serialize() const {
+  // Most messages fit here, and then their string is allocated once, at its final size.
+  std::array<std::byte, 1024> buffer;
+  BinaryEncoder encoder{std::span(buffer)};
+  if (traverse(encoder)) return std::string(reinterpret_cast<const char*>(buffer.data()), encoder.finish());
+  std::string bytes;
+  BinaryEncoder growing(bytes);
+  if (auto walked = traverse(growing); !walked) return std::unexpected(walked.error());
+  growing.finish();
+  return bytes;
+}
+
+template <class M>
+std::expected<std::size_t, EncodeError> Message<M>::serializeInto(std::span<std::byte> buffer) const {
+  BinaryEncoder encoder(buffer);
+  if (auto walked = traverse(encoder); !walked) return std::unexpected(walked.error());
+  return encoder.finish();
+}
+
+template <class M>
+std::size_t Message<M>::encodedSize() const {
+  SizeCounter counter;
+  (void)traverse(counter);
+  return counter.size();
+}
+
+}  // namespace orv

@@ -1,0 +1,13 @@
+#include "messages/group/group.hpp"
+
+#include "messages/core/built_in.hpp"
+
+namespace orv {
+
+template class Message<Group>;
+template class Message<Group::Initialization>;
+template class Message<Group::MemberAdded>;
+template class Message<Group::MemberRemoved>;
+template class Message<Group::MemberLeft>;
+
+}  // namespace orv

@@ -1,0 +1,80 @@
+#include "runtime/canonical.hpp"
+
+#include <utf8proc.h>
+
+#include <algorithm>
+#include <array>
+#include <cstddef>
+
+#include "runtime/utf8.hpp"
+
+namespace orv {
+
+namespace {
+
+utf8proc_propval_t combiningClass(char32_t codePoint) {
+  return utf8proc_get_property(static_cast<utf8proc_int32_t>(codePoint))->combining_class;
+}
+
+// The longest canonical decomposition of one code point has four (U+1F82, for one); utf8proc says if it needs
+// more.
+void appendDecomposition(char32_t codePoint, std::vector<char32_t>& output) {
+  std::array<utf8proc_int32_t, 8> parts{};
+  int boundClass = 0;
+  const utf8proc_ssize_t count = utf8proc_decompose_char(
+      static_cast<utf8proc_int32_t>(codePoint), parts.data(), parts.size(),
+      static_cast<utf8proc_option_t>(UTF8PROC_STABLE | UTF8PROC_DECOMPOSE), &boundClass);
+  const auto kept = static_cast<std::size_t>(std::clamp<utf8proc_ssize_t>(count, 0, parts.size()));
+  for (std::size_t at = 0; at < kept; ++at) output.push_back(static_cast<char32_t>(parts[at]));
+}
+
+// The canonical ordering of D108 and D109: inside each run of marks, by combining class, equal classes in
+// place. A stable sort rather than the usual exchange of neighbours, which takes quadratic time on a long
+// run.
+void orderMarks(std::vector<char32_t>& codePoints) {
+  const auto isMark = [](char32_t codePoint) { return codePoint >= 0x300 && combiningClass(codePoint) != 0; };
+  const auto byClass = [](char32_t left, char32_t right) {
+    return combiningClass(left) < combiningClass(right);
+  };
+  for (auto run = codePoints.begin();;) {
+    run = std::find_if(run, codePoints.end(), isMark);
+    if (run == codePoints.end()) return;
+    const auto runEnd = std::find_if_not(run, codePoints.end(), isMark);
+    if (!std::is_sorted(run, runEnd, byClass)) std::stable_sort(run, runEnd, byClass);
+    run = runEnd;
+  }
+}
+
+}  // namespace
+
+std::vector<char32_t> canonicalDecomposition(std::string_view utf8) {
+  std::vector<char32_t> output;
+  output.reserve(utf8.size());
+  while (!utf8.empty()) {
+    const utf8::Step next = utf8::step(utf8);
+    utf8.remove_prefix(next.length);
+    // No code point below U+00C0 decomposes.
+    if (next.codePoint < 0xC0) {
+      output.push_back(next.codePoint);
+    } else {
+      appendDecomposition(next.codePoint, output);
+    }
+  }
+  orderMarks(output);
+  return output;
+}
+
+bool areCanonicallyEquivalent(std::string_view left, std::string_view right) {
+  // What both share up to an ASCII character may be left out: no mark is ordered across it and nothing
+  // composes with what stands before it.
+  std::size_t shared = static_cast<std::size_t>(
+      std::mismatch(left.begin(), left.end(), right.begin(), right.end()).first - left.begin());
+  while (shared > 0 && static_cast<unsigned char>(left[shared - 1]) >= 0x80) --shared;
+  if (shared > 0) --shared;
+  left.remove_prefix(shared);
+  right.remove_prefix(shared);
+  if (utf8::isAscii(left) && utf8::isAscii(right)) return left == right;
+  return canonicalDecomposition(left) == canonicalDecomposition(right);
+}
+
+}  // namespace orv

@@ -1,0 +1,16 @@
+// Canonical equivalence of texts (Unicode 15.0, D70): their canonical decompositions are the same.
+#pragma once
+
+#include <string_view>
+#include <vector>
+
+namespace orv {
+
+// The canonical decomposition (NFD) of well-formed UTF-8, as code points. Time and memory are near-linear in
+// the length for any input, long runs of combining marks included.
+std::vector<char32_t> canonicalDecomposition(std::string_view utf8);
+
+// Both are well-formed UTF-8.
+bool areCanonicallyEquivalent(std::string_view left, std::string_view right);
+
+}  // namespace orv

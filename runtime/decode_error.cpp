@@ -1,0 +1,76 @@
+#include "runtime/decode_error.hpp"
+
+#include <algorithm>
+
+namespace orv {
+
+namespace {
+
+// In the order of DecodeCause.
+constexpr std::array<std::string_view, 13> sentences{
+    "the input ends inside a record",
+    "length runs past the end",
+    "length of 2^31 or more, or spelled in more than five bytes",
+    "tag of more than five bytes or above 2^32-1",
+    "field number 0",
+    "reserved wire type",
+    "varint of more than ten bytes",
+    "end of a group that was not begun",
+    "end of a group with another number than its start",
+    "group without its end",
+    "ill-formed UTF-8",
+    "messages and groups nested deeper than 100",
+    "a second member of a oneof was refused",
+};
+static_assert(sentences.size() == static_cast<std::size_t>(DecodeCause::conflictingOneOf) + 1);
+
+}  // namespace
+
+std::string_view describe(DecodeCause cause) { return sentences[static_cast<std::size_t>(cause)]; }
+
+void FieldPath::prepend(const MessageFacts& message, std::uint32_t fieldNumber) {
+  if (size_ == capacity) {
+    ++omitted_;
+    --size_;
+  }
+  std::copy_backward(steps_.begin(), steps_.begin() + static_cast<std::ptrdiff_t>(size_),
+                     steps_.begin() + static_cast<std::ptrdiff_t>(size_) + 1);
+  steps_.front() = {&message, fieldNumber};
+  ++size_;
+}
+
+std::string FieldPath::text() const {
+  std::string text;
+  for (std::size_t at = 0; at < size_; ++at) {
+    const auto& [message, number] = steps_[at];
+    if (at == 0) text = message->fullName;
+    if (number == 0) break;
+    text += '.';
+    if (const auto name = message->fieldNames.name(number)) {
+      text += *name;
+    } else {
+      text += std::to_string(number);
+    }
+  }
+  if (omitted_ != 0) text += ".(" + std::to_string(omitted_) + " deeper)";
+  return text;
+}
+
+std::string DecodeError::reason() const {
+  switch (cause) {
+    case DecodeCause::lengthOverrun:
+      return "length " + std::to_string(length) + " runs " + std::to_string(detail) +
+             (detail == 1 ? " byte" : " bytes") + " past the end";
+    case DecodeCause::illFormedText:
+      return "ill-formed UTF-8 at byte " + std::to_string(detail) + " of a text of " + std::to_string(length);
+    default: return std::string(describe(cause));
+  }
+}
+
+std::string DecodeError::message() const {
+  std::string text = path.text();
+  if (!text.empty()) text += ": ";
+  return text + reason() + ", at byte " + std::to_string(offset);
+}
+
+}  // namespace orv

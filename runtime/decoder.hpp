@@ -1,0 +1,79 @@
+// What a message is read from.
+#pragma once
+
+#include <concepts>
+#include <cstdint>
+#include <expected>
+#include <optional>
+#include <vector>
+
+#include "runtime/byte_buffer.hpp"
+#include "runtime/text.hpp"
+#include "runtime/unknown_storage.hpp"
+
+namespace orv {
+
+// What every read of a decoder answers: nothing, or the decoder's own error.
+template <class D>
+using DecodeResult = std::expected<void, typename D::Error>;
+
+// A source of fields, for a message's decodeMessage. BinaryDecoder is one; anyone can write another, with an
+// error type of its own, which reaches decodeMessage's caller as it was made. A decoder has
+//
+//   using Error = …;
+//
+//   // The number of the next field of `message`, or none at the end. A field that nobody took since the last
+//   call is
+//   // the decoder's to keep, in message.mutableUnknownFields().
+//   template <class M> std::expected<std::optional<std::uint32_t>, Error> nextFieldNumber(M& message);
+//
+//   // Each reads the field whose number was given last. The plain form writes the value; the other makes the
+//   field
+//   // present with it. A failed read leaves the old value.
+//   DecodeResult decodeSingularStringField(Text&), decodeSingularStringField(std::optional<Text>&)
+//   DecodeResult decodeSingularBytesField(ByteBuffer&), decodeSingularBytesField(std::optional<ByteBuffer>&)
+//   DecodeResult decodeSingularBoolField(bool&), decodeSingularBoolField(std::optional<bool>&)
+//   DecodeResult decodeSingularUInt32Field(std::optional<std::uint32_t>&)
+//   DecodeResult decodeRepeatedStringField(std::vector<Text>&)            appends
+//   template <class E> DecodeResult decodeSingularEnumField(std::optional<E>&)
+//   template <class M> DecodeResult decodeSingularMessageField(std::optional<M>&)
+//                                      into a new default message when absent, merging into the one held when
+//                                      present
+//   template <class M> DecodeResult decodeRepeatedMessageField(std::vector<M>&)      appends
+//
+//   // Asked when a oneof member was read while the group already holds a case; an error refuses it.
+//   DecodeResult handleConflictingOneOf();
+//
+// What reads a field need not take it: a field of the wrong wire type is left for the unknown fields.
+template <class D>
+concept Decoder = requires(D& decoder, Text& text, std::optional<Text>& optionalText,
+                           std::vector<Text>& texts, ByteBuffer& bytes,
+                           std::optional<ByteBuffer>& optionalBytes, bool& flag,
+                           std::optional<bool>& optionalFlag, std::optional<std::uint32_t>& optionalNumber) {
+  typename D::Error;
+  { decoder.decodeSingularStringField(text) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularStringField(optionalText) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularBytesField(bytes) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularBytesField(optionalBytes) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularBoolField(flag) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularBoolField(optionalFlag) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularUInt32Field(optionalNumber) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeRepeatedStringField(texts) } -> std::same_as<DecodeResult<D>>;
+  { decoder.handleConflictingOneOf() } -> std::same_as<DecodeResult<D>>;
+};
+
+// A decoder that can look at its input twice. The rules then merge a repeated oneof member in place, where
+// they copy the payload for other decoders: with many repeats that is the difference between linear and
+// quadratic time.
+//
+//   // Whether the field could be read into a message that is there already, which is not touched. Takes
+//   nothing. template <class M> std::expected<bool, Error> canMergeMessageField();      false when the field
+//   would not be taken
+//
+//   // Reads the field into `message`: a new default message, or one that canMergeMessageField was asked for.
+//   // May leave part of it there when it fails. Answers whether it took the field.
+//   template <class M> std::expected<bool, Error> mergeMessageField(M& message);
+template <class D>
+concept RereadingDecoder = Decoder<D> && D::canReread;
+
+}  // namespace orv

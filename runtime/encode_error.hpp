@@ -1,0 +1,20 @@
+// Why a message could not be encoded.
+#pragma once
+
+#include <cstdint>
+#include <string_view>
+
+namespace orv {
+
+enum class EncodeError : std::uint8_t {
+  bufferTooSmall,  // the caller's buffer cannot hold the encoding
+  tooLarge,        // the encoding would have more than 2^31-1 bytes, the most that the format allows
+};
+
+// A sentence without its full stop. It lasts as long as the program.
+constexpr std::string_view describe(EncodeError error) {
+  return error == EncodeError::bufferTooSmall ? "the buffer is too small for the encoding"
+                                              : "the encoding would have more than 2^31-1 bytes";
+}
+
+}  // namespace orv

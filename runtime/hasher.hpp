@@ -1,0 +1,27 @@
+// Collects what a value is made of into one number.
+#pragma once
+
+#include <cstdint>
+#include <string_view>
+
+namespace orv {
+
+// Feeds bytes and numbers to XXH3 (xxhash.com), each step seeded with the result of the one before. Results
+// hold inside one process only: they are neither stored nor sent. A seed of one's own makes them hard to
+// predict.
+class Hasher {
+ public:
+  constexpr Hasher() = default;
+  constexpr explicit Hasher(std::uint64_t seed) : state_(seed) {}
+
+  void combine(std::uint64_t value);
+  // The length counts too: "a", "b" and "ab", "" differ.
+  void combine(std::string_view bytes);
+
+  std::uint64_t finish() const { return state_; }
+
+ private:
+  std::uint64_t state_ = 0;
+};
+
+}  // namespace orv

@@ -1,0 +1,66 @@
+#include "runtime/inline_bytes.hpp"
+
+#include <algorithm>
+#include <new>
+
+namespace orv {
+
+namespace {
+
+char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size)); }
+
+}  // namespace
+
+void InlineBytes::assign(std::string_view bytes) {
+  if (isOnHeap()) {
+    Block block = heapBlock();
+    if (bytes.size() <= block.capacity) {
+      std::memmove(block.data, bytes.data(), bytes.size());
+      block.size = bytes.size();
+      holdBlock(block);
+      return;
+    }
+  } else if (bytes.size() <= inlineCapacity) {
+    std::memmove(raw_, bytes.data(), bytes.size());
+    raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
+    return;
+  }
+  const Block block{allocate(bytes.size()), bytes.size(), bytes.size()};
+  std::memcpy(block.data, bytes.data(), bytes.size());
+  if (isOnHeap()) freeBlock();
+  holdBlock(block);
+}
+
+void InlineBytes::append(std::string_view bytes) {
+  const std::string_view old = view();
+  const std::size_t size = old.size() + bytes.size();
+  if (!isOnHeap() && size <= inlineCapacity) {
+    std::memmove(raw_ + old.size(), bytes.data(), bytes.size());
+    raw_[tagOffset] = static_cast<unsigned char>(size);
+    return;
+  }
+  if (isOnHeap() && size <= heapBlock().capacity) {
+    Block block = heapBlock();
+    std::memmove(block.data + old.size(), bytes.data(), bytes.size());
+    block.size = size;
+    holdBlock(block);
+    return;
+  }
+  const std::size_t capacity = std::max(size, 2 * old.size());
+  const Block block{allocate(capacity), size, capacity};
+  std::memcpy(block.data, old.data(), old.size());
+  std::memcpy(block.data + old.size(), bytes.data(), bytes.size());
+  if (isOnHeap()) freeBlock();
+  holdBlock(block);
+}
+
+void InlineBytes::replaceByOwnBlock() {
+  const Block shared = heapBlock();
+  const Block own{allocate(shared.size), shared.size, shared.size};
+  std::memcpy(own.data, shared.data, shared.size);
+  holdBlock(own);
+}
+
+void InlineBytes::freeBlock() noexcept { ::operator delete(heapBlock().data); }
+
+}  // namespace orv

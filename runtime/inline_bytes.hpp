@@ -1,0 +1,110 @@
+// The storage that texts and byte buffers share.
+#pragma once
+
+#include <cstddef>
+#include <cstring>
+#include <string_view>
+#include <type_traits>
+
+namespace orv {
+
+// Owned bytes. Up to 39 of them live inside the object, which covers a 36-character identifier, a 16-byte
+// UUID and a typical handle without an allocation; longer contents live in one heap block of their own.
+// docs/decisions/inline-bytes.md weighs the size.
+class InlineBytes {
+ public:
+  static constexpr std::size_t inlineCapacity = 39;
+  static constexpr std::size_t objectSize = 40;
+
+  constexpr InlineBytes() noexcept {
+    if (std::is_constant_evaluated()) {
+      for (unsigned char& byte : raw_) byte = 0;
+    }
+    raw_[tagOffset] = 0;
+  }
+  InlineBytes(const InlineBytes& other) {
+    std::memcpy(raw_, other.raw_, objectSize);
+    if (isOnHeap()) [[unlikely]]
+      replaceByOwnBlock();
+  }
+  InlineBytes(InlineBytes&& other) noexcept {
+    std::memcpy(raw_, other.raw_, objectSize);
+    other.raw_[tagOffset] = 0;
+  }
+  InlineBytes& operator=(const InlineBytes& other) {
+    if (isOnHeap() || other.isOnHeap()) {
+      if (this != &other) assign(other.view());
+    } else {
+      std::memmove(raw_, other.raw_, objectSize);
+    }
+    return *this;
+  }
+  InlineBytes& operator=(InlineBytes&& other) noexcept {
+    if (this != &other) {
+      if (isOnHeap()) freeBlock();
+      std::memcpy(raw_, other.raw_, objectSize);
+      other.raw_[tagOffset] = 0;
+    }
+    return *this;
+  }
+  constexpr ~InlineBytes() {
+    if (isOnHeap()) [[unlikely]]
+      freeBlock();
+  }
+
+  // Valid until the object changes or goes.
+  std::string_view view() const {
+    if (isOnHeap()) [[unlikely]] {
+      const Block block = heapBlock();
+      return {block.data, block.size};
+    }
+    return {reinterpret_cast<const char*>(raw_), raw_[tagOffset]};
+  }
+  std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
+
+  // Whether the bytes live outside the object. If not, all objectSize bytes from view().data() on may be
+  // read.
+  constexpr bool isOnHeap() const { return raw_[tagOffset] == heapTag; }
+
+  // The bytes may be part of this object's own contents.
+  void assign(std::string_view bytes);
+  void append(std::string_view bytes);
+
+  // As assign, for bytes that are not this object's own, where `readable` bytes may be read from their start
+  // on: short contents are then copied in one fixed-size step, whatever their length.
+  void assignReadable(std::string_view bytes, std::size_t readable) {
+    if (bytes.size() <= inlineCapacity && readable >= objectSize && !isOnHeap()) [[likely]] {
+      std::memcpy(raw_, bytes.data(), objectSize);
+      raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
+    } else {
+      assign(bytes);
+    }
+  }
+
+ private:
+  static constexpr std::size_t tagOffset = objectSize - 1;
+  static constexpr unsigned char heapTag = 0xFF;
+
+  struct Block {
+    char* data;
+    std::size_t size;
+    std::size_t capacity;
+  };
+
+  Block heapBlock() const {
+    Block block;
+    std::memcpy(&block, raw_, sizeof block);
+    return block;
+  }
+  void holdBlock(const Block& block) {
+    std::memcpy(raw_, &block, sizeof block);
+    raw_[tagOffset] = heapTag;
+  }
+  void replaceByOwnBlock();
+  void freeBlock() noexcept;
+
+  // The bytes and, in the last place, their number; or a Block and, in the last place, heapTag.
+  alignas(Block) unsigned char raw_[objectSize];
+};
+
+}  // namespace orv

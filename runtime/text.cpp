@@ -1,0 +1,46 @@
+#include "runtime/text.hpp"
+
+#include <vector>
+
+#include "runtime/canonical.hpp"
+#include "runtime/utf8.hpp"
+
+namespace orv {
+
+Text::Text(std::string_view utf8) {
+  constexpr std::string_view replacement = "\xEF\xBF\xBD";
+  while (!utf8.empty()) {
+    const std::size_t wellFormed = utf8::wellFormedPrefix(utf8);
+    bytes_.append(utf8.substr(0, wellFormed));
+    utf8.remove_prefix(wellFormed);
+    if (utf8.empty()) break;
+    bytes_.append(replacement);
+    utf8.remove_prefix(utf8::step(utf8).length);
+  }
+}
+
+std::expected<Text, IllFormedText> Text::checked(std::string_view utf8) {
+  const std::size_t wellFormed = utf8::wellFormedPrefix(utf8);
+  if (wellFormed != utf8.size()) return std::unexpected(IllFormedText{wellFormed});
+  Text text;
+  text.bytes_.assign(utf8);
+  return text;
+}
+
+void Text::hash(Hasher& into) const {
+  const std::string_view bytes = utf8();
+  if (utf8::isAscii(bytes)) {
+    into.combine(bytes);
+    return;
+  }
+  // Texts that are equal have one decomposition, and an ASCII text is its own: fed as UTF-8, all hash alike.
+  std::string decomposed;
+  for (const char32_t codePoint : canonicalDecomposition(bytes)) utf8::append(codePoint, decomposed);
+  into.combine(std::string_view(decomposed));
+}
+
+bool Text::isCanonicallyEqual(std::string_view left, std::string_view right) {
+  return areCanonicallyEquivalent(left, right);
+}
+
+}  // namespace orv

@@ -1,0 +1,128 @@
+#include "runtime/text_renderer.hpp"
+
+#include <array>
+#include <charconv>
+
+namespace orv {
+
+namespace {
+
+// What the official printer allows (its kUnknownFieldRecursionLimit).
+constexpr int unknownLevels = 10;
+
+template <class Number>
+std::string hexadecimal(Number value) {
+  std::string digits(2 * sizeof value, '0');
+  for (std::size_t at = digits.size(); at-- > 0; value >>= 4) digits[at] = "0123456789abcdef"[value & 0xF];
+  return "0x" + digits;
+}
+
+}  // namespace
+
+std::string TextRenderer::fieldName(std::uint32_t number) const {
+  const auto name = names_.name(number);
+  return name ? std::string(*name) : std::to_string(number);
+}
+
+void TextRenderer::startLine(std::string_view name) {
+  output_.append(indentation_, ' ');
+  output_ += name;
+}
+
+void TextRenderer::open(std::string_view name) {
+  startLine(name);
+  output_ += " {\n";
+  indentation_ += 2;
+}
+
+void TextRenderer::close() {
+  indentation_ -= 2;
+  startLine("}\n");
+}
+
+TextRenderer::Result TextRenderer::plain(std::uint32_t number, std::string_view value) {
+  startLine(fieldName(number));
+  output_ += ": ";
+  output_ += value;
+  output_ += '\n';
+  return {};
+}
+
+TextRenderer::Result TextRenderer::quoted(std::uint32_t number, std::string_view bytes) {
+  startLine(fieldName(number));
+  output_ += ": ";
+  appendQuoted(bytes);
+  output_ += '\n';
+  return {};
+}
+
+// Printable ASCII as it is, the rest as C escapes: by name where C has one, else in three octal digits.
+void TextRenderer::appendQuoted(std::string_view bytes) {
+  output_ += '"';
+  for (const char character : bytes) {
+    const auto byte = static_cast<unsigned char>(character);
+    switch (character) {
+      case '\n': output_ += "\\n"; break;
+      case '\r': output_ += "\\r"; break;
+      case '\t': output_ += "\\t"; break;
+      case '"': output_ += "\\\""; break;
+      case '\'': output_ += "\\'"; break;
+      case '\\': output_ += "\\\\"; break;
+      default:
+        if (byte >= 0x20 && byte < 0x7F) {
+          output_ += character;
+        } else {
+          output_ += '\\';
+          output_ += static_cast<char>('0' + (byte >> 6));
+          output_ += static_cast<char>('0' + ((byte >> 3) & 7));
+          output_ += static_cast<char>('0' + (byte & 7));
+        }
+    }
+  }
+  output_ += '"';
+}
+
+TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
+  for (const UnknownField& field : unknownFields) renderUnknown(field, unknownLevels);
+  return {};
+}
+
+void TextRenderer::renderUnknown(const UnknownField& field, int levelsLeft) {
+  const std::uint32_t number = field.tag.fieldNumber();
+  // What is kept is well-formed.
+  WireReader reader(field.value);
+  switch (field.tag.wireType()) {
+    case WireType::varint: (void)plain(number, std::to_string(*reader.readVarint())); break;
+    case WireType::fixed32: (void)plain(number, hexadecimal(*reader.readFixed32())); break;
+    case WireType::fixed64: (void)plain(number, hexadecimal(*reader.readFixed64())); break;
+    case WireType::lengthDelimited:
+      renderUnknownLengthDelimited(number, *reader.readLengthDelimited(), levelsLeft);
+      break;
+    case WireType::startGroup: renderUnknownGroup(number, field.value, levelsLeft); break;
+    case WireType::endGroup: break;
+  }
+}
+
+void TextRenderer::renderUnknownLengthDelimited(std::uint32_t number, std::span<const std::byte> body,
+                                                int levelsLeft) {
+  if (!body.empty() && levelsLeft > 0) {
+    if (const auto fields = UnknownStorage::checked(body)) {
+      open(std::to_string(number));
+      for (const UnknownField& field : *fields) renderUnknown(field, levelsLeft - 1);
+      close();
+      return;
+    }
+  }
+  (void)quoted(number, {reinterpret_cast<const char*>(body.data()), body.size()});
+}
+
+// The body ends with an end-group tag of its own.
+void TextRenderer::renderUnknownGroup(std::uint32_t number, std::span<const std::byte> body, int levelsLeft) {
+  open(std::to_string(number));
+  for (auto field = UnknownStorage::Iterator(body); field->tag.wireType() != WireType::endGroup; ++field) {
+    renderUnknown(*field, levelsLeft - 1);
+  }
+  close();
+}
+
+}  // namespace orv

@@ -1,0 +1,86 @@
+// Renders messages as text.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "runtime/byte_buffer.hpp"
+#include "runtime/name_map.hpp"
+#include "runtime/text.hpp"
+#include "runtime/unknown_storage.hpp"
+#include "runtime/visitor.hpp"
+
+namespace orv {
+
+// A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format Language
+// Specification"), a field a line. Unknown fields are written by number; one that is length-delimited and
+// reads as a sequence of records is shown as a message, as the official printer does, to ten levels.
+class TextRenderer {
+ public:
+  using Error = NeverFails;
+  using Result = std::expected<void, NeverFails>;
+
+  // Appends to `output`. The names are those of the message that is to be walked.
+  TextRenderer(std::string& output, NameMap names) : output_(output), names_(names) {}
+
+  Result visitSingularStringField(const Text& value, std::uint32_t number) {
+    return quoted(number, value.utf8());
+  }
+  Result visitSingularBytesField(const ByteBuffer& value, std::uint32_t number) {
+    return quoted(number, value.characters());
+  }
+  Result visitSingularBoolField(bool value, std::uint32_t number) {
+    return plain(number, value ? "true" : "false");
+  }
+  Result visitSingularUInt32Field(std::uint32_t value, std::uint32_t number) {
+    return plain(number, std::to_string(value));
+  }
+  // By name, or by number where the raw value has none.
+  template <class Enumeration>
+  Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
+    const auto name = Enumeration::_protobuf_nameMap().name(value.rawValue());
+    return plain(number, name ? std::string(*name) : std::to_string(value.rawValue()));
+  }
+  template <class M>
+  Result visitSingularMessageField(const M& message, std::uint32_t number) {
+    open(fieldName(number));
+    const NameMap outer = names_;
+    names_ = M::_protobuf_nameMap();
+    (void)message.traverse(*this);
+    names_ = outer;
+    close();
+    return {};
+  }
+  Result visitRepeatedStringField(const std::vector<Text>& texts, std::uint32_t number) {
+    for (const Text& text : texts) (void)visitSingularStringField(text, number);
+    return {};
+  }
+  template <class M>
+  Result visitRepeatedMessageField(const std::vector<M>& messages, std::uint32_t number) {
+    for (const M& message : messages) (void)visitSingularMessageField(message, number);
+    return {};
+  }
+  Result visitUnknownFields(const UnknownStorage& unknownFields);
+
+ private:
+  std::string fieldName(std::uint32_t number) const;
+  void startLine(std::string_view name);
+  void open(std::string_view name);
+  void close();
+  Result plain(std::uint32_t number, std::string_view value);
+  Result quoted(std::uint32_t number, std::string_view bytes);
+  void appendQuoted(std::string_view bytes);
+  void renderUnknown(const UnknownField& field, int levelsLeft);
+  void renderUnknownLengthDelimited(std::uint32_t number, std::span<const std::byte> body, int levelsLeft);
+  void renderUnknownGroup(std::uint32_t number, std::span<const std::byte> body, int levelsLeft);
+
+  std::string& output_;
+  NameMap names_;
+  std::size_t indentation_ = 0;
+};
+
+}  // namespace orv

@@ -1,0 +1,67 @@
+#include "runtime/unknown_storage.hpp"
+
+#include <algorithm>
+#include <cstring>
+#include <new>
+
+namespace orv {
+
+std::expected<UnknownStorage, DecodeError> UnknownStorage::checked(std::span<const std::byte> records) {
+  WireReader reader(records);
+  const auto error = [&](const WireFault& fault) {
+    return std::unexpected(DecodeError{.cause = fault.cause,
+                                       .offset = static_cast<std::size_t>(fault.at - records.data()),
+                                       .length = fault.length,
+                                       .detail = fault.detail,
+                                       .path = {}});
+  };
+  while (!reader.isAtEnd()) {
+    const auto tag = reader.readTag();
+    if (!tag) return error(tag.error());
+    if (const auto skipped = reader.skipValue(*tag, 0); !skipped) return error(skipped.error());
+  }
+  UnknownStorage storage;
+  storage.append(records);
+  return storage;
+}
+
+void UnknownStorage::append(std::span<const std::byte> records) {
+  if (records.empty()) return;
+  const std::size_t oldSize = this->records().size();
+  const std::size_t size = oldSize + records.size();
+  if (!isEmpty() && size <= block_->capacity) {
+    std::memcpy(bytes() + oldSize, records.data(), records.size());
+    block_->size = size;
+    return;
+  }
+  // A first record is stored exactly; a store that grows grows by half.
+  const std::size_t capacity = std::max(size, oldSize + oldSize / 2);
+  auto* const larger = static_cast<Block*>(::operator new(sizeof(Block) + capacity));
+  *larger = {size, capacity};
+  auto* const target = reinterpret_cast<std::byte*>(larger + 1);
+  if (!isEmpty()) std::memcpy(target, bytes(), oldSize);
+  std::memcpy(target + oldSize, records.data(), records.size());
+  freeBlock();
+  block_ = larger;
+}
+
+bool UnknownStorage::hasSameRecords(const UnknownStorage& other) const {
+  return std::ranges::equal(records(), other.records());
+}
+
+void UnknownStorage::freeBlock() noexcept { ::operator delete(block_); }
+
+UnknownStorage::Iterator& UnknownStorage::Iterator::operator++() {
+  isAtEnd_ = reader_.isAtEnd();
+  if (isAtEnd_) return *this;
+  const std::byte* const start = reader_.position();
+  // A store holds well-formed records only.
+  field_.tag = *reader_.readTag();
+  const std::byte* const value = reader_.position();
+  [[maybe_unused]] const auto skipped = reader_.skipValue(field_.tag, 0);
+  field_.record = std::span(start, reader_.position());
+  field_.value = std::span(value, reader_.position());
+  return *this;
+}
+
+}  // namespace orv

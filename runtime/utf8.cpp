@@ -1,0 +1,54 @@
+#include "runtime/utf8.hpp"
+
+namespace orv::utf8 {
+
+Step step(std::string_view text) {
+  const auto byteAt = [&](std::size_t at) { return static_cast<unsigned char>(text[at]); };
+  const unsigned char lead = byteAt(0);
+  if (lead < 0x80) return {lead, 1, true};
+
+  // Table 3-7: the lead byte gives the length, and for some leads a narrower range of the second byte, which
+  // is what keeps out overlong forms, surrogates and code points above U+10FFFF.
+  std::uint8_t length = 0;
+  unsigned char lowest = 0x80;
+  unsigned char highest = 0xBF;
+  char32_t codePoint = 0;
+  if (lead >= 0xC2 && lead <= 0xDF) {
+    length = 2;
+    codePoint = lead & 0x1F;
+  } else if (lead >= 0xE0 && lead <= 0xEF) {
+    length = 3;
+    codePoint = lead & 0x0F;
+    if (lead == 0xE0) lowest = 0xA0;
+    if (lead == 0xED) highest = 0x9F;
+  } else if (lead >= 0xF0 && lead <= 0xF4) {
+    length = 4;
+    codePoint = lead & 0x07;
+    if (lead == 0xF0) lowest = 0x90;
+    if (lead == 0xF4) highest = 0x8F;
+  } else {
+    return {0, 1, false};
+  }
+  for (std::uint8_t at = 1; at < length; ++at) {
+    if (at == text.size() || byteAt(at) < lowest || byteAt(at) > highest) return {0, at, false};
+    codePoint = (codePoint << 6) | (byteAt(at) & 0x3F);
+    lowest = 0x80;
+    highest = 0xBF;
+  }
+  return {codePoint, length, true};
+}
+
+std::size_t wellFormedPrefix(std::string_view text) {
+  std::size_t at = 0;
+  while (at < text.size()) {
+    // Runs of ASCII are passed eight bytes at a time.
+    while (text.size() - at >= 8 && isAscii(text.substr(at, 8))) at += 8;
+    if (at == text.size()) break;
+    const Step next = step(text.substr(at));
+    if (!next.isWellFormed) return at;
+    at += next.length;
+  }
+  return at;
+}
+
+}  // namespace orv::utf8

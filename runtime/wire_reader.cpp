@@ -1,0 +1,138 @@
+#include "runtime/wire_reader.hpp"
+
+#include <array>
+
+namespace orv {
+
+namespace {
+
+std::unexpected<WireFault> fault(DecodeCause cause, const std::byte* at) {
+  return std::unexpected(WireFault{cause, at});
+}
+
+}  // namespace
+
+WireResult<Tag> WireReader::readLongTag() {
+  constexpr int longestTag = 5;
+  const std::byte* at = cursor_;
+  std::uint64_t value = 0;
+  for (int index = 0; index < longestTag; ++index) {
+    if (at == limit_) return fault(DecodeCause::truncated, cursor_);
+    const auto byte = std::to_integer<std::uint64_t>(*at++);
+    value |= (byte & 0x7F) << (7 * index);
+    if (byte >= 0x80) continue;
+    if (value > 0xFFFFFFFF) break;
+    const Tag tag{static_cast<std::uint32_t>(value)};
+    if (tag.fieldNumber() == 0) return fault(DecodeCause::fieldNumberZero, cursor_);
+    cursor_ = at;
+    return tag;
+  }
+  return fault(DecodeCause::malformedTag, cursor_);
+}
+
+WireResult<std::uint64_t> WireReader::readLongVarint() {
+  constexpr int longestVarint = 10;
+  const std::byte* at = cursor_;
+  std::uint64_t value = 0;
+  for (int index = 0; index < longestVarint; ++index) {
+    if (at == limit_) return fault(DecodeCause::truncated, cursor_);
+    const auto byte = std::to_integer<std::uint64_t>(*at++);
+    value |= (byte & 0x7F) << (7 * index);
+    if (byte < 0x80) {
+      cursor_ = at;
+      return value;
+    }
+  }
+  return fault(DecodeCause::malformedVarint, cursor_);
+}
+
+WireResult<std::span<const std::byte>> WireReader::readLongLengthDelimited() {
+  constexpr int longestLength = 5;
+  constexpr std::uint64_t lengthLimit = std::uint64_t{1} << 31;
+  const std::byte* at = cursor_;
+  std::uint64_t length = 0;
+  for (int index = 0; index < longestLength; ++index) {
+    if (at == limit_) return fault(DecodeCause::truncated, cursor_);
+    const auto byte = std::to_integer<std::uint64_t>(*at++);
+    length |= (byte & 0x7F) << (7 * index);
+    if (byte >= 0x80) continue;
+    if (length >= lengthLimit) break;
+    const auto available = static_cast<std::uint64_t>(limit_ - at);
+    if (length > available) {
+      return std::unexpected(WireFault{DecodeCause::lengthOverrun, cursor_, length, length - available});
+    }
+    cursor_ = at + length;
+    return std::span(at, length);
+  }
+  return fault(DecodeCause::lengthTooLarge, cursor_);
+}
+
+WireResult<void> WireReader::skipBytes(std::size_t count) {
+  if (remaining() < count) return fault(DecodeCause::truncated, cursor_);
+  cursor_ += count;
+  return {};
+}
+
+template <class Number>
+WireResult<Number> WireReader::readFixed() {
+  const std::byte* const at = cursor_;
+  if (const auto skipped = skipBytes(sizeof(Number)); !skipped) return std::unexpected(skipped.error());
+  Number value = 0;
+  for (std::size_t index = 0; index < sizeof(Number); ++index) {
+    value |= std::to_integer<Number>(at[index]) << (8 * index);
+  }
+  return value;
+}
+
+WireResult<std::uint32_t> WireReader::readFixed32() { return readFixed<std::uint32_t>(); }
+
+WireResult<std::uint64_t> WireReader::readFixed64() { return readFixed<std::uint64_t>(); }
+
+WireResult<void> WireReader::skipValue(Tag tag, int nesting) {
+  const auto discard = [](const auto& result) -> WireResult<void> {
+    if (!result) return std::unexpected(result.error());
+    return {};
+  };
+  switch (tag.wireType()) {
+    case WireType::varint: return discard(readVarint());
+    case WireType::fixed64: return skipBytes(sizeof(std::uint64_t));
+    case WireType::lengthDelimited: return discard(readLengthDelimited());
+    case WireType::startGroup: return skipGroup(tag, nesting);
+    case WireType::endGroup: return fault(DecodeCause::unexpectedEndGroup, cursor_);
+    case WireType::fixed32: return skipBytes(sizeof(std::uint32_t));
+  }
+  return fault(DecodeCause::reservedWireType, cursor_);
+}
+
+WireResult<void> WireReader::skipGroup(Tag start, int nesting) {
+  // The numbers of the groups that are open, the innermost last. A loop, so that nesting costs no stack.
+  std::array<std::uint32_t, maximumNesting> open;
+  int depth = 0;
+  for (Tag tag = start;;) {
+    if (tag.wireType() == WireType::startGroup) {
+      if (nesting + depth >= maximumNesting) return fault(DecodeCause::nestingTooDeep, cursor_);
+      open[static_cast<std::size_t>(depth++)] = tag.fieldNumber();
+    } else if (tag.wireType() == WireType::endGroup) {
+      if (open[static_cast<std::size_t>(--depth)] != tag.fieldNumber()) {
+        return fault(DecodeCause::mismatchedEndGroup, cursor_);
+      }
+      if (depth == 0) return {};
+    } else if (auto skipped = skipValue(tag, nesting); !skipped) {
+      return skipped;
+    }
+    if (isAtEnd()) return fault(DecodeCause::unterminatedGroup, cursor_);
+    const auto next = readTag();
+    if (!next) return std::unexpected(next.error());
+    tag = *next;
+  }
+}
+
+std::size_t WireReader::countRecords(Tag tag) const {
+  WireReader probe(*this);
+  for (std::size_t count = 0;; ++count) {
+    const auto next = probe.isAtEnd() ? Tag{0} : probe.readTag().value_or(Tag{0});
+    if (next.value != tag.value || !probe.readLengthDelimited()) return count;
+  }
+}
+
+}  // namespace orv

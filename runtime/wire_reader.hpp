@@ -1,0 +1,113 @@
+// Reads the pieces of the binary format, strictly, from bytes that lie in one stretch of memory.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <expected>
+#include <span>
+
+#include "runtime/decode_error.hpp"
+
+namespace orv {
+
+// Nesting of messages and groups that is still read.
+inline constexpr int maximumNesting = 100;
+
+enum class WireType : std::uint8_t {
+  varint = 0,
+  fixed64 = 1,
+  lengthDelimited = 2,
+  startGroup = 3,
+  endGroup = 4,
+  fixed32 = 5,
+};
+
+// A field number, 1 to 2^29-1, and a wire type, which may be one of the reserved 6 and 7.
+struct Tag {
+  std::uint32_t value;
+
+  constexpr std::uint32_t fieldNumber() const { return value >> 3; }
+  constexpr WireType wireType() const { return static_cast<WireType>(value & 7); }
+};
+
+// What a reader stumbled over. The pointer is into its input.
+struct WireFault {
+  DecodeCause cause;
+  const std::byte* at;
+  std::uint64_t length = 0;
+  std::uint64_t detail = 0;
+};
+
+template <class T>
+using WireResult = std::expected<T, WireFault>;
+
+// A position in a stretch of bytes, which must outlive the reader. After a fault the position is where the
+// piece that could not be read begins.
+class WireReader {
+ public:
+  WireReader() = default;
+  explicit WireReader(std::span<const std::byte> bytes)
+      : cursor_(bytes.data()), limit_(bytes.data() + bytes.size()) {}
+
+  bool isAtEnd() const { return cursor_ == limit_; }
+  const std::byte* position() const { return cursor_; }
+  std::size_t remaining() const { return static_cast<std::size_t>(limit_ - cursor_); }
+
+  // A tag of up to five bytes whose number is not 0.
+  [[nodiscard]] WireResult<Tag> readTag() {
+    if (cursor_ != limit_) [[likely]] {
+      // One byte: a number of 1 to 15.
+      const auto first = std::to_integer<std::uint32_t>(*cursor_);
+      if (first >= 8 && first < 0x80) [[likely]] {
+        ++cursor_;
+        return Tag{first};
+      }
+    }
+    return readLongTag();
+  }
+
+  // A varint of up to ten bytes. Bits above 2^64 in the tenth are dropped.
+  [[nodiscard]] WireResult<std::uint64_t> readVarint() {
+    if (cursor_ != limit_ && *cursor_ < std::byte{0x80}) [[likely]]
+      return std::to_integer<std::uint64_t>(*cursor_++);
+    return readLongVarint();
+  }
+
+  // A length below 2^31 in up to five bytes, and as many bytes, all of them there.
+  [[nodiscard]] WireResult<std::span<const std::byte>> readLengthDelimited() {
+    if (cursor_ != limit_) [[likely]] {
+      const auto length = std::to_integer<std::size_t>(*cursor_);
+      if (length < 0x80 && length < remaining()) [[likely]] {
+        const std::byte* const start = cursor_ + 1;
+        cursor_ = start + length;
+        return std::span(start, length);
+      }
+    }
+    return readLongLengthDelimited();
+  }
+
+  // A little-endian number.
+  [[nodiscard]] WireResult<std::uint32_t> readFixed32();
+  [[nodiscard]] WireResult<std::uint64_t> readFixed64();
+
+  // Passes over the value behind `tag`, groups with all that they hold included. `nesting` is how many
+  // messages and groups the value is already in.
+  [[nodiscard]] WireResult<void> skipValue(Tag tag, int nesting);
+
+  // How many whole length-delimited records with this tag follow one another from here on. Consumes nothing.
+  std::size_t countRecords(Tag tag) const;
+
+ private:
+  WireResult<Tag> readLongTag();
+  WireResult<std::uint64_t> readLongVarint();
+  WireResult<std::span<const std::byte>> readLongLengthDelimited();
+  WireResult<void> skipBytes(std::size_t count);
+  template <class Number>
+  WireResult<Number> readFixed();
+  WireResult<void> skipGroup(Tag start, int nesting);
+
+  const std::byte* cursor_ = nullptr;
+  const std::byte* limit_ = nullptr;
+};
+
+}  // namespace orv
