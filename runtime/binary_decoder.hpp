@@ -14,7 +14,7 @@
 #include "runtime/byte_buffer.hpp"
 #include "runtime/decode_error.hpp"
 #include "runtime/decoder.hpp"
-#include "runtime/name_map.hpp"
+#include "runtime/message_facts.hpp"
 #include "runtime/text.hpp"
 #include "runtime/unknown_storage.hpp"
 #include "runtime/utf8.hpp"
@@ -31,8 +31,8 @@ class ConflictHook {
   constexpr ConflictHook() = default;
 
   template <class Callable>
-  requires std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&> ConflictHook(
-      Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
+    requires std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>
+  ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
       : callable_(&callable), call_([](void* target) -> std::expected<void, DecodeError> {
           return (*static_cast<Callable*>(target))();
         }) {}
@@ -52,38 +52,53 @@ class ConflictHook {
 //   BinaryDecoder decoder(bytes);
 //   const auto result = message.decodeMessage(decoder);
 //
-// (parse and merge are the same in one call.) Decoding n bytes takes time and memory in proportion to n,
-// whatever they are. An error says what is wrong, at which byte, in which field.
+// (parse and merge are the same in one call.) Decoding n bytes takes time and memory in proportion to n, whatever
+// they are. A decodeMessage that is given a BinaryDecoder fails with a DecodeError: what is wrong, at which byte,
+// in which field.
+//
+// Each nested message is read by a decoder of its own, which knows the one that reads the enclosing message.
 class BinaryDecoder {
  public:
-  using Error = DecodeError;
-  using Result = std::expected<void, DecodeError>;
+  // What the single operations fail with: nothing but the fact, where a DecodeError passed up through every level
+  // of nesting cost a tenth of all decoding. error() then says what was wrong. It is copied by hand because g++ 12
+  // packs small results that copy trivially into registers by way of memory, in pieces that the processor cannot
+  // forward: with that, decoding takes twice as long.
+  struct Failure {
+    Failure() = default;
+    Failure(const Failure&) noexcept {}
+    Failure& operator=(const Failure&) noexcept { return *this; }
+  };
+  using Error = Failure;
+  using Result = std::expected<void, Failure>;
+  using NextFieldNumber = std::expected<std::optional<std::uint32_t>, Failure>;
 
   explicit BinaryDecoder(std::span<const std::byte> bytes, ConflictHook hook = {})
-      : reader_(bytes), input_{bytes.data(), bytes.data() + bytes.size(), hook} {}
+      : reader_(bytes), readableEnd_(bytes.data() + bytes.size()), begin_(bytes.data()), hook_(hook) {}
+  BinaryDecoder(const BinaryDecoder&) = delete;
+  BinaryDecoder& operator=(const BinaryDecoder&) = delete;
+
+  // What was wrong. Only for a decoder one of whose operations failed.
+  const DecodeError& error() const { return *outermost().error_; }
 
   // The operations that Decoder lists.
 
   template <class M>
-  std::expected<std::optional<std::uint32_t>, DecodeError> nextFieldNumber(M& message) {
+  NextFieldNumber nextFieldNumber(M& message) {
     if (reader_.position() == valueStart_) [[unlikely]] {
-      if (auto kept = keepUnknown(message.mutableUnknownFields()); !kept)
-        return std::unexpected(kept.error());
+      if (auto kept = keepUnknown(message.mutableUnknownFields()); !kept) return std::unexpected(kept.error());
     }
-    if (message_ == nullptr) message_ = &factsOf<M>;
+    message_ = &M::messageFacts();
     if (reader_.isAtEnd()) {
-      valueStart_ = nullptr;
-      return std::nullopt;
+      valueStart_ = nothing;
+      return {};
     }
     recordStart_ = reader_.position();
-    const auto tag = reader_.readTag();
-    if (!tag) [[unlikely]] {
-      tag_ = Tag{0};
-      return fail(tag.error());
+    tag_ = reader_.readShortTag();
+    if (tag_.value == 0) [[unlikely]] {
+      if (auto read = readLongTag(); !read) return std::unexpected(read.error());
     }
-    tag_ = *tag;
     valueStart_ = reader_.position();
-    return tag->fieldNumber();
+    return NextFieldNumber(std::in_place, std::in_place, tag_.fieldNumber());
   }
 
   Result decodeSingularStringField(Text& value) { return readText(value); }
@@ -110,119 +125,121 @@ class BinaryDecoder {
     if (!isAtMessageField()) return {};
     if (slot.has_value()) {
       if (auto checked = checkMessageField<M>(); !checked) return checked;
-      return readMessageField(*slot);
+      return mergeMessageField(*slot);
     }
-    auto result = readMessageField(slot.emplace());
-    if (!result) [[unlikely]]
-      slot.reset();
-    return result;
+    auto read = readNewMessage(slot.emplace());
+    if (!read) slot.reset();
+    return read;
   }
 
   Result decodeRepeatedStringField(std::vector<Text>& texts) {
-    if (tag_.wireType() != WireType::lengthDelimited) return {};
-    const auto bytes = readWellFormed();
-    if (!bytes) [[unlikely]]
-      return std::unexpected(bytes.error());
+    if (!isLengthDelimited()) return {};
     makeRoom(texts);
-    texts.emplace_back().bytes_.assignReadable(*bytes, readableFrom(*bytes));
-    return {};
+    auto read = readText(texts.emplace_back());
+    if (!read) texts.pop_back();
+    return read;
   }
 
   template <class M>
   Result decodeRepeatedMessageField(std::vector<M>& messages) {
-    if (!isAtMessageField()) return {};
-    const auto body = reader_.readLengthDelimited();
-    if (!body) [[unlikely]]
-      return fail(body.error());
+    if (!isLengthDelimited()) return {};
     makeRoom(messages);
-    auto result = readNested(messages.emplace_back(), *body, mode_);
-    if (!result) [[unlikely]]
-      messages.pop_back();
-    return result;
+    auto read = readNewMessage(messages.emplace_back());
+    if (!read) messages.pop_back();
+    return read;
   }
 
-  Result handleConflictingOneOf() {
-    if (mode_ == Mode::confirmed) return {};
-    return input_.hook();
-  }
+  Result handleConflictingOneOf();
 
   // The operations that RereadingDecoder lists.
 
   static constexpr bool canReread = true;
 
-  bool isAtMessageField() const { return tag_.wireType() == WireType::lengthDelimited; }
+  bool isAtMessageField() const { return isLengthDelimited(); }
 
-  // Decodes a copy of nothing: the field is read into a message that is then dropped.
   template <class M>
-  Result checkMessageField() const {
-    if (mode_ != Mode::careful || !isAtMessageField()) return {};
-    WireReader reader = reader_;
-    const auto body = reader.readLengthDelimited();
-    if (!body) return fail(body.error());
-    M scratch;
-    auto result = readNested(scratch, *body, Mode::checking);
-    return result;
+  Result readNewMessage(M& message) {
+    return readMessage(message, mode_);
   }
 
-  // Call it after checkMessageField if the message held anything before.
+  // Reads the field into a message that is then dropped.
   template <class M>
-  Result readMessageField(M& message) {
+  Result checkMessageField() {
+    if (mode_ != Mode::careful || !isAtMessageField()) return {};
+    const WireReader here = reader_;
+    M scratch;
+    auto read = readMessage(scratch, Mode::checking);
+    reader_ = here;
+    return read;
+  }
+
+  template <class M>
+  Result mergeMessageField(M& message) {
     if (!isAtMessageField()) return {};
-    const auto body = reader_.readLengthDelimited();
-    if (!body) [[unlikely]]
-      return fail(body.error());
-    return readNested(message, *body, mode_);
+    return readMessage(message, mode_ == Mode::careful ? Mode::confirmed : mode_);
   }
 
  private:
-  // What became of the message that is being read, should it fail.
+  // What becomes of a message whose reading fails.
   enum class Mode : std::uint8_t {
-    careful,    // it keeps what was read: a present nested message must be checked before it is merged into
-    checking,   // it is dropped
-    confirmed,  // it cannot fail: it was read once before, and the hook was asked then
+    careful,    // it keeps what was read, so a nested message is checked before it is merged into one that is there
+    checking,   // it is dropped, so nothing need be checked
+    confirmed,  // it cannot fail: all of it was read once before, and the hook was asked then
   };
 
-  struct Input {
-    const std::byte* begin;
-    const std::byte* end;
-    ConflictHook hook;
-  };
+  static constexpr const std::byte* nothing = nullptr;
 
-  BinaryDecoder(const BinaryDecoder& outer, std::span<const std::byte> body, const MessageFacts& message,
-                Mode mode)
+  BinaryDecoder(BinaryDecoder& outer, std::span<const std::byte> body, Mode mode)
       : reader_(body),
-        message_(&message),
+        readableEnd_(outer.readableEnd_),
         outer_(&outer),
-        nesting_(outer.nesting_ + 1),
-        mode_(mode),
-        input_(outer.input_) {}
+        nesting_(static_cast<std::uint8_t>(outer.nesting_ + 1)),
+        mode_(mode) {}
+
+  bool isLengthDelimited() const { return tag_.wireType() == WireType::lengthDelimited; }
+
+  // Whether the length-delimited field could be read.
+  bool readBody(std::span<const std::byte>& body) {
+    if (reader_.readShortLengthDelimited(body)) [[likely]] return true;
+    const auto longer = reader_.readLengthDelimited();
+    if (longer) {
+      body = *longer;
+    } else {
+      (void)fail(longer.error());
+    }
+    return longer.has_value();
+  }
 
   template <class M>
-  Result readNested(M& message, std::span<const std::byte> body, Mode mode) const {
-    BinaryDecoder nested(*this, body, factsOf<M>, mode);
-    if (nested.nesting_ > maximumNesting) [[unlikely]]
-      return failTooDeep();
-    return message.decodeMessage(nested);
+  Result readMessage(M& message, Mode mode) {
+    std::span<const std::byte> body;
+    if (!readBody(body)) [[unlikely]] return failed();
+    BinaryDecoder nested(*this, body, mode);
+    if (nested.nesting_ > maximumNesting) [[unlikely]] return failTooDeep();
+    return message.template decodeMessage<BinaryDecoder>(nested);
   }
 
   template <class Slot>
   Result readText(Slot& slot) {
-    if (tag_.wireType() != WireType::lengthDelimited) return {};
-    const auto bytes = readWellFormed();
-    if (!bytes) [[unlikely]]
-      return std::unexpected(bytes.error());
-    presentValue(slot).bytes_.assignReadable(*bytes, readableFrom(*bytes));
+    if (!isLengthDelimited()) return {};
+    std::span<const std::byte> body;
+    if (!readBody(body)) [[unlikely]] return failed();
+    const std::string_view bytes = characters(body);
+    const std::size_t readable = readableFrom(body);
+    const bool isShort = bytes.size() <= InlineBytes::inlineCapacity && readable >= InlineBytes::objectSize;
+    if (!(isShort && utf8::isShortAscii(bytes)) && !utf8::isWellFormed(bytes)) [[unlikely]] {
+      return failIllFormed(bytes);
+    }
+    presentValue(slot).bytes_.assignReadable(bytes, readable);
     return {};
   }
 
   template <class Slot>
   Result readBytes(Slot& slot) {
-    if (tag_.wireType() != WireType::lengthDelimited) return {};
-    const auto body = reader_.readLengthDelimited();
-    if (!body) [[unlikely]]
-      return fail(body.error());
-    const std::string_view bytes(reinterpret_cast<const char*>(body->data()), body->size());
-    presentValue(slot).bytes_.assignReadable(bytes, readableFrom(bytes));
+    if (!isLengthDelimited()) return {};
+    std::span<const std::byte> body;
+    if (!readBody(body)) [[unlikely]] return failed();
+    presentValue(slot).bytes_.assignReadable(characters(body), readableFrom(body));
     return {};
   }
 
@@ -236,20 +253,9 @@ class BinaryDecoder {
   Result readVarint(Store store) {
     if (tag_.wireType() != WireType::varint) return {};
     const auto varint = reader_.readVarint();
-    if (!varint) [[unlikely]]
-      return fail(varint.error());
+    if (!varint) [[unlikely]] return fail(varint.error());
     store(*varint);
     return {};
-  }
-
-  std::expected<std::string_view, DecodeError> readWellFormed() {
-    const auto body = reader_.readLengthDelimited();
-    if (!body) [[unlikely]]
-      return fail(body.error());
-    const std::string_view bytes(reinterpret_cast<const char*>(body->data()), body->size());
-    if (!utf8::isWellFormed(bytes)) [[unlikely]]
-      return failIllFormed(bytes);
-    return bytes;
   }
 
   template <class T>
@@ -261,35 +267,46 @@ class BinaryDecoder {
     return value.has_value() ? *value : value.emplace();
   }
 
-  std::size_t readableFrom(std::string_view bytes) const {
-    return static_cast<std::size_t>(input_.end - reinterpret_cast<const std::byte*>(bytes.data()));
+  static std::string_view characters(std::span<const std::byte> bytes) {
+    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
   }
 
-  // Before an element is added to a full list: room for it and for the records of the same field that follow
-  // it directly, so that a list that arrives in one run is allocated once.
+  std::size_t readableFrom(std::span<const std::byte> bytes) const {
+    return static_cast<std::size_t>(readableEnd_ - bytes.data());
+  }
+
+  // Before an element is added to a full list: room for it and for the records of the same field that follow its
+  // own directly, so that a list that arrives in one run is allocated once.
   template <class T>
   void makeRoom(std::vector<T>& list) const {
-    if (list.size() < list.capacity()) [[likely]]
-      return;
-    const std::size_t run = 1 + reader_.countRecords(tag_);
+    if (list.size() < list.capacity()) [[likely]] return;
+    const std::size_t run = 1 + reader_.countFollowing(tag_);
     list.reserve(list.size() + (run > list.size() ? run : list.size()));
   }
 
-  Result keepUnknown(UnknownStorage& unknownFields);
+  static std::unexpected<Failure> failed() { return std::unexpected(Failure()); }
+  std::unexpected<Failure> fail(const WireFault& fault);
+  std::unexpected<Failure> failIllFormed(std::string_view text);
+  std::unexpected<Failure> failTooDeep();
 
-  std::unexpected<DecodeError> fail(const WireFault& fault) const;
-  std::unexpected<DecodeError> failIllFormed(std::string_view text) const;
-  std::unexpected<DecodeError> failTooDeep() const;
+  Result keepUnknown(UnknownStorage& unknownFields);
+  Result readLongTag();
+  const BinaryDecoder& outermost() const;
+  BinaryDecoder& outermost() { return const_cast<BinaryDecoder&>(std::as_const(*this).outermost()); }
 
   WireReader reader_;
-  const std::byte* recordStart_ = nullptr;
-  const std::byte* valueStart_ = nullptr;  // where the value of the field begins that nobody took yet
-  const MessageFacts* message_ = nullptr;  // the type of the message that is being read, once that is known
-  const BinaryDecoder* outer_ = nullptr;   // who reads the enclosing message
+  const std::byte* readableEnd_;            // of the whole input
+  const std::byte* recordStart_ = nothing;  // of the field whose number was given last
+  const std::byte* valueStart_ = nothing;   // of that field, unless there is none
+  const MessageFacts* message_ = nullptr;   // the type of the message that is being read
+  BinaryDecoder* outer_ = nullptr;          // who reads the enclosing message
   Tag tag_{0};
   std::uint8_t nesting_ = 0;
   Mode mode_ = Mode::careful;
-  Input input_;
+  // The outermost decoder's alone.
+  const std::byte* begin_ = nullptr;
+  ConflictHook hook_;
+  std::optional<DecodeError> error_;
 };
 
 }  // namespace orv

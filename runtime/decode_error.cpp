@@ -28,29 +28,25 @@ static_assert(sentences.size() == static_cast<std::size_t>(DecodeCause::conflict
 
 std::string_view describe(DecodeCause cause) { return sentences[static_cast<std::size_t>(cause)]; }
 
-void FieldPath::prepend(const MessageFacts& message, std::uint32_t fieldNumber) {
+void FieldPath::prepend(std::uint32_t fieldNumber) {
   if (size_ == capacity) {
     ++omitted_;
     --size_;
   }
-  std::copy_backward(steps_.begin(), steps_.begin() + static_cast<std::ptrdiff_t>(size_),
-                     steps_.begin() + static_cast<std::ptrdiff_t>(size_) + 1);
-  steps_.front() = {&message, fieldNumber};
+  for (std::size_t at = size_; at > 0; --at) numbers_[at] = numbers_[at - 1];
+  numbers_[0] = fieldNumber;
   ++size_;
 }
 
 std::string FieldPath::text() const {
-  std::string text;
-  for (std::size_t at = 0; at < size_; ++at) {
-    const auto& [message, number] = steps_[at];
-    if (at == 0) text = message->fullName;
-    if (number == 0) break;
+  if (isEmpty()) return {};
+  std::string text(outermost_->fullName);
+  const MessageFacts* message = outermost_;
+  for (std::size_t at = 0; at < size_ && numbers_[at] != 0; ++at) {
+    const FieldFacts* const field = message != nullptr ? message->field(numbers_[at]) : nullptr;
     text += '.';
-    if (const auto name = message->fieldNames.name(number)) {
-      text += *name;
-    } else {
-      text += std::to_string(number);
-    }
+    text += field != nullptr ? field->name : std::to_string(numbers_[at]);
+    message = field != nullptr ? field->message : nullptr;
   }
   if (omitted_ != 0) text += ".(" + std::to_string(omitted_) + " deeper)";
   return text;

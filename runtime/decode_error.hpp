@@ -7,7 +7,7 @@
 #include <string>
 #include <string_view>
 
-#include "runtime/name_map.hpp"
+#include "runtime/message_facts.hpp"
 
 namespace orv {
 
@@ -31,46 +31,44 @@ enum class DecodeCause : std::uint8_t {
 // program.
 std::string_view describe(DecodeCause cause);
 
-// Where a field stands in a message tree: the outermost message's full name, then field names. The names last
-// as long as the program; the path owns nothing.
+// Where a field stands in a message tree: the outermost message, then field numbers. A plain value that
+// allocates nothing and owns nothing: names are looked up when they are asked for.
 class FieldPath {
  public:
-  // Steps beyond this many are counted and left out, the innermost first.
-  static constexpr std::size_t capacity = 6;
+  // Steps beyond this many are left out, the innermost first.
+  static constexpr std::size_t capacity = 5;
 
-  // Puts the field of the enclosing message in front. Number 0 stands for the message itself.
-  void prepend(const MessageFacts& message, std::uint32_t fieldNumber);
+  constexpr FieldPath() = default;
+  constexpr explicit FieldPath(const MessageFacts& outermost) : outermost_(&outermost) {}
 
-  bool isEmpty() const { return size_ == 0; }
+  // Puts the field of the enclosing message in front. Number 0 stands for no field: it is where a message has
+  // none.
+  void prepend(std::uint32_t fieldNumber);
+
+  bool isEmpty() const { return outermost_ == nullptr; }
   // For instance "orv.Group.memberAdded.member.handle"; a field that has no name is written by its number.
   std::string text() const;
 
-  friend bool operator==(const FieldPath& left, const FieldPath& right) {
-    return left.text() == right.text();
-  }
+  friend bool operator==(const FieldPath&, const FieldPath&) = default;
 
  private:
-  struct Step {
-    const MessageFacts* message;
-    std::uint32_t fieldNumber;
-  };
-
-  std::array<Step, capacity> steps_{};
-  std::uint32_t size_ = 0;
-  std::uint32_t omitted_ = 0;
+  const MessageFacts* outermost_ = nullptr;
+  std::array<std::uint32_t, capacity> numbers_{};
+  std::uint16_t size_ = 0;
+  std::uint16_t omitted_ = 0;
 };
 
-// The error of BinaryDecoder. A plain value: copying it allocates nothing.
+// The error of BinaryDecoder. A plain value: making and copying it allocates nothing.
 struct DecodeError {
   DecodeCause cause = DecodeCause::truncated;
+  // For lengthOverrun: the length, and by how many bytes it overruns. For illFormedText: the text's length,
+  // and the offset of the first ill-formed byte in it. All are below 2^31.
+  std::uint32_t length = 0;
+  std::uint32_t detail = 0;
   // Where in the input the offending tag, varint, length or text begins; for what is missing, where it was
   // missed.
   std::size_t offset = 0;
-  // For lengthOverrun: the length, and by how many bytes it overruns. For illFormedText: the text's length,
-  // and the offset of the first ill-formed byte in it.
-  std::uint64_t length = 0;
-  std::uint64_t detail = 0;
-  FieldPath path;
+  FieldPath path{};
 
   // What is wrong, without path and offset: "length 23 runs 19 bytes past the end".
   std::string reason() const;

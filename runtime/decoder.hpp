@@ -62,17 +62,21 @@ concept Decoder = requires(D& decoder, Text& text, std::optional<Text>& optional
   { decoder.handleConflictingOneOf() } -> std::same_as<DecodeResult<D>>;
 };
 
-// A decoder that can look at its input twice. The rules then merge a repeated oneof member in place, where
-// they copy the payload for other decoders: with many repeats that is the difference between linear and
-// quadratic time.
+// A decoder that can look at its input twice. It marks itself with `static constexpr bool canReread = true`,
+// and the rules then merge a repeated oneof member in place, where they copy the payload for other decoders:
+// with many repeats that is the difference between linear and quadratic time. It has
 //
-//   // Whether the field could be read into a message that is there already, which is not touched. Takes
-//   nothing. template <class M> std::expected<bool, Error> canMergeMessageField();      false when the field
-//   would not be taken
+//   // Whether the field whose number was given last can be read as a message at all.
+//   bool isAtMessageField() const;
 //
-//   // Reads the field into `message`: a new default message, or one that canMergeMessageField was asked for.
-//   // May leave part of it there when it fails. Answers whether it took the field.
-//   template <class M> std::expected<bool, Error> mergeMessageField(M& message);
+//   // Reads the field into a default message. When it fails, part of it may be there: the caller drops it.
+//   template <class M> DecodeResult readNewMessage(M& message);
+//
+//   // Whether the field could be merged into any message of this type. Takes nothing.
+//   template <class M> DecodeResult checkMessageField();
+//
+//   // Merges a field that was checked, which cannot fail any more.
+//   template <class M> DecodeResult mergeMessageField(M& message);
 template <class D>
 concept RereadingDecoder = Decoder<D> && D::canReread;
 

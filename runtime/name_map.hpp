@@ -40,13 +40,4 @@ class NameMap {
   std::span<const Entry> entries_;
 };
 
-// What is known of a message type without a value of it.
-struct MessageFacts {
-  std::string_view fullName;
-  NameMap fieldNames;
-};
-
-template <class M>
-inline constexpr MessageFacts factsOf{M::protoMessageName, M::_protobuf_nameMap()};
-
 }  // namespace orv

@@ -10,15 +10,15 @@ std::expected<UnknownStorage, DecodeError> UnknownStorage::checked(std::span<con
   WireReader reader(records);
   const auto error = [&](const WireFault& fault) {
     return std::unexpected(DecodeError{.cause = fault.cause,
-                                       .offset = static_cast<std::size_t>(fault.at - records.data()),
                                        .length = fault.length,
                                        .detail = fault.detail,
-                                       .path = {}});
+                                       .offset = static_cast<std::size_t>(fault.at - records.data())});
   };
   while (!reader.isAtEnd()) {
+    const std::byte* const tagStart = reader.position();
     const auto tag = reader.readTag();
     if (!tag) return error(tag.error());
-    if (const auto skipped = reader.skipValue(*tag, 0); !skipped) return error(skipped.error());
+    if (const auto skipped = reader.skipValue(*tag, tagStart, 0); !skipped) return error(skipped.error());
   }
   UnknownStorage storage;
   storage.append(records);
@@ -58,7 +58,7 @@ UnknownStorage::Iterator& UnknownStorage::Iterator::operator++() {
   // A store holds well-formed records only.
   field_.tag = *reader_.readTag();
   const std::byte* const value = reader_.position();
-  [[maybe_unused]] const auto skipped = reader_.skipValue(field_.tag, 0);
+  [[maybe_unused]] const auto skipped = reader_.skipValue(field_.tag, start, 0);
   field_.record = std::span(start, reader_.position());
   field_.value = std::span(value, reader_.position());
   return *this;

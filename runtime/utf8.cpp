@@ -1,5 +1,7 @@
 #include "runtime/utf8.hpp"
 
+#include <bit>
+
 namespace orv::utf8 {
 
 Step step(std::string_view text) {
@@ -41,9 +43,14 @@ Step step(std::string_view text) {
 std::size_t wellFormedPrefix(std::string_view text) {
   std::size_t at = 0;
   while (at < text.size()) {
-    // Runs of ASCII are passed eight bytes at a time.
-    while (text.size() - at >= 8 && isAscii(text.substr(at, 8))) at += 8;
-    if (at == text.size()) break;
+    // ASCII is passed up to eight bytes at a time.
+    if (text.size() - at >= 8) {
+      const std::uint64_t bits = wordAt(text.data() + at) & highBits;
+      const int ascii =
+          std::endian::native == std::endian::little ? std::countr_zero(bits) : std::countl_zero(bits);
+      at += static_cast<std::size_t>(ascii) / 8;
+      if (bits == 0) continue;
+    }
     const Step next = step(text.substr(at));
     if (!next.isWellFormed) return at;
     at += next.length;

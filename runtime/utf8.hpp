@@ -2,6 +2,7 @@
 // overlong forms, nothing above U+10FFFF.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -22,28 +23,48 @@ Step step(std::string_view text);
 // How many bytes at the start of `text` are well-formed.
 std::size_t wellFormedPrefix(std::string_view text);
 
+// Bytes of which this bit is set are not ASCII, in each byte of a word.
+inline constexpr std::uint64_t highBits = 0x8080808080808080;
+
+inline std::uint64_t wordAt(const char* bytes) {
+  std::uint64_t word;
+  std::memcpy(&word, bytes, sizeof word);
+  return word;
+}
+
+// Checks eight bytes at a time.
 inline bool isAscii(std::string_view text) {
-  constexpr std::uint64_t highBits = 0x8080808080808080;
-  const auto word = [&](std::size_t at) {
-    std::uint64_t value;
-    std::memcpy(&value, text.data() + at, sizeof value);
-    return value;
-  };
   const std::size_t size = text.size();
+  const char* const bytes = text.data();
   if (size < 8) {
     unsigned char bits = 0;
     for (const char c : text) bits = static_cast<unsigned char>(bits | static_cast<unsigned char>(c));
     return bits < 0x80;
   }
   // The last word overlaps the one before it, so no byte is left over.
-  std::uint64_t bits = word(size - 8);
+  std::uint64_t bits = wordAt(bytes + size - 8);
   std::size_t at = 0;
   for (; at + 32 <= size; at += 32) {
-    bits |= word(at) | word(at + 8) | word(at + 16) | word(at + 24);
+    bits |= wordAt(bytes + at) | wordAt(bytes + at + 8) | wordAt(bytes + at + 16) | wordAt(bytes + at + 24);
     if ((bits & highBits) != 0) return false;
   }
-  for (; at + 8 <= size; at += 8) bits |= word(at);
+  for (; at + 8 <= size; at += 8) bits |= wordAt(bytes + at);
   return (bits & highBits) == 0;
+}
+
+// As isAscii, without a branch, for texts of at most 40 bytes behind whose start 40 bytes may be read.
+inline bool isShortAscii(std::string_view text) {
+  constexpr std::size_t longest = 40;
+  // From `longest - size` on: the high bits of `size` bytes, then zeros for those that are not the text's.
+  static constexpr auto masks = [] {
+    std::array<char, 2 * longest> bytes{};
+    for (std::size_t at = 0; at < longest; ++at) bytes[at] = static_cast<char>(0x80);
+    return bytes;
+  }();
+  const char* const bytes = text.data();
+  const char* const mask = masks.data() + (longest - text.size());
+  const auto highBitsAt = [&](std::size_t at) { return wordAt(bytes + at) & wordAt(mask + at); };
+  return (highBitsAt(0) | highBitsAt(8) | highBitsAt(16) | highBitsAt(24) | highBitsAt(32)) == 0;
 }
 
 inline bool isWellFormed(std::string_view text) {

@@ -59,7 +59,9 @@ WireResult<std::span<const std::byte>> WireReader::readLongLengthDelimited() {
     if (length >= lengthLimit) break;
     const auto available = static_cast<std::uint64_t>(limit_ - at);
     if (length > available) {
-      return std::unexpected(WireFault{DecodeCause::lengthOverrun, cursor_, length, length - available});
+      return std::unexpected(WireFault{DecodeCause::lengthOverrun, cursor_,
+                                       static_cast<std::uint32_t>(length),
+                                       static_cast<std::uint32_t>(length - available)});
     }
     cursor_ = at + length;
     return std::span(at, length);
@@ -88,7 +90,7 @@ WireResult<std::uint32_t> WireReader::readFixed32() { return readFixed<std::uint
 
 WireResult<std::uint64_t> WireReader::readFixed64() { return readFixed<std::uint64_t>(); }
 
-WireResult<void> WireReader::skipValue(Tag tag, int nesting) {
+WireResult<void> WireReader::skipValue(Tag tag, const std::byte* tagStart, int nesting) {
   const auto discard = [](const auto& result) -> WireResult<void> {
     if (!result) return std::unexpected(result.error());
     return {};
@@ -97,38 +99,40 @@ WireResult<void> WireReader::skipValue(Tag tag, int nesting) {
     case WireType::varint: return discard(readVarint());
     case WireType::fixed64: return skipBytes(sizeof(std::uint64_t));
     case WireType::lengthDelimited: return discard(readLengthDelimited());
-    case WireType::startGroup: return skipGroup(tag, nesting);
-    case WireType::endGroup: return fault(DecodeCause::unexpectedEndGroup, cursor_);
+    case WireType::startGroup: return skipGroup(tag, tagStart, nesting);
+    case WireType::endGroup: return fault(DecodeCause::unexpectedEndGroup, tagStart);
     case WireType::fixed32: return skipBytes(sizeof(std::uint32_t));
   }
-  return fault(DecodeCause::reservedWireType, cursor_);
+  return fault(DecodeCause::reservedWireType, tagStart);
 }
 
-WireResult<void> WireReader::skipGroup(Tag start, int nesting) {
+WireResult<void> WireReader::skipGroup(Tag start, const std::byte* tagStart, int nesting) {
   // The numbers of the groups that are open, the innermost last. A loop, so that nesting costs no stack.
   std::array<std::uint32_t, maximumNesting> open;
   int depth = 0;
   for (Tag tag = start;;) {
     if (tag.wireType() == WireType::startGroup) {
-      if (nesting + depth >= maximumNesting) return fault(DecodeCause::nestingTooDeep, cursor_);
+      if (nesting + depth >= maximumNesting) return fault(DecodeCause::nestingTooDeep, tagStart);
       open[static_cast<std::size_t>(depth++)] = tag.fieldNumber();
     } else if (tag.wireType() == WireType::endGroup) {
       if (open[static_cast<std::size_t>(--depth)] != tag.fieldNumber()) {
-        return fault(DecodeCause::mismatchedEndGroup, cursor_);
+        return fault(DecodeCause::mismatchedEndGroup, tagStart);
       }
       if (depth == 0) return {};
-    } else if (auto skipped = skipValue(tag, nesting); !skipped) {
+    } else if (auto skipped = skipValue(tag, tagStart, nesting); !skipped) {
       return skipped;
     }
     if (isAtEnd()) return fault(DecodeCause::unterminatedGroup, cursor_);
+    tagStart = cursor_;
     const auto next = readTag();
     if (!next) return std::unexpected(next.error());
     tag = *next;
   }
 }
 
-std::size_t WireReader::countRecords(Tag tag) const {
+std::size_t WireReader::countFollowing(Tag tag) const {
   WireReader probe(*this);
+  if (!probe.readLengthDelimited()) return 0;
   for (std::size_t count = 0;; ++count) {
     const auto next = probe.isAtEnd() ? Tag{0} : probe.readTag().value_or(Tag{0});
     if (next.value != tag.value || !probe.readLengthDelimited()) return count;

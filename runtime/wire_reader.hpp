@@ -34,8 +34,8 @@ struct Tag {
 struct WireFault {
   DecodeCause cause;
   const std::byte* at;
-  std::uint64_t length = 0;
-  std::uint64_t detail = 0;
+  std::uint32_t length = 0;  // for lengthOverrun: the length, and by how many bytes it overruns
+  std::uint32_t detail = 0;
 };
 
 template <class T>
@@ -55,14 +55,8 @@ class WireReader {
 
   // A tag of up to five bytes whose number is not 0.
   [[nodiscard]] WireResult<Tag> readTag() {
-    if (cursor_ != limit_) [[likely]] {
-      // One byte: a number of 1 to 15.
-      const auto first = std::to_integer<std::uint32_t>(*cursor_);
-      if (first >= 8 && first < 0x80) [[likely]] {
-        ++cursor_;
-        return Tag{first};
-      }
-    }
+    if (const Tag tag = readShortTag(); tag.value != 0) [[likely]]
+      return tag;
     return readLongTag();
   }
 
@@ -75,27 +69,50 @@ class WireReader {
 
   // A length below 2^31 in up to five bytes, and as many bytes, all of them there.
   [[nodiscard]] WireResult<std::span<const std::byte>> readLengthDelimited() {
-    if (cursor_ != limit_) [[likely]] {
-      const auto length = std::to_integer<std::size_t>(*cursor_);
-      if (length < 0x80 && length < remaining()) [[likely]] {
-        const std::byte* const start = cursor_ + 1;
-        cursor_ = start + length;
-        return std::span(start, length);
-      }
-    }
+    std::span<const std::byte> body;
+    if (readShortLengthDelimited(body)) [[likely]]
+      return body;
     return readLongLengthDelimited();
+  }
+
+  // The common case of each, for readers in a hurry: a tag of one byte, a length of one byte and all of its
+  // bytes there. Otherwise nothing is read, and the tag is 0.
+  Tag readShortTag() {
+    if (cursor_ == limit_) [[unlikely]]
+      return Tag{0};
+    const auto first = std::to_integer<std::uint32_t>(*cursor_);
+    if (first < 8 || first >= 0x80) [[unlikely]]
+      return Tag{0};
+    ++cursor_;
+    return Tag{first};
+  }
+  bool readShortLengthDelimited(std::span<const std::byte>& body) {
+    if (remaining() < 2) [[unlikely]] return false;
+    auto length = std::to_integer<std::size_t>(cursor_[0]);
+    const std::byte* start = cursor_ + 1;
+    if (length >= 0x80) {
+      const auto second = std::to_integer<std::size_t>(cursor_[1]);
+      if (second >= 0x80) [[unlikely]] return false;
+      length = (length & 0x7F) | second << 7;
+      ++start;
+    }
+    if (length > static_cast<std::size_t>(limit_ - start)) [[unlikely]] return false;
+    body = std::span(start, length);
+    cursor_ = start + length;
+    return true;
   }
 
   // A little-endian number.
   [[nodiscard]] WireResult<std::uint32_t> readFixed32();
   [[nodiscard]] WireResult<std::uint64_t> readFixed64();
 
-  // Passes over the value behind `tag`, groups with all that they hold included. `nesting` is how many
-  // messages and groups the value is already in.
-  [[nodiscard]] WireResult<void> skipValue(Tag tag, int nesting);
+  // Passes over the value behind the tag that was read at `tagStart`, a group with all that it holds
+  // included. `nesting` is how many messages and groups the value is already in.
+  [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
 
-  // How many whole length-delimited records with this tag follow one another from here on. Consumes nothing.
-  std::size_t countRecords(Tag tag) const;
+  // How many whole length-delimited records with this tag follow, one behind the other, the length-delimited
+  // value that is next. Consumes nothing.
+  std::size_t countFollowing(Tag tag) const;
 
  private:
   WireResult<Tag> readLongTag();
@@ -104,7 +121,7 @@ class WireReader {
   WireResult<void> skipBytes(std::size_t count);
   template <class Number>
   WireResult<Number> readFixed();
-  WireResult<void> skipGroup(Tag start, int nesting);
+  WireResult<void> skipGroup(Tag start, const std::byte* tagStart, int nesting);
 
   const std::byte* cursor_ = nullptr;
   const std::byte* limit_ = nullptr;

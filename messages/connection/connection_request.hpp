@@ -15,6 +15,8 @@ class ConnectionRequest final : public Message<ConnectionRequest> {
  public:
   static constexpr std::string_view protoMessageName = "orv.ConnectionRequest";
 
+  ConnectionRequest() noexcept {}
+
   const Text& identifier() const { return identifier_; }
   Text& mutableIdentifier() { return identifier_; }
   void setIdentifier(Text value) { identifier_ = std::move(value); }

@@ -23,7 +23,7 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
      public:
       static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content.DeniedContent";
 
-      constexpr DeniedContent() = default;
+      DeniedContent() noexcept {}
 
      private:
       friend Message;  // the rules read the table
@@ -34,6 +34,8 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
     class ApprovalContent final : public Message<ApprovalContent> {
      public:
       static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content.ApprovalContent";
+
+      ApprovalContent() noexcept {}
 
       // Bytes that the device needs to take part; what they hold is between the peers.
       const ByteBuffer& invitationData() const { return invitationData_; }
@@ -52,6 +54,8 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
     using OneOf_Operation = std::variant<DeniedContent, ApprovalContent>;
 
     static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content";
+
+    Content() noexcept {}
 
     const Text& identifier() const { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
@@ -91,7 +95,7 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
 
   static constexpr std::string_view protoMessageName = "orv.ConnectionResponse";
 
-  constexpr ConnectionResponse() = default;
+  ConnectionResponse() noexcept {}
 
  private:
   friend Message;  // the rules read the table

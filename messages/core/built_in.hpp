@@ -13,8 +13,9 @@
 namespace orv {
 
 template <class M>
-BinaryDecoder::Result Message<M>::decodeMessage(BinaryDecoder& decoder) {
-  return decodeFields(decoder);
+std::expected<void, DecodeError> Message<M>::decodeMessage(BinaryDecoder& decoder) {
+  if (!decodeFields(decoder)) return std::unexpected(decoder.error());
+  return {};
 }
 
 template <class M>
@@ -61,7 +62,8 @@ std::string Message<M>::debugDescription() const {
 template <class M>
 std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes) {
   std::expected<M, DecodeError> message;
-  if (auto merged = message->merge(bytes); !merged) message = std::unexpected(merged.error());
+  BinaryDecoder decoder(bytes);
+  if (!message->decodeFields(decoder)) message = std::unexpected(decoder.error());
   return message;
 }
 

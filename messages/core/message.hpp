@@ -16,17 +16,13 @@
 #include "runtime/decoder.hpp"
 #include "runtime/encoded_size.hpp"
 #include "runtime/hash_visitor.hpp"
+#include "runtime/message_facts.hpp"
 #include "runtime/name_map.hpp"
 #include "runtime/text_renderer.hpp"
 #include "runtime/unknown_storage.hpp"
 #include "runtime/visitor.hpp"
 
 namespace orv {
-
-namespace rules {
-template <class Table>
-constexpr auto nameEntries(const Table& fields);
-}
 
 // The base of every message type M: a regular value that owns all that it holds. M adds its full name, its
 // accessors, its storage and, in a private table `fields`, one row per field in ascending order of the
@@ -42,6 +38,9 @@ class Message {
   // Field numbers and text names.
   static constexpr NameMap _protobuf_nameMap();
 
+  // Full name and fields, with the types of nested messages.
+  static constexpr const MessageFacts& messageFacts();
+
   // No message has required fields.
   static constexpr bool isInitialized() { return true; }
 
@@ -51,7 +50,7 @@ class Message {
   [[nodiscard]] DecodeResult<D> decodeMessage(D& decoder) {
     return decodeFields(decoder);
   }
-  [[nodiscard]] BinaryDecoder::Result decodeMessage(BinaryDecoder& decoder);
+  [[nodiscard]] std::expected<void, DecodeError> decodeMessage(BinaryDecoder& decoder);
 
   // Hands the fields that are to be emitted to the visitor, in ascending order, the unknown fields last. The
   // visitor's first error ends the walk and is returned as it was made.
@@ -104,12 +103,12 @@ class Message {
   std::size_t encodedSize() const;
 
  protected:
-  constexpr Message() = default;
+  Message() = default;
   Message(const Message&) = default;
   Message(Message&&) noexcept = default;
   Message& operator=(const Message&) = default;
   Message& operator=(Message&&) noexcept = default;
-  constexpr ~Message() = default;
+  ~Message() = default;
 
  private:
   M& self() { return static_cast<M&>(*this); }
@@ -130,8 +129,9 @@ class Message {
   template <class V, auto pointer, class Case>
   VisitResult<V> visitField(V& visitor, const Field<pointer, Case>& row) const;
 
+  // Tables made from M's; a template, because M is not complete where this class is.
   template <class Complete>
-  static constexpr auto nameEntries = rules::nameEntries(Complete::fields);
+  struct Constants;
 
   bool hasEqualFields(const M& other) const;
   template <auto pointer, class Case>

@@ -35,6 +35,13 @@ struct StorageTraits<std::vector<T>> {
   static constexpr bool isRepeated = true;
 };
 
+template <class Pointer>
+struct PointedTo;
+template <class M, class Storage>
+struct PointedTo<Storage M::*> {
+  using Type = Storage;
+};
+
 template <class T>
 concept AnyMessage = std::derived_from<T, Message<T>>;
 template <class T>
@@ -75,14 +82,16 @@ DecodeResult<D> decodeOneofMember(D& decoder, std::optional<std::variant<Cases..
   if constexpr (RereadingDecoder<D>) {
     if (!heldACase) {
       if (!decoder.isAtMessageField()) return {};
-      auto result = decoder.readMessageField(presentCase<Case>(group));
-      if (!result) group.reset();
-      return result;
+      if (auto read = decoder.readNewMessage(presentCase<Case>(group)); !read) {
+        group.reset();
+        return read;
+      }
+      return {};
     }
     if (held != nullptr) {
       if (auto checked = decoder.template checkMessageField<Case>(); !checked) return checked;
       if (auto accepted = decoder.handleConflictingOneOf(); !accepted) return accepted;
-      return decoder.readMessageField(*held);
+      return decoder.mergeMessageField(*held);
     }
   }
   std::optional<Case> working;
@@ -151,13 +160,13 @@ inline constexpr bool isFirstCase = false;
 template <class Case, class... Others>
 inline constexpr bool isFirstCase<Case, std::optional<std::variant<Case, Others...>>> = true;
 
-template <class Table>
-constexpr auto nameEntries(const Table& fields) {
-  return std::apply(
-      [](const auto&... rows) {
-        return std::array<NameMap::Entry, sizeof...(rows)>{NameMap::Entry{rows.number, rows.name}...};
-      },
-      fields);
+// The type of the message that a row's field holds, whatever its form; none for other fields.
+template <auto pointer, class Case>
+constexpr const MessageFacts* nestedFacts(const Field<pointer, Case>&) {
+  using Storage = typename PointedTo<decltype(pointer)>::Type;
+  using Value = std::conditional_t<std::is_void_v<Case>, typename StorageTraits<Storage>::Value, Case>;
+  if constexpr (AnyMessage<Value>) return &Value::messageFacts();
+  return nullptr;
 }
 
 }  // namespace orv::rules
@@ -166,8 +175,30 @@ namespace orv {
 
 template <class M>
 constexpr NameMap Message<M>::_protobuf_nameMap() {
-  return NameMap(nameEntries<M>);
+  return NameMap(Constants<M>::names);
 }
+
+template <class M>
+constexpr const MessageFacts& Message<M>::messageFacts() {
+  return Constants<M>::facts;
+}
+
+template <class M>
+template <class Complete>
+struct Message<M>::Constants {
+  static constexpr auto names = std::apply(
+      [](const auto&... rows) {
+        return std::array<NameMap::Entry, sizeof...(rows)>{NameMap::Entry{rows.number, rows.name}...};
+      },
+      Complete::fields);
+  static constexpr auto fields = std::apply(
+      [](const auto&... rows) {
+        return std::array<FieldFacts, sizeof...(rows)>{
+            FieldFacts{rows.number, rows.name, rules::nestedFacts(rows)}...};
+      },
+      Complete::fields);
+  static constexpr MessageFacts facts{Complete::protoMessageName, fields};
+};
 
 template <class M>
 template <class D>

@@ -49,13 +49,15 @@ class SessionMessage final : public Message<SessionMessage> {
  public:
   static constexpr std::string_view protoMessageName = "orv.SessionMessage";
 
-  std::uint32_t version() const { return valueOrDefault(version_); }
+  SessionMessage() noexcept {}
+
+  std::uint32_t version() const { return version_.value_or(0); }
   std::uint32_t& mutableVersion() { return presentValue(version_); }
   void setVersion(std::uint32_t value) { version_ = value; }
   bool hasVersion() const { return version_.has_value(); }
   void clearVersion() { version_.reset(); }
 
-  VessaSessionMessageType type() const { return valueOrDefault(type_); }
+  VessaSessionMessageType type() const { return type_.value_or(VessaSessionMessageType()); }
   VessaSessionMessageType& mutableType() { return presentValue(type_); }
   void setType(VessaSessionMessageType value) { type_ = value; }
   bool hasType() const { return type_.has_value(); }

@@ -7,14 +7,17 @@
 
 namespace orv {
 
-// What a getter gives for an absent field: one default value per type, made by the compiler.
+// What a getter gives for an absent field: one default value per type, made on first use and never freed.
 template <class T>
-inline constexpr T defaultInstance{};
+const T& defaultInstance() {
+  static const T& instance = *new T();
+  return instance;
+}
 
 // Lives as long as the field is unchanged, or forever.
 template <class T>
 const T& valueOrDefault(const std::optional<T>& field) {
-  return field.has_value() ? *field : defaultInstance<T>;
+  return field.has_value() ? *field : defaultInstance<T>();
 }
 
 // The value for change in place; an absent field becomes present with the default.
@@ -27,7 +30,7 @@ T& presentValue(std::optional<T>& field) {
 template <class Case, class... Cases>
 const Case& caseOrDefault(const std::optional<std::variant<Cases...>>& group) {
   const Case* const held = group.has_value() ? std::get_if<Case>(&*group) : nullptr;
-  return held != nullptr ? *held : defaultInstance<Case>;
+  return held != nullptr ? *held : defaultInstance<Case>();
 }
 
 // The payload for change in place; a group that holds another case, or none, is switched to a default payload

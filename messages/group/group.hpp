@@ -22,6 +22,8 @@ class Group final : public Message<Group> {
    public:
     static constexpr std::string_view protoMessageName = "orv.Group.Initialization";
 
+    Initialization() noexcept {}
+
     const ByteBuffer& groupUuid() const { return groupUuid_; }
     ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
@@ -46,6 +48,8 @@ class Group final : public Message<Group> {
   class MemberAdded final : public Message<MemberAdded> {
    public:
     static constexpr std::string_view protoMessageName = "orv.Group.MemberAdded";
+
+    MemberAdded() noexcept {}
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
     ByteBuffer& mutableGroupUuid() { return groupUuid_; }
@@ -73,6 +77,8 @@ class Group final : public Message<Group> {
    public:
     static constexpr std::string_view protoMessageName = "orv.Group.MemberRemoved";
 
+    MemberRemoved() noexcept {}
+
     const ByteBuffer& groupUuid() const { return groupUuid_; }
     ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
@@ -99,6 +105,8 @@ class Group final : public Message<Group> {
    public:
     static constexpr std::string_view protoMessageName = "orv.Group.MemberLeft";
 
+    MemberLeft() noexcept {}
+
     const ByteBuffer& groupUuid() const { return groupUuid_; }
     ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
@@ -121,6 +129,8 @@ class Group final : public Message<Group> {
   using OneOf_Event = std::variant<Initialization, MemberAdded, MemberRemoved, MemberLeft>;
 
   static constexpr std::string_view protoMessageName = "orv.Group";
+
+  Group() noexcept {}
 
   // The event as a whole: none, or one case with its payload.
   const std::optional<OneOf_Event>& event() const { return event_; }

@@ -15,6 +15,8 @@ class Member final : public Message<Member> {
  public:
   static constexpr std::string_view protoMessageName = "orv.Member";
 
+  Member() noexcept {}
+
   // How the member is addressed.
   const Text& handle() const { return handle_; }
   Text& mutableHandle() { return handle_; }

@@ -18,6 +18,8 @@ class JoinRequest final : public Message<JoinRequest> {
    public:
     static constexpr std::string_view protoMessageName = "orv.JoinRequest.Content";
 
+    Content() noexcept {}
+
     const Text& identifier() const { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
     void setIdentifier(Text value) { identifier_ = std::move(value); }
@@ -37,7 +39,7 @@ class JoinRequest final : public Message<JoinRequest> {
     void clearUserInfo() { userInfo_.reset(); }
 
     // Whether the device asks for a token URI; absent, false and true are three different things.
-    bool wantsTokenUri() const { return valueOrDefault(wantsTokenUri_); }
+    bool wantsTokenUri() const { return wantsTokenUri_.value_or(false); }
     bool& mutableWantsTokenUri() { return presentValue(wantsTokenUri_); }
     void setWantsTokenUri(bool value) { wantsTokenUri_ = value; }
     bool hasWantsTokenUri() const { return wantsTokenUri_.has_value(); }
@@ -59,6 +61,8 @@ class JoinRequest final : public Message<JoinRequest> {
   };
 
   static constexpr std::string_view protoMessageName = "orv.JoinRequest";
+
+  JoinRequest() noexcept {}
 
   const ByteBuffer& publicKey() const { return valueOrDefault(publicKey_); }
   ByteBuffer& mutablePublicKey() { return presentValue(publicKey_); }

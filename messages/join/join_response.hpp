@@ -23,7 +23,7 @@ class JoinResponse final : public Message<JoinResponse> {
      public:
       static constexpr std::string_view protoMessageName = "orv.JoinResponse.Content.DeniedContent";
 
-      constexpr DeniedContent() = default;
+      DeniedContent() noexcept {}
 
      private:
       friend Message;  // the rules read the table
@@ -34,6 +34,8 @@ class JoinResponse final : public Message<JoinResponse> {
     class ApprovalContent final : public Message<ApprovalContent> {
      public:
       static constexpr std::string_view protoMessageName = "orv.JoinResponse.Content.ApprovalContent";
+
+      ApprovalContent() noexcept {}
 
       const Text& sessionIdentifier() const { return sessionIdentifier_; }
       Text& mutableSessionIdentifier() { return sessionIdentifier_; }
@@ -68,6 +70,8 @@ class JoinResponse final : public Message<JoinResponse> {
 
     static constexpr std::string_view protoMessageName = "orv.JoinResponse.Content";
 
+    Content() noexcept {}
+
     const Text& identifier() const { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
     void setIdentifier(Text value) { identifier_ = std::move(value); }
@@ -99,6 +103,8 @@ class JoinResponse final : public Message<JoinResponse> {
   };
 
   static constexpr std::string_view protoMessageName = "orv.JoinResponse";
+
+  JoinResponse() noexcept {}
 
   const ByteBuffer& encryptedData() const { return valueOrDefault(encryptedData_); }
   ByteBuffer& mutableEncryptedData() { return presentValue(encryptedData_); }

@@ -1,0 +1,142 @@
+#include "runtime/delimited_stream.hpp"
+
+#include <google/protobuf/io/coded_stream.h>
+#include <google/protobuf/io/zero_copy_stream_impl_lite.h>
+
+#include <algorithm>
+#include <array>
+#include <limits>
+#include <string_view>
+#include <vector>
+
+namespace orv {
+
+namespace {
+
+namespace io = google::protobuf::io;
+
+// In the order of StreamError::Cause.
+constexpr std::array<std::string_view, 5> sentences{
+    "the stream could not be read",
+    "the stream ends inside a message",
+    "length of 2^31 or more, or spelled in more than five bytes",
+    "message longer than is allowed",
+    "malformed message",
+};
+static_assert(sentences.size() == static_cast<std::size_t>(StreamError::Cause::malformedMessage) + 1);
+
+// The read function as libprotobuf's streams see it.
+class ReadFunctionStream final : public io::CopyingInputStream {
+ public:
+  explicit ReadFunctionStream(ReadFunction read) : read_(std::move(read)) {}
+
+  int Read(void* buffer, int size) override {
+    const std::ptrdiff_t count =
+        read_(std::span(static_cast<std::byte*>(buffer), static_cast<std::size_t>(size)));
+    hasFailed_ = hasFailed_ || count < 0;
+    return static_cast<int>(count);
+  }
+  bool hasFailed() const { return hasFailed_; }
+
+ private:
+  ReadFunction read_;
+  bool hasFailed_ = false;
+};
+
+}  // namespace
+
+std::string StreamError::message() const {
+  const std::string where = ", at byte " + std::to_string(offset);
+  if (decodeError.has_value()) {
+    const std::string path = decodeError->path.text();
+    return (path.empty() ? "" : path + ": ") + decodeError->reason() + where;
+  }
+  std::string text(sentences[static_cast<std::size_t>(cause)]);
+  if (cause == Cause::tooLarge) text += " (" + std::to_string(length) + " bytes)";
+  return text + where;
+}
+
+class DelimitedReader::Source {
+ public:
+  Source(ReadFunction read, std::size_t maximumSize)
+      : stream_(std::move(read)), buffered_(&stream_), maximumSize_(maximumSize) {}
+
+  std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
+  std::uint64_t messageOffset() const { return messageOffset_; }
+
+ private:
+  std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0) const {
+    const auto actual = stream_.hasFailed() ? StreamError::Cause::readFailed : cause;
+    return std::unexpected(StreamError{.cause = actual, .offset = messageOffset_, .length = length});
+  }
+
+  ReadFunctionStream stream_;
+  io::CopyingInputStreamAdaptor buffered_;
+  std::size_t maximumSize_;
+  std::uint64_t messageOffset_ = 0;
+  std::uint64_t nextOffset_ = 0;
+  std::vector<std::byte> message_;
+};
+
+std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::Source::next() {
+  // One for each message: it counts what it reads in an int.
+  io::CodedInputStream input(&buffered_);
+  messageOffset_ = nextOffset_;
+
+  constexpr int longestLength = 5;
+  std::uint64_t length = 0;
+  for (int index = 0;; ++index) {
+    std::uint8_t byte = 0;
+    if (index == longestLength) return fail(StreamError::Cause::malformedLength);
+    if (!input.ReadRaw(&byte, 1)) {
+      if (index == 0 && !stream_.hasFailed()) return std::nullopt;
+      return fail(StreamError::Cause::truncated);
+    }
+    length |= std::uint64_t{byte & 0x7FU} << (7 * index);
+    if (byte < 0x80) break;
+  }
+  if (length > std::numeric_limits<std::int32_t>::max()) return fail(StreamError::Cause::malformedLength);
+  if (length > maximumSize_) return fail(StreamError::Cause::tooLarge, length);
+
+  // What is announced is made room for as it arrives.
+  message_.clear();
+  while (message_.size() < length) {
+    constexpr std::size_t firstPiece = std::size_t{64} << 10;
+    const std::size_t had = message_.size();
+    const std::size_t piece = std::min<std::size_t>(length - had, std::max(firstPiece, had));
+    message_.resize(had + piece);
+    if (!input.ReadRaw(message_.data() + had, static_cast<int>(piece)))
+      return fail(StreamError::Cause::truncated);
+  }
+  messageOffset_ += static_cast<std::uint64_t>(input.CurrentPosition()) - length;
+  nextOffset_ = messageOffset_ + length;
+  return std::span<const std::byte>(message_);
+}
+
+DelimitedReader::DelimitedReader(ReadFunction read, std::size_t maximumSizeInBytes)
+    : source_(std::make_unique<Source>(std::move(read), maximumSizeInBytes)) {}
+DelimitedReader::DelimitedReader(DelimitedReader&&) noexcept = default;
+DelimitedReader& DelimitedReader::operator=(DelimitedReader&&) noexcept = default;
+DelimitedReader::~DelimitedReader() = default;
+
+std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::next() {
+  return source_->next();
+}
+
+std::uint64_t DelimitedReader::messageOffset() const { return source_->messageOffset(); }
+
+StreamError DelimitedReader::malformedMessage(const DecodeError& error) const {
+  return {.cause = StreamError::Cause::malformedMessage,
+          .offset = messageOffset() + error.offset,
+          .length = 0,
+          .decodeError = error};
+}
+
+void appendDelimited(std::string_view bytes, std::string& output) {
+  std::array<std::uint8_t, 10> length;
+  const auto* const end = io::CodedOutputStream::WriteVarint64ToArray(bytes.size(), length.data());
+  output.append(reinterpret_cast<const char*>(length.data()), static_cast<std::size_t>(end - length.data()));
+  output += bytes;
+}
+
+}  // namespace orv

@@ -1,0 +1,32 @@
+// What is known of a message type without a value of it.
+#pragma once
+
+#include <cstdint>
+#include <span>
+#include <string_view>
+
+namespace orv {
+
+struct MessageFacts;
+
+struct FieldFacts {
+  std::uint32_t number;
+  std::string_view name;
+  const MessageFacts* message;  // the type of a nested message; none for other fields
+};
+
+// One constant per message type; all that it refers to lasts as long as the program.
+struct MessageFacts {
+  std::string_view fullName;
+  std::span<const FieldFacts> fields;  // in ascending order of their numbers
+
+  // None for a number that the message does not define.
+  constexpr const FieldFacts* field(std::uint32_t number) const {
+    for (const FieldFacts& candidate : fields) {
+      if (candidate.number == number) return &candidate;
+    }
+    return nullptr;
+  }
+};
+
+}  // namespace orv
