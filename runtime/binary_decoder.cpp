@@ -39,7 +39,7 @@ std::unexpected<BinaryDecoder::Failure> BinaryDecoder::fail(const WireFault& fau
   error.length = fault.length;
   error.detail = fault.detail;
   error.offset = static_cast<std::size_t>(fault.at - outermost.begin_);
-  error.path = FieldPath(*outermost.message_);
+  error.path.startFrom(*outermost.message_);
   for (const BinaryDecoder* decoder = this; decoder != nullptr; decoder = decoder->outer_) {
     error.path.prepend(decoder->tag_.fieldNumber());
   }

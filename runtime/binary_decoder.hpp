@@ -1,9 +1,12 @@
 // Reads messages from their binary encoding.
 #pragma once
 
+#include <algorithm>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
+#include <limits>
 #include <optional>
 #include <span>
 #include <string_view>
@@ -31,7 +34,8 @@ class ConflictHook {
   constexpr ConflictHook() = default;
 
   template <class Callable>
-    requires std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>
+    requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
+             std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
   ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
       : callable_(&callable), call_([](void* target) -> std::expected<void, DecodeError> {
           return (*static_cast<Callable*>(target))();
@@ -276,12 +280,15 @@ class BinaryDecoder {
   }
 
   // Before an element is added to a full list: room for it and for the records of the same field that follow its
-  // own directly, so that a list that arrives in one run is allocated once.
+  // own directly. A list that arrives in one run is thus allocated twice at most: for its first few elements, so that
+  // an error among them is found before the whole run was counted, and then for all.
   template <class T>
   void makeRoom(std::vector<T>& list) const {
     if (list.size() < list.capacity()) [[likely]] return;
-    const std::size_t run = 1 + reader_.countFollowing(tag_);
-    list.reserve(list.size() + (run > list.size() ? run : list.size()));
+    constexpr std::size_t firstFew = 16;
+    const std::size_t most = list.empty() ? firstFew - 1 : std::numeric_limits<std::size_t>::max();
+    const std::size_t run = 1 + reader_.countFollowing(tag_, most);
+    list.reserve(list.size() + std::max(run, list.size()));
   }
 
   static std::unexpected<Failure> failed() { return std::unexpected(Failure()); }

@@ -3,16 +3,12 @@
 #include <google/protobuf/io/coded_stream.h>
 
 #include <algorithm>
-#include <limits>
 
 namespace orv {
 
 namespace {
 
 using google::protobuf::io::CodedOutputStream;
-
-// The format's lengths, and those of the libraries that read it, are signed 32-bit numbers.
-constexpr std::size_t largestEncoding = std::numeric_limits<std::int32_t>::max();
 
 std::uint32_t tagValue(std::uint32_t number, WireType type) {
   return number << 3 | static_cast<std::uint32_t>(type);
@@ -30,22 +26,7 @@ char* writeVarint(std::uint64_t value, char* target) {
 
 }  // namespace
 
-BinaryEncoder::BinaryEncoder(std::string& output)
-    : begin_(output.data() + output.size()),
-      cursor_(begin_),
-      limit_(begin_),
-      growing_(&output),
-      oldSize_(output.size()) {}
-
-BinaryEncoder::BinaryEncoder(std::span<std::byte> buffer)
-    : begin_(reinterpret_cast<char*>(buffer.data())),
-      cursor_(begin_),
-      limit_(begin_ + std::min(buffer.size(), largestEncoding)) {}
-
-std::size_t BinaryEncoder::finish() {
-  if (growing_ != nullptr) growing_->resize(oldSize_ + written());
-  return written();
-}
+void BinaryEncoder::trimString() { growing_->resize(oldSize_ + written()); }
 
 BinaryEncoder::Result BinaryEncoder::visitUnknownFields(const UnknownStorage& unknownFields) {
   const std::span<const std::byte> records = unknownFields.records();

@@ -1,10 +1,12 @@
 // Writes messages in their binary encoding.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
 #include <expected>
+#include <limits>
 #include <span>
 #include <string>
 #include <string_view>
@@ -36,16 +38,33 @@ class BinaryEncoder {
   using Result = std::expected<void, EncodeError>;
 
   // Appends to `output`, which holds the bytes once finish() was called, and must outlive the encoder.
-  explicit BinaryEncoder(std::string& output);
-  // Writes from the start of `buffer`, which stays the caller's. An encoding fits where it fits exactly;
-  // while it is written, a wrong guess of a nested length may need up to four bytes more.
-  explicit BinaryEncoder(std::span<std::byte> buffer);
+  explicit BinaryEncoder(std::string& output)
+      : begin_(output.data() + output.size()),
+        cursor_(begin_),
+        limit_(begin_),
+        growing_(&output),
+        oldSize_(output.size()) {}
+
+  // Writes from the start of `buffer`, which stays the caller's. With careful guesses an encoding fits where it fits
+  // exactly; with bold ones, which are right more often, it may need a few bytes more while it is being written.
+  enum class Guesses : std::uint8_t { bold, careful };
+  explicit BinaryEncoder(std::span<std::byte> buffer, Guesses guesses = Guesses::careful)
+      : begin_(reinterpret_cast<char*>(buffer.data())),
+        cursor_(begin_),
+        limit_(begin_ + std::min(buffer.size(), largestEncoding)),
+        guesses_(guesses) {}
 
   BinaryEncoder(const BinaryEncoder&) = delete;
   BinaryEncoder& operator=(const BinaryEncoder&) = delete;
 
   // How many bytes were written. A string that is appended to gets its final size.
-  std::size_t finish();
+  std::size_t finish() {
+    if (growing_ != nullptr) trimString();
+    return written();
+  }
+
+  // The format's lengths, and those of the libraries that read it, are signed 32-bit numbers.
+  static constexpr std::size_t largestEncoding = std::numeric_limits<std::int32_t>::max();
 
   // The operations that Visitor lists.
 
@@ -71,7 +90,7 @@ class BinaryEncoder {
 
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    const std::size_t lengthBytes = 1;
+    const std::size_t lengthBytes = likelyLengthBytes(message);
     if (auto begun = beginNested(number, lengthBytes); !begun) return begun;
     const auto start = written();
     if (auto walked = message.traverse(*this); !walked) return walked;
@@ -99,41 +118,64 @@ class BinaryEncoder {
   // Tags of the field numbers 1 to 15 and varints below 128 take one byte.
   static constexpr std::uint32_t shortNumbers = 16;
   static constexpr std::uint64_t shortVarints = 0x80;
+  // Varints below this take two.
+  static constexpr std::uint64_t mediumVarints = 0x4000;
 
   std::size_t room() const { return static_cast<std::size_t>(limit_ - cursor_); }
   std::size_t written() const { return static_cast<std::size_t>(cursor_ - begin_); }
-  void putShort(std::uint64_t value) { *cursor_++ = static_cast<char>(value); }
-  void putShortTag(std::uint32_t number, WireType type) {
-    putShort(number << 3 | static_cast<std::uint32_t>(type));
+  static char shortTag(std::uint32_t number, WireType type) {
+    return static_cast<char>(number << 3 | static_cast<std::uint32_t>(type));
   }
 
-  // Where there is room enough, short contents are written in one fixed-size step; what is behind them is
-  // overwritten.
+  // Where there is room enough, short contents are written in one fixed-size step; what is behind them is overwritten.
   Result writeBytes(const InlineBytes& bytes, std::uint32_t number) {
-    if (number < shortNumbers && !bytes.isOnHeap() && room() >= 2 + InlineBytes::objectSize) [[likely]] {
-      const std::string_view contents = bytes.view();
-      putShortTag(number, WireType::lengthDelimited);
-      putShort(contents.size());
-      std::memcpy(cursor_, contents.data(), InlineBytes::objectSize);
-      cursor_ += contents.size();
-      return {};
+    const std::string_view contents = bytes.view();
+    if (number < shortNumbers) [[likely]] {
+      // A copy of the cursor, because what is written through it might, for all the compiler knows, be the cursor.
+      char* target = cursor_;
+      if (!bytes.isOnHeap() && room() >= 2 + InlineBytes::objectSize) [[likely]] {
+        target[0] = shortTag(number, WireType::lengthDelimited);
+        target[1] = static_cast<char>(contents.size());
+        std::memcpy(target + 2, contents.data(), InlineBytes::objectSize);
+        cursor_ = target + 2 + contents.size();
+        return {};
+      }
+      if (contents.size() < mediumVarints && room() >= 3 + contents.size()) [[likely]] {
+        *target++ = shortTag(number, WireType::lengthDelimited);
+        if (contents.size() >= shortVarints) *target++ = static_cast<char>((contents.size() & 0x7F) | 0x80);
+        *target++ = static_cast<char>(contents.size() >= shortVarints ? contents.size() >> 7 : contents.size());
+        std::memcpy(target, contents.data(), contents.size());
+        cursor_ = target + contents.size();
+        return {};
+      }
     }
-    return writeLongBytes(bytes.view(), number);
+    return writeLongBytes(contents, number);
   }
 
   Result writeNumber(std::uint64_t value, std::uint32_t number) {
     if (number < shortNumbers && value < shortVarints && room() >= 2) [[likely]] {
-      putShortTag(number, WireType::varint);
-      putShort(value);
+      char* const target = cursor_;
+      target[0] = shortTag(number, WireType::varint);
+      target[1] = static_cast<char>(value);
+      cursor_ = target + 2;
       return {};
     }
     return writeLongNumber(value, number);
   }
 
+  // One, unless there are lists in the message: their elements are taken to be like the first.
+  template <class M>
+  std::size_t likelyLengthBytes(const M& message) const {
+    if constexpr (M::messageFacts().hasLists()) {
+      if (guesses_ == Guesses::bold) return varintSize(likelyEncodedSize(message));
+    }
+    return 1;
+  }
+
   Result beginNested(std::uint32_t number, std::size_t lengthBytes) {
     if (number < shortNumbers && room() >= 1 + lengthBytes) [[likely]] {
-      putShortTag(number, WireType::lengthDelimited);
-      cursor_ += lengthBytes;
+      *cursor_ = shortTag(number, WireType::lengthDelimited);
+      cursor_ += 1 + lengthBytes;
       return {};
     }
     return beginLongNested(number, lengthBytes);
@@ -153,10 +195,12 @@ class BinaryEncoder {
   Result beginLongNested(std::uint32_t number, std::size_t lengthBytes);
   Result endLongNested(std::size_t start, std::size_t lengthBytes);
   Result makeRoom(std::size_t size);
+  void trimString();
 
   char* begin_;
   char* cursor_;
   char* limit_;
+  Guesses guesses_ = Guesses::bold;
   std::string* growing_ = nullptr;  // none: a caller's buffer
   std::size_t oldSize_ = 0;         // what the string held before
 };

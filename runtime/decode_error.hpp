@@ -38,8 +38,8 @@ class FieldPath {
   // Steps beyond this many are left out, the innermost first.
   static constexpr std::size_t capacity = 5;
 
-  constexpr FieldPath() = default;
-  constexpr explicit FieldPath(const MessageFacts& outermost) : outermost_(&outermost) {}
+  // An empty path takes its outermost message first, then its fields from the innermost out.
+  void startFrom(const MessageFacts& outermost) { outermost_ = &outermost; }
 
   // Puts the field of the enclosing message in front. Number 0 stands for no field: it is where a message has
   // none.

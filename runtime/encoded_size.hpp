@@ -13,16 +13,22 @@
 
 namespace orv {
 
-// How many bytes a varint takes: one for each seven bits up to the highest that is set.
+// How many bytes a varint takes: one for each seven bits up to the highest that is set. 9/64 is a seventh rounded up,
+// and exact for up to 64 bits.
 constexpr std::size_t varintSize(std::uint64_t value) {
-  return (static_cast<std::size_t>(std::bit_width(value | 1)) + 6) / 7;
+  return (9 * static_cast<std::size_t>(std::bit_width(value | 1)) + 64) / 64;
 }
 
-// A visitor that adds up what BinaryEncoder would write.
+// A visitor that adds up what BinaryEncoder would write. Asked for a likely size, it takes the elements of a list of
+// messages to be like the first.
 class SizeCounter {
  public:
   using Error = NeverFails;
   using Result = std::expected<void, NeverFails>;
+
+  enum class Aim : std::uint8_t { exact, likely };
+
+  explicit SizeCounter(Aim aim = Aim::exact) : aim_(aim) {}
 
   std::uint64_t size() const { return size_; }
 
@@ -43,7 +49,7 @@ class SizeCounter {
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    SizeCounter nested;
+    SizeCounter nested(aim_);
     (void)message.traverse(nested);
     return addLengthDelimited(number, nested.size());
   }
@@ -53,6 +59,12 @@ class SizeCounter {
   }
   template <class M>
   Result visitRepeatedMessageField(const std::vector<M>& messages, std::uint32_t number) {
+    if (aim_ == Aim::likely) {
+      SizeCounter first(aim_);
+      (void)first.visitSingularMessageField(messages.front(), number);
+      size_ += messages.size() * first.size();
+      return {};
+    }
     for (const M& message : messages) (void)visitSingularMessageField(message, number);
     return {};
   }
@@ -71,6 +83,15 @@ class SizeCounter {
   }
 
   std::uint64_t size_ = 0;
+  Aim aim_;
 };
+
+// About how many bytes the message's encoding has. Takes no longer for a longer list of messages.
+template <class M>
+std::uint64_t likelyEncodedSize(const M& message) {
+  SizeCounter counter(SizeCounter::Aim::likely);
+  (void)message.traverse(counter);
+  return counter.size();
+}
 
 }  // namespace orv

@@ -96,8 +96,11 @@ class InlineBytes {
     std::memcpy(&block, raw_, sizeof block);
     return block;
   }
+  // Member by member: as one piece, g++ 12 writes it to memory first and waits for it there, 5 ns each time.
   void holdBlock(const Block& block) {
-    std::memcpy(raw_, &block, sizeof block);
+    std::memcpy(raw_ + offsetof(Block, data), &block.data, sizeof block.data);
+    std::memcpy(raw_ + offsetof(Block, size), &block.size, sizeof block.size);
+    std::memcpy(raw_ + offsetof(Block, capacity), &block.capacity, sizeof block.capacity);
     raw_[tagOffset] = heapTag;
   }
   void replaceByOwnBlock();

@@ -13,12 +13,20 @@ struct FieldFacts {
   std::uint32_t number;
   std::string_view name;
   const MessageFacts* message;  // the type of a nested message; none for other fields
+  bool isRepeated;
 };
 
 // One constant per message type; all that it refers to lasts as long as the program.
 struct MessageFacts {
   std::string_view fullName;
   std::span<const FieldFacts> fields;  // in ascending order of their numbers
+
+  constexpr bool hasLists() const {
+    for (const FieldFacts& field : fields) {
+      if (field.isRepeated) return true;
+    }
+    return false;
+  }
 
   // None for a number that the message does not define.
   constexpr const FieldFacts* field(std::uint32_t number) const {

@@ -46,7 +46,9 @@ void UnknownStorage::append(std::span<const std::byte> records) {
 }
 
 bool UnknownStorage::hasSameRecords(const UnknownStorage& other) const {
-  return std::ranges::equal(records(), other.records());
+  const std::span<const std::byte> left = records();
+  const std::span<const std::byte> right = other.records();
+  return left.size() == right.size() && std::memcmp(left.data(), right.data(), left.size()) == 0;
 }
 
 void UnknownStorage::freeBlock() noexcept { ::operator delete(block_); }

@@ -59,7 +59,8 @@ class UnknownStorage {
   }
 
   friend bool operator==(const UnknownStorage& left, const UnknownStorage& right) {
-    return left.block_ == right.block_ || left.hasSameRecords(right);
+    if (left.isEmpty() || right.isEmpty()) return left.block_ == right.block_;
+    return left.hasSameRecords(right);
   }
 
   // For decoders: adds records, which must be well-formed.

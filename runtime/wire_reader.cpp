@@ -130,13 +130,16 @@ WireResult<void> WireReader::skipGroup(Tag start, const std::byte* tagStart, int
   }
 }
 
-std::size_t WireReader::countFollowing(Tag tag) const {
+std::size_t WireReader::countFollowing(Tag tag, std::size_t most) const {
   WireReader probe(*this);
-  if (!probe.readLengthDelimited()) return 0;
-  for (std::size_t count = 0;; ++count) {
-    const auto next = probe.isAtEnd() ? Tag{0} : probe.readTag().value_or(Tag{0});
-    if (next.value != tag.value || !probe.readLengthDelimited()) return count;
+  std::size_t count = 0;
+  if (!probe.readLengthDelimited()) return count;
+  while (count < most && !probe.isAtEnd()) {
+    const auto next = probe.readTag();
+    if (!next || next->value != tag.value || !probe.readLengthDelimited()) break;
+    ++count;
   }
+  return count;
 }
 
 }  // namespace orv

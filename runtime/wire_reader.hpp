@@ -110,9 +110,9 @@ class WireReader {
   // included. `nesting` is how many messages and groups the value is already in.
   [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
 
-  // How many whole length-delimited records with this tag follow, one behind the other, the length-delimited
-  // value that is next. Consumes nothing.
-  std::size_t countFollowing(Tag tag) const;
+  // How many whole length-delimited records with this tag follow, one behind the other, the length-delimited value
+  // that is next; at most `most`. Consumes nothing.
+  std::size_t countFollowing(Tag tag, std::size_t most) const;
 
  private:
   WireResult<Tag> readLongTag();

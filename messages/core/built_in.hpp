@@ -14,8 +14,8 @@ namespace orv {
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::decodeMessage(BinaryDecoder& decoder) {
-  if (!decodeFields(decoder)) return std::unexpected(decoder.error());
-  return {};
+  if (decodeFields(decoder)) [[likely]] return {};
+  return std::expected<void, DecodeError>(std::unexpect, decoder.error());
 }
 
 template <class M>
@@ -63,34 +63,41 @@ template <class M>
 std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes) {
   std::expected<M, DecodeError> message;
   BinaryDecoder decoder(bytes);
-  if (!message->decodeFields(decoder)) message = std::unexpected(decoder.error());
+  if (!message->decodeFields(decoder)) [[unlikely]] message = std::unexpected(decoder.error());
   return message;
 }
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
   BinaryDecoder decoder(bytes);
-  return decodeMessage(decoder);
+  if (decodeFields(decoder)) [[likely]] return {};
+  return std::expected<void, DecodeError>(std::unexpect, decoder.error());
 }
 
 template <class M>
 std::expected<std::string, EncodeError> Message<M>::serialize() const {
   // Most messages fit here, and then their string is allocated once, at its final size.
   std::array<std::byte, 1024> buffer;
-  BinaryEncoder encoder{std::span(buffer)};
-  if (traverse(encoder)) return std::string(reinterpret_cast<const char*>(buffer.data()), encoder.finish());
+  BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::bold);
+  if (visitFields(encoder)) return std::string(reinterpret_cast<const char*>(buffer.data()), encoder.finish());
+  // Larger ones are counted first.
+  const std::size_t size = encodedSize();
+  if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
   std::string bytes;
-  BinaryEncoder growing(bytes);
-  if (auto walked = traverse(growing); !walked) return std::unexpected(walked.error());
-  growing.finish();
+  bytes.resize_and_overwrite(size, [&](char* target, std::size_t room) {
+    return serializeInto(std::as_writable_bytes(std::span(target, room))).value_or(0);
+  });
   return bytes;
 }
 
 template <class M>
 std::expected<std::size_t, EncodeError> Message<M>::serializeInto(std::span<std::byte> buffer) const {
-  BinaryEncoder encoder(buffer);
-  if (auto walked = traverse(encoder); !walked) return std::unexpected(walked.error());
-  return encoder.finish();
+  BinaryEncoder bold(buffer, BinaryEncoder::Guesses::bold);
+  if (visitFields(bold)) return bold.finish();
+  // It may have been a guess that took too much room.
+  BinaryEncoder careful(buffer, BinaryEncoder::Guesses::careful);
+  if (auto walked = visitFields(careful); !walked) return std::unexpected(walked.error());
+  return careful.finish();
 }
 
 template <class M>

@@ -124,8 +124,6 @@ class Message {
 
   template <class V>
   VisitResult<V> visitFields(V& visitor) const;
-  template <std::size_t index, class V>
-  VisitResult<V> visitRow(V& visitor) const;
   template <class V, auto pointer, class Case>
   VisitResult<V> visitField(V& visitor, const Field<pointer, Case>& row) const;
 

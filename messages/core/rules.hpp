@@ -160,13 +160,13 @@ inline constexpr bool isFirstCase = false;
 template <class Case, class... Others>
 inline constexpr bool isFirstCase<Case, std::optional<std::variant<Case, Others...>>> = true;
 
-// The type of the message that a row's field holds, whatever its form; none for other fields.
 template <auto pointer, class Case>
-constexpr const MessageFacts* nestedFacts(const Field<pointer, Case>&) {
-  using Storage = typename PointedTo<decltype(pointer)>::Type;
-  using Value = std::conditional_t<std::is_void_v<Case>, typename StorageTraits<Storage>::Value, Case>;
-  if constexpr (AnyMessage<Value>) return &Value::messageFacts();
-  return nullptr;
+constexpr FieldFacts factsOfRow(const Field<pointer, Case>& row) {
+  using Traits = StorageTraits<typename PointedTo<decltype(pointer)>::Type>;
+  using Value = std::conditional_t<std::is_void_v<Case>, typename Traits::Value, Case>;
+  const MessageFacts* message = nullptr;
+  if constexpr (AnyMessage<Value>) message = &Value::messageFacts();
+  return {row.number, row.name, message, Traits::isRepeated};
 }
 
 }  // namespace orv::rules
@@ -193,8 +193,7 @@ struct Message<M>::Constants {
       Complete::fields);
   static constexpr auto fields = std::apply(
       [](const auto&... rows) {
-        return std::array<FieldFacts, sizeof...(rows)>{
-            FieldFacts{rows.number, rows.name, rules::nestedFacts(rows)}...};
+        return std::array<FieldFacts, sizeof...(rows)>{rules::factsOfRow(rows)...};
       },
       Complete::fields);
   static constexpr MessageFacts facts{Complete::protoMessageName, fields};
@@ -240,20 +239,14 @@ DecodeResult<D> Message<M>::decodeField(D& decoder, const Field<pointer, Case>&)
 template <class M>
 template <class V>
 VisitResult<V> Message<M>::visitFields(V& visitor) const {
-  return visitRow<0>(visitor);
-}
-
-template <class M>
-template <std::size_t index, class V>
-VisitResult<V> Message<M>::visitRow(V& visitor) const {
-  if constexpr (index == std::tuple_size_v<decltype(M::fields)>) {
-    return unknownFields_.traverse(visitor);
-  } else {
-    auto result = visitField(visitor, std::get<index>(M::fields));
-    if (!result) [[unlikely]]
-      return result;
-    return visitRow<index + 1>(visitor);
-  }
+  VisitResult<V> result;
+  const auto visitRow = [&](const auto& row) {
+    result = visitField(visitor, row);
+    return result.has_value();
+  };
+  const auto visitRows = [&](const auto&... rows) { return (visitRow(rows) && ...); };
+  if (!std::apply(visitRows, M::fields)) return result;
+  return unknownFields_.traverse(visitor);
 }
 
 template <class M>
