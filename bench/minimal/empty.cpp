@@ -1,0 +1,2 @@
+// What a program costs that does nothing.
+int main() {}

@@ -1,0 +1,44 @@
+#pragma once
+
+#include <google/protobuf/arena.h>
+
+#include "bench/peers/official.hpp"
+
+namespace bench {
+
+// An arena with a message on it. The arena's first block of 4 KiB is part of the value, so that a small
+// message takes no block from the heap (texts beyond 15 bytes still do: the official strings own their
+// characters).
+template <class Message>
+class ArenaMessage {
+ public:
+  ArenaMessage()
+      : arena_(block_, sizeof block_), message_(google::protobuf::Arena::CreateMessage<Message>(&arena_)) {}
+  ArenaMessage(const ArenaMessage& other) : ArenaMessage() { message_->CopyFrom(*other.message_); }
+
+  Message& operator*() { return *message_; }
+  const Message& operator*() const { return *message_; }
+
+ private:
+  alignas(8) char block_[4096];
+  google::protobuf::Arena arena_;
+  Message* message_;
+};
+
+struct OfficialArena : Official {
+  static constexpr std::string_view name = "official-arena";
+
+  template <Kind kind>
+  using Value = ArenaMessage<Official::Value<kind>>;
+
+  static bool decode(auto& value, std::string_view bytes) { return Official::decode(*value, bytes); }
+  static bool decodeAgain(auto& value, std::string_view bytes) { return decode(value, bytes); }
+  static std::string encode(const auto& value) { return Official::encode(*value); }
+  static std::size_t encodeInto(const auto& value, std::span<char> buffer) {
+    return Official::encodeInto(*value, buffer);
+  }
+  static bool equal(const auto& left, const auto& right) { return Official::equal(*left, *right); }
+  static std::string text(const auto& value) { return Official::text(*value); }
+};
+
+}  // namespace bench

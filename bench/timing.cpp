@@ -1,0 +1,24 @@
+// Times everything in the catalogue under Google Benchmark, as operation/workload/peer.
+
+#include <benchmark/benchmark.h>
+
+#include "bench/catalogue.hpp"
+
+int main(int argumentCount, char** arguments) {
+  benchmark::Initialize(&argumentCount, arguments);
+  if (benchmark::ReportUnrecognizedArguments(argumentCount, arguments)) return 1;
+
+  const bench::Catalogue catalogue = bench::allPeers();
+  for (const bench::Case& measured : catalogue.cases) {
+    const std::string name = measured.operation + "/" + measured.workload + "/" + std::string(measured.peer);
+    benchmark::RegisterBenchmark(name.c_str(), [&measured](benchmark::State& state) {
+      // Pays for what another operation left behind in caches and heap.
+      measured.run(1);
+      // The loop stands beside the operation, compiled with it; here it is entered once.
+      while (state.KeepRunningBatch(state.max_iterations)) {
+        measured.run(static_cast<std::size_t>(state.max_iterations));
+      }
+    });
+  }
+  benchmark::RunSpecifiedBenchmarks();
+}
