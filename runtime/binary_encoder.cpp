@@ -59,7 +59,7 @@ BinaryEncoder::Result BinaryEncoder::beginLongNested(std::uint32_t number, std::
   return {};
 }
 
-BinaryEncoder::Result BinaryEncoder::endLongNested(std::size_t start, std::size_t lengthBytes) {
+BinaryEncoder::Result BinaryEncoder::endLongNested(std::size_t start, std::size_t& lengthBytes) {
   const std::size_t length = written() - start;
   const std::size_t needed = varintSize(length);
   if (needed > lengthBytes) {
@@ -69,6 +69,7 @@ BinaryEncoder::Result BinaryEncoder::endLongNested(std::size_t start, std::size_
   char* const lengthAt = body - lengthBytes;
   if (needed != lengthBytes) std::memmove(lengthAt + needed, body, length);
   cursor_ = writeVarint(length, lengthAt) + length;
+  lengthBytes = needed;
   return {};
 }
 

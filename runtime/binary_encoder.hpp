@@ -90,11 +90,8 @@ class BinaryEncoder {
 
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    const std::size_t lengthBytes = likelyLengthBytes(message);
-    if (auto begun = beginNested(number, lengthBytes); !begun) return begun;
-    const auto start = written();
-    if (auto walked = message.traverse(*this); !walked) return walked;
-    return endNested(start, lengthBytes);
+    std::size_t lengthBytes = guesses_ == Guesses::bold ? varintSize(message.likelyEncodedSize()) : 1;
+    return writeMessage(message, number, lengthBytes);
   }
 
   Result visitRepeatedStringField(const std::vector<Text>& texts, std::uint32_t number) {
@@ -106,8 +103,10 @@ class BinaryEncoder {
 
   template <class M>
   Result visitRepeatedMessageField(const std::vector<M>& messages, std::uint32_t number) {
+    // Each element is taken to need as many length bytes as the one before it.
+    std::size_t lengthBytes = 1;
     for (const M& message : messages) {
-      if (auto written = visitSingularMessageField(message, number); !written) return written;
+      if (auto written = writeMessage(message, number, lengthBytes); !written) return written;
     }
     return {};
   }
@@ -163,13 +162,14 @@ class BinaryEncoder {
     return writeLongNumber(value, number);
   }
 
-  // One, unless there are lists in the message: their elements are taken to be like the first.
+  // Writes a nested message behind the given number of length bytes, and sets it to the number that it took.
   template <class M>
-  std::size_t likelyLengthBytes(const M& message) const {
-    if constexpr (M::messageFacts().hasLists()) {
-      if (guesses_ == Guesses::bold) return varintSize(likelyEncodedSize(message));
-    }
-    return 1;
+  Result writeMessage(const M& message, std::uint32_t number, std::size_t& lengthBytes) {
+    if (guesses_ == Guesses::careful) lengthBytes = 1;
+    if (auto begun = beginNested(number, lengthBytes); !begun) return begun;
+    const std::size_t start = written();
+    if (auto walked = message.traverse(*this); !walked) return walked;
+    return endNested(start, lengthBytes);
   }
 
   Result beginNested(std::uint32_t number, std::size_t lengthBytes) {
@@ -181,10 +181,16 @@ class BinaryEncoder {
     return beginLongNested(number, lengthBytes);
   }
 
-  Result endNested(std::size_t start, std::size_t lengthBytes) {
+  Result endNested(std::size_t start, std::size_t& lengthBytes) {
     const std::size_t length = written() - start;
+    char* const body = begin_ + start;
     if (lengthBytes == 1 && length < shortVarints) [[likely]] {
-      begin_[start - 1] = static_cast<char>(length);
+      body[-1] = static_cast<char>(length);
+      return {};
+    }
+    if (lengthBytes == 2 && length >= shortVarints && length < mediumVarints) {
+      body[-2] = static_cast<char>((length & 0x7F) | 0x80);
+      body[-1] = static_cast<char>(length >> 7);
       return {};
     }
     return endLongNested(start, lengthBytes);
@@ -193,7 +199,7 @@ class BinaryEncoder {
   Result writeLongBytes(std::string_view bytes, std::uint32_t number);
   Result writeLongNumber(std::uint64_t value, std::uint32_t number);
   Result beginLongNested(std::uint32_t number, std::size_t lengthBytes);
-  Result endLongNested(std::size_t start, std::size_t lengthBytes);
+  Result endLongNested(std::size_t start, std::size_t& lengthBytes);
   Result makeRoom(std::size_t size);
   void trimString();
 

@@ -22,7 +22,8 @@ class ByteBuffer {
   // The characters' bytes as they stand.
   explicit ByteBuffer(std::string_view characters) { bytes_.assign(characters); }
 
-  std::size_t size() const { return bytes_.size(); }
+  std::size_t sizeInBytes() const { return bytes_.size(); }
+  std::size_t size() const { return sizeInBytes(); }
   bool isEmpty() const { return size() == 0; }
   // Valid until the buffer is assigned to or goes, as are the characters.
   std::span<const std::byte> bytes() const { return std::as_bytes(std::span(characters())); }
@@ -35,7 +36,7 @@ class ByteBuffer {
     return joined;
   }
   friend bool operator==(const ByteBuffer& left, const ByteBuffer& right) {
-    return left.characters() == right.characters();
+    return left.bytes_ == right.bytes_;
   }
   void hash(Hasher& into) const { into.combine(characters()); }
 

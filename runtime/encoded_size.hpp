@@ -19,16 +19,11 @@ constexpr std::size_t varintSize(std::uint64_t value) {
   return (9 * static_cast<std::size_t>(std::bit_width(value | 1)) + 64) / 64;
 }
 
-// A visitor that adds up what BinaryEncoder would write. Asked for a likely size, it takes the elements of a list of
-// messages to be like the first.
+// A visitor that adds up what BinaryEncoder would write.
 class SizeCounter {
  public:
   using Error = NeverFails;
   using Result = std::expected<void, NeverFails>;
-
-  enum class Aim : std::uint8_t { exact, likely };
-
-  explicit SizeCounter(Aim aim = Aim::exact) : aim_(aim) {}
 
   std::uint64_t size() const { return size_; }
 
@@ -49,7 +44,7 @@ class SizeCounter {
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    SizeCounter nested(aim_);
+    SizeCounter nested;
     (void)message.traverse(nested);
     return addLengthDelimited(number, nested.size());
   }
@@ -59,12 +54,6 @@ class SizeCounter {
   }
   template <class M>
   Result visitRepeatedMessageField(const std::vector<M>& messages, std::uint32_t number) {
-    if (aim_ == Aim::likely) {
-      SizeCounter first(aim_);
-      (void)first.visitSingularMessageField(messages.front(), number);
-      size_ += messages.size() * first.size();
-      return {};
-    }
     for (const M& message : messages) (void)visitSingularMessageField(message, number);
     return {};
   }
@@ -83,15 +72,6 @@ class SizeCounter {
   }
 
   std::uint64_t size_ = 0;
-  Aim aim_;
 };
-
-// About how many bytes the message's encoding has. Takes no longer for a longer list of messages.
-template <class M>
-std::uint64_t likelyEncodedSize(const M& message) {
-  SizeCounter counter(SizeCounter::Aim::likely);
-  (void)message.traverse(counter);
-  return counter.size();
-}
 
 }  // namespace orv

@@ -1,7 +1,9 @@
 // The storage that texts and byte buffers share.
 #pragma once
 
+#include <array>
 #include <cstddef>
+#include <cstdint>
 #include <cstring>
 #include <string_view>
 #include <type_traits>
@@ -62,6 +64,36 @@ class InlineBytes {
   }
   std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
 
+  friend bool operator==(const InlineBytes& left, const InlineBytes& right) {
+    if (left.isOnHeap() || right.isOnHeap()) [[unlikely]] return left.view() == right.view();
+    const std::size_t size = left.raw_[tagOffset];
+    if (size != right.raw_[tagOffset]) return false;
+    const char* const mask = contentMask(size);
+    const auto differenceAt = [&](std::size_t at) {
+      return (wordAt(left.raw_ + at) ^ wordAt(right.raw_ + at)) & wordAt(mask + at);
+    };
+    return (differenceAt(0) | differenceAt(8) | differenceAt(16) | differenceAt(24) | differenceAt(32)) == 0;
+  }
+
+  // Whether `bytes`, from whose start on `readable` bytes may be read, fit inside an object and are ASCII. False for
+  // longer bytes and at the end of what may be read, whatever they are.
+  static bool isShortAscii(std::string_view bytes, std::size_t readable) {
+    constexpr std::uint64_t highBits = 0x8080808080808080;
+    if (bytes.size() > inlineCapacity || readable < objectSize) return false;
+    const char* const mask = contentMask(bytes.size());
+    const auto wordOf = [&](std::size_t at) { return wordAt(bytes.data() + at) & wordAt(mask + at); };
+    return ((wordOf(0) | wordOf(8) | wordOf(16) | wordOf(24) | wordOf(32)) & highBits) == 0;
+  }
+
+  // objectSize bytes: `size` of them with all bits set, then zeros. With them, short contents are compared and checked
+  // in words without a branch for their length.
+  static const char* contentMask(std::size_t size) { return masks.data() + (objectSize - size); }
+  static std::uint64_t wordAt(const void* bytes) {
+    std::uint64_t word;
+    std::memcpy(&word, bytes, sizeof word);
+    return word;
+  }
+
   // Whether the bytes live outside the object. If not, all objectSize bytes from view().data() on may be
   // read.
   constexpr bool isOnHeap() const { return raw_[tagOffset] == heapTag; }
@@ -84,6 +116,12 @@ class InlineBytes {
  private:
   static constexpr std::size_t tagOffset = objectSize - 1;
   static constexpr unsigned char heapTag = 0xFF;
+
+  static constexpr auto masks = [] {
+    std::array<char, 2 * objectSize> bytes{};
+    for (std::size_t at = 0; at < objectSize; ++at) bytes[at] = static_cast<char>(0xFF);
+    return bytes;
+  }();
 
   struct Block {
     char* data;

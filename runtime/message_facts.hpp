@@ -21,13 +21,6 @@ struct MessageFacts {
   std::string_view fullName;
   std::span<const FieldFacts> fields;  // in ascending order of their numbers
 
-  constexpr bool hasLists() const {
-    for (const FieldFacts& field : fields) {
-      if (field.isRepeated) return true;
-    }
-    return false;
-  }
-
   // None for a number that the message does not define.
   constexpr const FieldFacts* field(std::uint32_t number) const {
     for (const FieldFacts& candidate : fields) {

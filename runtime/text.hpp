@@ -45,9 +45,7 @@ class Text {
   }
 
   friend bool operator==(const Text& left, const Text& right) {
-    const std::string_view leftBytes = left.utf8();
-    const std::string_view rightBytes = right.utf8();
-    return leftBytes == rightBytes || isCanonicallyEqual(leftBytes, rightBytes);
+    return left.bytes_ == right.bytes_ || isCanonicallyEqual(left.utf8(), right.utf8());
   }
   void hash(Hasher& into) const;
 

@@ -2,7 +2,6 @@
 // overlong forms, nothing above U+10FFFF.
 #pragma once
 
-#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -50,21 +49,6 @@ inline bool isAscii(std::string_view text) {
   }
   for (; at + 8 <= size; at += 8) bits |= wordAt(bytes + at);
   return (bits & highBits) == 0;
-}
-
-// As isAscii, without a branch, for texts of at most 40 bytes behind whose start 40 bytes may be read.
-inline bool isShortAscii(std::string_view text) {
-  constexpr std::size_t longest = 40;
-  // From `longest - size` on: the high bits of `size` bytes, then zeros for those that are not the text's.
-  static constexpr auto masks = [] {
-    std::array<char, 2 * longest> bytes{};
-    for (std::size_t at = 0; at < longest; ++at) bytes[at] = static_cast<char>(0x80);
-    return bytes;
-  }();
-  const char* const bytes = text.data();
-  const char* const mask = masks.data() + (longest - text.size());
-  const auto highBitsAt = [&](std::size_t at) { return wordAt(bytes + at) & wordAt(mask + at); };
-  return (highBitsAt(0) | highBitsAt(8) | highBitsAt(16) | highBitsAt(24) | highBitsAt(32)) == 0;
 }
 
 inline bool isWellFormed(std::string_view text) {

@@ -29,11 +29,7 @@ struct Orv {
                  orv::JoinRequest, orv::JoinRequest::Content, orv::JoinResponse::Content, orv::Group>>;
 
   static bool decode(auto& value, std::string_view bytes) { return value.merge(bytes).has_value(); }
-  template <class Message>
-  static bool decodeAgain(Message& value, std::string_view bytes) {
-    value = Message();
-    return decode(value, bytes);
-  }
+  static bool decodeAgain(auto& value, std::string_view bytes) { return value.reparse(bytes).has_value(); }
   static std::string encode(const auto& value) { return *value.serialize(); }
   static std::size_t encodeInto(const auto& value, std::span<char> buffer) {
     return *value.serializeInto(std::as_writable_bytes(buffer));

@@ -68,6 +68,13 @@ std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes
 }
 
 template <class M>
+std::expected<void, DecodeError> Message<M>::reparse(std::span<const std::byte> bytes) {
+  BinaryDecoder decoder(bytes);
+  if (replaceFields(decoder)) [[likely]] return {};
+  return std::expected<void, DecodeError>(std::unexpect, decoder.error());
+}
+
+template <class M>
 std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
   BinaryDecoder decoder(bytes);
   if (decodeFields(decoder)) [[likely]] return {};

@@ -86,6 +86,13 @@ class Message {
     return parse(std::as_bytes(std::span(bytes)));
   }
 
+  // As parse, into this message, whose memory is used again: whatever it held is gone. After an error it holds what
+  // was read before.
+  [[nodiscard]] std::expected<void, DecodeError> reparse(std::span<const std::byte> bytes);
+  [[nodiscard]] std::expected<void, DecodeError> reparse(std::string_view bytes) {
+    return reparse(std::as_bytes(std::span(bytes)));
+  }
+
   // Reads fields into this message as decodeMessage does. After an error it holds what was read before.
   [[nodiscard]] std::expected<void, DecodeError> merge(std::span<const std::byte> bytes);
   [[nodiscard]] std::expected<void, DecodeError> merge(std::string_view bytes) {
@@ -102,6 +109,10 @@ class Message {
   // How many bytes serialize gives.
   std::size_t encodedSize() const;
 
+  // About how many: the elements of lists and nested messages are judged by their size in memory. Takes no time to
+  // speak of, however long the lists.
+  std::size_t likelyEncodedSize() const;
+
  protected:
   Message() = default;
   Message(const Message&) = default;
@@ -111,6 +122,8 @@ class Message {
   ~Message() = default;
 
  private:
+  friend BinaryDecoder;  // reads nested messages
+
   M& self() { return static_cast<M&>(*this); }
   const M& self() const { return static_cast<const M&>(*this); }
 
@@ -121,6 +134,15 @@ class Message {
   DecodeResult<D> decodeRow(D& decoder, std::uint32_t number);
   template <class D, auto pointer, class Case>
   DecodeResult<D> decodeField(D& decoder, const Field<pointer, Case>& row);
+
+  template <class D>
+  DecodeResult<D> replaceFields(D& decoder);
+  template <std::size_t index, class D>
+  DecodeResult<D> replaceRow(D& decoder, std::uint32_t number, std::uint64_t& rowsRead);
+  template <std::size_t index>
+  void resetRow(std::uint64_t rowsRead);
+  template <std::size_t index>
+  static constexpr std::uint64_t rowBits();
 
   template <class V>
   VisitResult<V> visitFields(V& visitor) const;
