@@ -2,6 +2,7 @@
 #pragma once
 
 #include <algorithm>
+#include <array>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
@@ -34,9 +35,9 @@ class ConflictHook {
   constexpr ConflictHook() = default;
 
   template <class Callable>
-    requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
-             std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
-  ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
+  requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
+           std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
+      ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
       : callable_(&callable), call_([](void* target) -> std::expected<void, DecodeError> {
           return (*static_cast<Callable*>(target))();
         }) {}
@@ -64,7 +65,7 @@ class ConflictHook {
 class BinaryDecoder {
  public:
   // What the single operations fail with: nothing but the fact, where a DecodeError passed up through every level
-  // of nesting cost a tenth of all decoding. error() then says what was wrong. It is copied by hand because g++ 12
+  // of nesting cost a tenth of all decoding. failure() then says what was wrong. It is copied by hand because g++ 12
   // packs small results that copy trivially into registers by way of memory, in pieces that the processor cannot
   // forward: with that, decoding takes twice as long.
   struct Failure {
@@ -81,15 +82,16 @@ class BinaryDecoder {
   BinaryDecoder(const BinaryDecoder&) = delete;
   BinaryDecoder& operator=(const BinaryDecoder&) = delete;
 
-  // What was wrong. Only for a decoder one of whose operations failed.
-  const DecodeError& error() const { return *outermost().error_; }
+  // What was wrong, as decodeMessage answers it. Only for a decoder one of whose operations failed.
+  std::expected<void, DecodeError> failure() const;
 
   // The operations that Decoder lists.
 
   template <class M>
   NextFieldNumber nextFieldNumber(M& message) {
     if (reader_.position() == valueStart_) [[unlikely]] {
-      if (auto kept = keepUnknown(message.mutableUnknownFields()); !kept) return std::unexpected(kept.error());
+      if (auto kept = keepUnknown(message.mutableUnknownFields()); !kept)
+        return std::unexpected(kept.error());
     }
     message_ = &M::messageFacts();
     if (reader_.isAtEnd()) {
@@ -190,13 +192,14 @@ class BinaryDecoder {
   // Reads the field in the memory of a message that is to be replaced by it.
   template <class M>
   Result replaceMessageField(M& message) {
-    return readMessage(message, mode_, [](M& nested, BinaryDecoder& decoder) { return nested.replaceFields(decoder); });
+    return readMessage(message, mode_,
+                       [](M& nested, BinaryDecoder& decoder) { return nested.replaceFields(decoder); });
   }
 
  private:
   // What becomes of a message whose reading fails.
   enum class Mode : std::uint8_t {
-    careful,    // it keeps what was read, so a nested message is checked before it is merged into one that is there
+    careful,  // it keeps what was read, so a nested message is checked before it is merged into one that is there
     checking,   // it is dropped, so nothing need be checked
     confirmed,  // it cannot fail: all of it was read once before, and the hook was asked then
   };
@@ -216,7 +219,8 @@ class BinaryDecoder {
 
   // Whether the length-delimited field could be read.
   [[gnu::always_inline]] bool readBody(std::span<const std::byte>& body) {
-    if (reader_.readShortLengthDelimited(body)) [[likely]] return true;
+    if (reader_.readShortLengthDelimited(body)) [[likely]]
+      return true;
     const auto longer = reader_.readLengthDelimited();
     if (longer) {
       body = *longer;
@@ -228,16 +232,19 @@ class BinaryDecoder {
 
   template <class M>
   Result readMessage(M& message, Mode mode) {
-    return readMessage(message, mode, [](M& nested, BinaryDecoder& decoder) { return nested.decodeFields(decoder); });
+    return readMessage(message, mode,
+                       [](M& nested, BinaryDecoder& decoder) { return nested.decodeFields(decoder); });
   }
 
   template <class M, class Read>
   [[gnu::always_inline]] Result readMessage(M& message, Mode mode, Read read) {
     if (!isLengthDelimited()) return {};
     std::span<const std::byte> body;
-    if (!readBody(body)) [[unlikely]] return failed();
+    if (!readBody(body)) [[unlikely]]
+      return failed();
     BinaryDecoder nested(*this, body, mode);
-    if (nested.nesting_ > maximumNesting) [[unlikely]] return failTooDeep();
+    if (nested.nesting_ > maximumNesting) [[unlikely]]
+      return failTooDeep();
     return read(message, nested);
   }
 
@@ -245,7 +252,8 @@ class BinaryDecoder {
   [[gnu::always_inline]] Result readText(Slot& slot) {
     if (!isLengthDelimited()) return {};
     std::span<const std::byte> body;
-    if (!readBody(body)) [[unlikely]] return failed();
+    if (!readBody(body)) [[unlikely]]
+      return failed();
     const std::string_view bytes = characters(body);
     const std::size_t readable = readableFrom(body);
     if (!InlineBytes::isShortAscii(bytes, readable) && !utf8::isWellFormed(bytes)) [[unlikely]] {
@@ -259,7 +267,8 @@ class BinaryDecoder {
   [[gnu::always_inline]] Result readBytes(Slot& slot) {
     if (!isLengthDelimited()) return {};
     std::span<const std::byte> body;
-    if (!readBody(body)) [[unlikely]] return failed();
+    if (!readBody(body)) [[unlikely]]
+      return failed();
     presentValue(slot).bytes_.assignReadable(characters(body), readableFrom(body));
     return {};
   }
@@ -274,7 +283,8 @@ class BinaryDecoder {
   [[gnu::always_inline]] Result readVarint(Store store) {
     if (tag_.wireType() != WireType::varint) return {};
     const auto varint = reader_.readVarint();
-    if (!varint) [[unlikely]] return fail(varint.error());
+    if (!varint) [[unlikely]]
+      return fail(varint.error());
     store(*varint);
     return {};
   }
@@ -301,7 +311,8 @@ class BinaryDecoder {
   // an error among them is found before the whole run was counted, and then for all.
   template <class T>
   void makeRoom(std::vector<T>& list) const {
-    if (list.size() < list.capacity()) [[likely]] return;
+    if (list.size() < list.capacity()) [[likely]]
+      return;
     constexpr std::size_t firstFew = 16;
     const std::size_t most = list.empty() ? firstFew - 1 : std::numeric_limits<std::size_t>::max();
     const std::size_t run = 1 + reader_.countFollowing(tag_, most);
@@ -309,7 +320,11 @@ class BinaryDecoder {
   }
 
   static std::unexpected<Failure> failed() { return std::unexpected(Failure()); }
-  std::unexpected<Failure> fail(const WireFault& fault);
+  std::unexpected<Failure> fail(const WireFault& fault) {
+    return fail(fault.cause, fault.at, fault.length, fault.detail);
+  }
+  std::unexpected<Failure> fail(DecodeCause cause, const std::byte* at, std::uint32_t length,
+                                std::uint32_t detail);
   std::unexpected<Failure> failIllFormed(std::string_view text);
   std::unexpected<Failure> failTooDeep();
 
@@ -327,10 +342,17 @@ class BinaryDecoder {
   Tag tag_{0};
   std::uint8_t nesting_ = 0;
   Mode mode_ = Mode::careful;
+
   // The outermost decoder's alone.
   const std::byte* begin_ = nullptr;
   ConflictHook hook_;
-  std::optional<DecodeError> error_;
+
+  // What became of the outermost decoder; meaningless until something failed. The parts of the error stand here one
+  // by one and become a DecodeError where the caller wants it: put together and then copied, they take twice as long.
+  WireFault fault_;
+  std::array<std::uint32_t, FieldPath::capacity> numbers_;
+  std::uint8_t depth_;
+  std::optional<DecodeError> refusal_;  // the hook's own error
 };
 
 }  // namespace orv

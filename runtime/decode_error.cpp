@@ -28,16 +28,6 @@ static_assert(sentences.size() == static_cast<std::size_t>(DecodeCause::conflict
 
 std::string_view describe(DecodeCause cause) { return sentences[static_cast<std::size_t>(cause)]; }
 
-void FieldPath::prepend(std::uint32_t fieldNumber) {
-  if (size_ == capacity) {
-    ++omitted_;
-    --size_;
-  }
-  for (std::size_t at = size_; at > 0; --at) numbers_[at] = numbers_[at - 1];
-  numbers_[0] = fieldNumber;
-  ++size_;
-}
-
 std::string FieldPath::text() const {
   if (isEmpty()) return {};
   std::string text(outermost_->fullName);

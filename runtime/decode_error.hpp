@@ -4,6 +4,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <span>
 #include <string>
 #include <string_view>
 
@@ -38,12 +39,14 @@ class FieldPath {
   // Steps beyond this many are left out, the innermost first.
   static constexpr std::size_t capacity = 5;
 
-  // An empty path takes its outermost message first, then its fields from the innermost out.
-  void startFrom(const MessageFacts& outermost) { outermost_ = &outermost; }
-
-  // Puts the field of the enclosing message in front. Number 0 stands for no field: it is where a message has
-  // none.
-  void prepend(std::uint32_t fieldNumber);
+  // The path from the outermost message over these fields, the outermost first. Number 0 stands for no field: it is
+  // where a message has none. What is deeper than `capacity` is left out and counted in `omitted`.
+  void assign(const MessageFacts& outermost, std::span<const std::uint32_t> numbers, std::size_t omitted) {
+    outermost_ = &outermost;
+    size_ = static_cast<std::uint16_t>(numbers.size());
+    omitted_ = static_cast<std::uint16_t>(omitted);
+    for (std::size_t at = 0; at < numbers.size(); ++at) numbers_[at] = numbers[at];
+  }
 
   bool isEmpty() const { return outermost_ == nullptr; }
   // For instance "orv.Group.memberAdded.member.handle"; a field that has no name is written by its number.

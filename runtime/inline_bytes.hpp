@@ -65,7 +65,8 @@ class InlineBytes {
   std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
 
   friend bool operator==(const InlineBytes& left, const InlineBytes& right) {
-    if (left.isOnHeap() || right.isOnHeap()) [[unlikely]] return left.view() == right.view();
+    if (left.isOnHeap() || right.isOnHeap()) [[unlikely]]
+      return left.view() == right.view();
     const std::size_t size = left.raw_[tagOffset];
     if (size != right.raw_[tagOffset]) return false;
     const char* const mask = contentMask(size);

@@ -87,16 +87,19 @@ class WireReader {
     return Tag{first};
   }
   bool readShortLengthDelimited(std::span<const std::byte>& body) {
-    if (remaining() < 2) [[unlikely]] return false;
+    if (remaining() < 2) [[unlikely]]
+      return false;
     auto length = std::to_integer<std::size_t>(cursor_[0]);
     const std::byte* start = cursor_ + 1;
     if (length >= 0x80) {
       const auto second = std::to_integer<std::size_t>(cursor_[1]);
-      if (second >= 0x80) [[unlikely]] return false;
+      if (second >= 0x80) [[unlikely]]
+        return false;
       length = (length & 0x7F) | second << 7;
       ++start;
     }
-    if (length > static_cast<std::size_t>(limit_ - start)) [[unlikely]] return false;
+    if (length > static_cast<std::size_t>(limit_ - start)) [[unlikely]]
+      return false;
     body = std::span(start, length);
     cursor_ = start + length;
     return true;

@@ -14,8 +14,9 @@ namespace orv {
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::decodeMessage(BinaryDecoder& decoder) {
-  if (decodeFields(decoder)) [[likely]] return {};
-  return std::expected<void, DecodeError>(std::unexpect, decoder.error());
+  if (decodeFields(decoder)) [[likely]]
+    return {};
+  return decoder.failure();
 }
 
 template <class M>
@@ -63,22 +64,25 @@ template <class M>
 std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes) {
   std::expected<M, DecodeError> message;
   BinaryDecoder decoder(bytes);
-  if (!message->decodeFields(decoder)) [[unlikely]] message = std::unexpected(decoder.error());
+  if (!message->decodeFields(decoder)) [[unlikely]]
+    message = std::unexpected(decoder.failure().error());
   return message;
 }
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::reparse(std::span<const std::byte> bytes) {
   BinaryDecoder decoder(bytes);
-  if (replaceFields(decoder)) [[likely]] return {};
-  return std::expected<void, DecodeError>(std::unexpect, decoder.error());
+  if (replaceFields(decoder)) [[likely]]
+    return {};
+  return decoder.failure();
 }
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
   BinaryDecoder decoder(bytes);
-  if (decodeFields(decoder)) [[likely]] return {};
-  return std::expected<void, DecodeError>(std::unexpect, decoder.error());
+  if (decodeFields(decoder)) [[likely]]
+    return {};
+  return decoder.failure();
 }
 
 template <class M>
@@ -86,7 +90,8 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
   // Most messages fit here, and then their string is allocated once, at its final size.
   std::array<std::byte, 1024> buffer;
   BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::bold);
-  if (visitFields(encoder)) return std::string(reinterpret_cast<const char*>(buffer.data()), encoder.finish());
+  if (visitFields(encoder))
+    return std::string(reinterpret_cast<const char*>(buffer.data()), encoder.finish());
   // Larger ones are counted first.
   const std::size_t size = encodedSize();
   if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);

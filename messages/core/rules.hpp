@@ -193,8 +193,8 @@ std::size_t likelySize(const Storage& storage) {
 }
 
 template <auto left, auto right>
-inline constexpr bool isSameStorage =
-    std::is_same_v<std::integral_constant<decltype(left), left>, std::integral_constant<decltype(right), right>>;
+inline constexpr bool isSameStorage = std::is_same_v<std::integral_constant<decltype(left), left>,
+                                                     std::integral_constant<decltype(right), right>>;
 
 // Whether Case is the first alternative of the group that is kept in this storage.
 template <class Case, class Storage>
@@ -234,9 +234,7 @@ struct Message<M>::Constants {
       },
       Complete::fields);
   static constexpr auto fields = std::apply(
-      [](const auto&... rows) {
-        return std::array<FieldFacts, sizeof...(rows)>{rules::factsOfRow(rows)...};
-      },
+      [](const auto&... rows) { return std::array<FieldFacts, sizeof...(rows)>{rules::factsOfRow(rows)...}; },
       Complete::fields);
   static constexpr MessageFacts facts{Complete::protoMessageName, fields};
 };
@@ -294,11 +292,11 @@ DecodeResult<D> Message<M>::replaceFields(D& decoder) {
     }
     if (!number->has_value()) break;
     result = replaceRow<0>(decoder, **number, rowsRead);
-    if (!result) [[unlikely]] break;
+    if (!result) [[unlikely]]
+      break;
   }
-  [&]<std::size_t... indices>(std::index_sequence<indices...>) {
-    (resetRow<indices>(rowsRead), ...);
-  }(std::make_index_sequence<std::tuple_size_v<decltype(M::fields)>>());
+  [&]<std::size_t... indices>(std::index_sequence<indices...>) { (resetRow<indices>(rowsRead), ...); }
+  (std::make_index_sequence<std::tuple_size_v<decltype(M::fields)>>());
   return result;
 }
 
@@ -311,7 +309,7 @@ DecodeResult<D> Message<M>::replaceRow(D& decoder, std::uint32_t number, std::ui
     constexpr auto row = std::get<index>(M::fields);
     if (number != row.number) return replaceRow<index + 1>(decoder, number, rowsRead);
     if ((rowsRead & rowBits<index>()) != 0) return decodeField(decoder, row);
-    const auto replace = [&]<auto pointer, class Case>(const Field<pointer, Case>&) -> DecodeResult<D> {
+    const auto replace = [&]<auto pointer, class Case>(const Field<pointer, Case>&)->DecodeResult<D> {
       if constexpr (std::is_void_v<Case>) {
         return rules::replaceStored(decoder, self().*pointer);
       } else {
@@ -380,7 +378,7 @@ VisitResult<V> Message<M>::visitField(V& visitor, const Field<pointer, Case>& ro
 
 template <class M>
 std::size_t Message<M>::likelyEncodedSize() const {
-  const auto sizeOfRow = [&]<auto pointer, class Case>(const Field<pointer, Case>&) -> std::size_t {
+  const auto sizeOfRow = [&]<auto pointer, class Case>(const Field<pointer, Case>&)->std::size_t {
     return rules::likelySize(self().*pointer);
   };
   const auto sizeOfRows = [&](const auto&... rows) { return (std::size_t{0} + ... + sizeOfRow(rows)); };
