@@ -45,15 +45,17 @@ class ReadFunctionStream final : public io::CopyingInputStream {
 
 }  // namespace
 
-std::string StreamError::message() const {
-  const std::string where = ", at byte " + std::to_string(offset);
-  if (decodeError.has_value()) {
-    const std::string path = decodeError->path.text();
-    return (path.empty() ? "" : path + ": ") + decodeError->reason() + where;
-  }
+std::string StreamError::reason() const {
+  if (decodeError.has_value()) return decodeError->reason();
   std::string text(sentences[static_cast<std::size_t>(cause)]);
   if (cause == Cause::tooLarge) text += " (" + std::to_string(length) + " bytes)";
-  return text + where;
+  return text;
+}
+
+std::string StreamError::message() const {
+  std::string text = decodeError.has_value() ? decodeError->path.text() : "";
+  if (!text.empty()) text += ": ";
+  return text + reason() + ", at byte " + std::to_string(offset);
 }
 
 class DelimitedReader::Source {

@@ -39,7 +39,9 @@ struct StreamError {
   // For malformedMessage; its own offset counts from the message's first byte.
   std::optional<DecodeError> decodeError{};
 
-  // For instance "the stream ends inside a message, at byte 12".
+  // What is wrong, without path and offset: "the stream ends inside a message".
+  std::string reason() const;
+  // All of it: "the stream ends inside a message, at byte 12".
   std::string message() const;
 
   friend bool operator==(const StreamError&, const StreamError&) = default;

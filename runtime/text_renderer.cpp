@@ -40,16 +40,16 @@ void TextRenderer::close() {
   startLine("}\n");
 }
 
-TextRenderer::Result TextRenderer::plain(std::uint32_t number, std::string_view value) {
-  startLine(fieldName(number));
+TextRenderer::Result TextRenderer::plain(std::string_view name, std::string_view value) {
+  startLine(name);
   output_ += ": ";
   output_ += value;
   output_ += '\n';
   return {};
 }
 
-TextRenderer::Result TextRenderer::quoted(std::uint32_t number, std::string_view bytes) {
-  startLine(fieldName(number));
+TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_view bytes) {
+  startLine(name);
   output_ += ": ";
   appendQuoted(bytes);
   output_ += '\n';
@@ -88,37 +88,39 @@ TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unkn
 }
 
 void TextRenderer::renderUnknown(const UnknownField& field, int levelsLeft) {
-  const std::uint32_t number = field.tag.fieldNumber();
+  // Always by number, also where the message has a name for it that belongs to another wire type.
+  const std::string name = std::to_string(field.tag.fieldNumber());
   // What is kept is well-formed.
   WireReader reader(field.value);
   switch (field.tag.wireType()) {
-    case WireType::varint: (void)plain(number, std::to_string(*reader.readVarint())); break;
-    case WireType::fixed32: (void)plain(number, hexadecimal(*reader.readFixed32())); break;
-    case WireType::fixed64: (void)plain(number, hexadecimal(*reader.readFixed64())); break;
+    case WireType::varint: (void)plain(name, std::to_string(*reader.readVarint())); break;
+    case WireType::fixed32: (void)plain(name, hexadecimal(*reader.readFixed32())); break;
+    case WireType::fixed64: (void)plain(name, hexadecimal(*reader.readFixed64())); break;
     case WireType::lengthDelimited:
-      renderUnknownLengthDelimited(number, *reader.readLengthDelimited(), levelsLeft);
+      renderUnknownLengthDelimited(name, *reader.readLengthDelimited(), levelsLeft);
       break;
-    case WireType::startGroup: renderUnknownGroup(number, field.value, levelsLeft); break;
+    case WireType::startGroup: renderUnknownGroup(name, field.value, levelsLeft); break;
     case WireType::endGroup: break;
   }
 }
 
-void TextRenderer::renderUnknownLengthDelimited(std::uint32_t number, std::span<const std::byte> body,
+void TextRenderer::renderUnknownLengthDelimited(std::string_view name, std::span<const std::byte> body,
                                                 int levelsLeft) {
   if (!body.empty() && levelsLeft > 0) {
     if (const auto fields = UnknownStorage::checked(body)) {
-      open(std::to_string(number));
+      open(name);
       for (const UnknownField& field : *fields) renderUnknown(field, levelsLeft - 1);
       close();
       return;
     }
   }
-  (void)quoted(number, {reinterpret_cast<const char*>(body.data()), body.size()});
+  (void)quoted(name, {reinterpret_cast<const char*>(body.data()), body.size()});
 }
 
 // The body ends with an end-group tag of its own.
-void TextRenderer::renderUnknownGroup(std::uint32_t number, std::span<const std::byte> body, int levelsLeft) {
-  open(std::to_string(number));
+void TextRenderer::renderUnknownGroup(std::string_view name, std::span<const std::byte> body,
+                                      int levelsLeft) {
+  open(name);
   for (auto field = UnknownStorage::Iterator(body); field->tag.wireType() != WireType::endGroup; ++field) {
     renderUnknown(*field, levelsLeft - 1);
   }

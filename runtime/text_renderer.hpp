@@ -28,22 +28,22 @@ class TextRenderer {
   TextRenderer(std::string& output, NameMap names) : output_(output), names_(names) {}
 
   Result visitSingularStringField(const Text& value, std::uint32_t number) {
-    return quoted(number, value.utf8());
+    return quoted(fieldName(number), value.utf8());
   }
   Result visitSingularBytesField(const ByteBuffer& value, std::uint32_t number) {
-    return quoted(number, value.characters());
+    return quoted(fieldName(number), value.characters());
   }
   Result visitSingularBoolField(bool value, std::uint32_t number) {
-    return plain(number, value ? "true" : "false");
+    return plain(fieldName(number), value ? "true" : "false");
   }
   Result visitSingularUInt32Field(std::uint32_t value, std::uint32_t number) {
-    return plain(number, std::to_string(value));
+    return plain(fieldName(number), std::to_string(value));
   }
   // By name, or by number where the raw value has none.
   template <class Enumeration>
   Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
     const auto name = Enumeration::_protobuf_nameMap().name(value.rawValue());
-    return plain(number, name ? std::string(*name) : std::to_string(value.rawValue()));
+    return plain(fieldName(number), name ? std::string(*name) : std::to_string(value.rawValue()));
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
@@ -71,12 +71,12 @@ class TextRenderer {
   void startLine(std::string_view name);
   void open(std::string_view name);
   void close();
-  Result plain(std::uint32_t number, std::string_view value);
-  Result quoted(std::uint32_t number, std::string_view bytes);
+  Result plain(std::string_view name, std::string_view value);
+  Result quoted(std::string_view name, std::string_view bytes);
   void appendQuoted(std::string_view bytes);
   void renderUnknown(const UnknownField& field, int levelsLeft);
-  void renderUnknownLengthDelimited(std::uint32_t number, std::span<const std::byte> body, int levelsLeft);
-  void renderUnknownGroup(std::uint32_t number, std::span<const std::byte> body, int levelsLeft);
+  void renderUnknownLengthDelimited(std::string_view name, std::span<const std::byte> body, int levelsLeft);
+  void renderUnknownGroup(std::string_view name, std::span<const std::byte> body, int levelsLeft);
 
   std::string& output_;
   NameMap names_;
