@@ -1,11 +1,12 @@
 #include "runtime/text_renderer.hpp"
 
-#include <array>
-#include <charconv>
+#include <google/protobuf/io/coded_stream.h>
 
 namespace orv {
 
 namespace {
+
+using google::protobuf::io::CodedInputStream;
 
 // What the official printer allows (its kUnknownFieldRecursionLimit).
 constexpr int unknownLevels = 10;
@@ -23,6 +24,70 @@ std::string TextRenderer::fieldName(std::uint32_t number) const {
   const auto name = names_.name(number);
   return name ? std::string(*name) : std::to_string(number);
 }
+
+// Unknown fields, read as the official printer reads them. What is kept is well-formed; bytes that only may be a message
+// are one in the library's own opinion, which is laxer than this one's: it is what makes the text the same.
+class TextRenderer::UnknownFieldsRenderer {
+ public:
+  explicit UnknownFieldsRenderer(TextRenderer& renderer) : renderer_(renderer) {}
+
+  // Writes record after record up to the end of the input or of a group. False if one cannot be read.
+  bool renderRecords(CodedInputStream& input, int levelsLeft) {
+    for (;;) {
+      const std::uint32_t tag = input.ReadTag();
+      if (tag == 0 || wireTypeOf(tag) == WireType::endGroup) return true;
+      if (tag >> 3 == 0 || !renderValue(input, tag, levelsLeft)) return false;
+    }
+  }
+
+ private:
+  static WireType wireTypeOf(std::uint32_t tag) { return Tag{tag}.wireType(); }
+
+  // Always by number, also where the message has a name for it that belongs to another wire type.
+  bool renderValue(CodedInputStream& input, std::uint32_t tag, int levelsLeft) {
+    const std::string name = std::to_string(tag >> 3);
+    std::uint64_t wide = 0;
+    std::uint32_t narrow = 0;
+    switch (wireTypeOf(tag)) {
+      case WireType::varint: return input.ReadVarint64(&wide) && renderer_.plain(name, std::to_string(wide));
+      case WireType::fixed64:
+        return input.ReadLittleEndian64(&wide) && renderer_.plain(name, hexadecimal(wide));
+      case WireType::fixed32:
+        return input.ReadLittleEndian32(&narrow) && renderer_.plain(name, hexadecimal(narrow));
+      case WireType::lengthDelimited: {
+        std::string body;
+        if (!input.ReadVarint32(&narrow) || !input.ReadString(&body, static_cast<int>(narrow))) return false;
+        if (!renderAsMessage(name, body, levelsLeft)) (void)renderer_.quoted(name, body);
+        return true;
+      }
+      case WireType::startGroup: {
+        if (!input.IncrementRecursionDepth()) return false;
+        renderer_.open(name);
+        const bool isRead = renderRecords(input, levelsLeft - 1);
+        renderer_.close();
+        input.DecrementRecursionDepth();
+        return isRead && input.LastTagWas((tag & ~7U) | static_cast<std::uint32_t>(WireType::endGroup));
+      }
+      case WireType::endGroup: break;
+    }
+    return false;
+  }
+
+  // Takes back what it wrote if the bytes turn out not to be a message.
+  bool renderAsMessage(std::string_view name, const std::string& body, int levelsLeft) {
+    if (body.empty() || levelsLeft <= 0) return false;
+    CodedInputStream input(reinterpret_cast<const std::uint8_t*>(body.data()), static_cast<int>(body.size()));
+    input.SetRecursionLimit(levelsLeft);
+    const std::size_t sizeBefore = renderer_.output_.size();
+    renderer_.open(name);
+    const bool isMessage = renderRecords(input, levelsLeft - 1) && input.ConsumedEntireMessage();
+    renderer_.close();
+    if (!isMessage) renderer_.output_.resize(sizeBefore);
+    return isMessage;
+  }
+
+  TextRenderer& renderer_;
+};
 
 void TextRenderer::startLine(std::string_view name) {
   output_.append(indentation_, ' ');
@@ -83,48 +148,11 @@ void TextRenderer::appendQuoted(std::string_view bytes) {
 }
 
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
-  for (const UnknownField& field : unknownFields) renderUnknown(field, unknownLevels);
+  const auto records = unknownFields.records();
+  CodedInputStream input(reinterpret_cast<const std::uint8_t*>(records.data()),
+                         static_cast<int>(records.size()));
+  (void)UnknownFieldsRenderer(*this).renderRecords(input, unknownLevels);
   return {};
-}
-
-void TextRenderer::renderUnknown(const UnknownField& field, int levelsLeft) {
-  // Always by number, also where the message has a name for it that belongs to another wire type.
-  const std::string name = std::to_string(field.tag.fieldNumber());
-  // What is kept is well-formed.
-  WireReader reader(field.value);
-  switch (field.tag.wireType()) {
-    case WireType::varint: (void)plain(name, std::to_string(*reader.readVarint())); break;
-    case WireType::fixed32: (void)plain(name, hexadecimal(*reader.readFixed32())); break;
-    case WireType::fixed64: (void)plain(name, hexadecimal(*reader.readFixed64())); break;
-    case WireType::lengthDelimited:
-      renderUnknownLengthDelimited(name, *reader.readLengthDelimited(), levelsLeft);
-      break;
-    case WireType::startGroup: renderUnknownGroup(name, field.value, levelsLeft); break;
-    case WireType::endGroup: break;
-  }
-}
-
-void TextRenderer::renderUnknownLengthDelimited(std::string_view name, std::span<const std::byte> body,
-                                                int levelsLeft) {
-  if (!body.empty() && levelsLeft > 0) {
-    if (const auto fields = UnknownStorage::checked(body)) {
-      open(name);
-      for (const UnknownField& field : *fields) renderUnknown(field, levelsLeft - 1);
-      close();
-      return;
-    }
-  }
-  (void)quoted(name, {reinterpret_cast<const char*>(body.data()), body.size()});
-}
-
-// The body ends with an end-group tag of its own.
-void TextRenderer::renderUnknownGroup(std::string_view name, std::span<const std::byte> body,
-                                      int levelsLeft) {
-  open(name);
-  for (auto field = UnknownStorage::Iterator(body); field->tag.wireType() != WireType::endGroup; ++field) {
-    renderUnknown(*field, levelsLeft - 1);
-  }
-  close();
 }
 
 }  // namespace orv

@@ -74,9 +74,8 @@ class TextRenderer {
   Result plain(std::string_view name, std::string_view value);
   Result quoted(std::string_view name, std::string_view bytes);
   void appendQuoted(std::string_view bytes);
-  void renderUnknown(const UnknownField& field, int levelsLeft);
-  void renderUnknownLengthDelimited(std::string_view name, std::span<const std::byte> body, int levelsLeft);
-  void renderUnknownGroup(std::string_view name, std::span<const std::byte> body, int levelsLeft);
+
+  class UnknownFieldsRenderer;
 
   std::string& output_;
   NameMap names_;
