@@ -90,7 +90,8 @@ class BinaryEncoder {
 
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    std::size_t lengthBytes = guesses_ == Guesses::bold ? varintSize(message.likelyEncodedSize()) : 1;
+    const std::size_t likelySize = message.likelyEncodedSize();
+    std::size_t lengthBytes = likelySize < shortVarints ? 1 : varintSize(likelySize);
     return writeMessage(message, number, lengthBytes);
   }
 
