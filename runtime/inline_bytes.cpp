@@ -2,10 +2,14 @@
 
 #include <algorithm>
 #include <new>
+#include <string>
 
 namespace orv {
 
 namespace {
+
+// Unlike memmove and memcpy, these take a null pointer where there is nothing to copy.
+using std::char_traits;
 
 char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size)); }
 
@@ -15,18 +19,18 @@ void InlineBytes::assign(std::string_view bytes) {
   if (isOnHeap()) {
     Block block = heapBlock();
     if (bytes.size() <= block.capacity) {
-      std::memmove(block.data, bytes.data(), bytes.size());
+      char_traits<char>::move(block.data, bytes.data(), bytes.size());
       block.size = bytes.size();
       holdBlock(block);
       return;
     }
   } else if (bytes.size() <= inlineCapacity) {
-    std::memmove(raw_, bytes.data(), bytes.size());
+    char_traits<char>::move(inlineData(), bytes.data(), bytes.size());
     raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
     return;
   }
   const Block block{allocate(bytes.size()), bytes.size(), bytes.size()};
-  std::memcpy(block.data, bytes.data(), bytes.size());
+  char_traits<char>::copy(block.data, bytes.data(), bytes.size());
   if (isOnHeap()) freeBlock();
   holdBlock(block);
 }
@@ -35,13 +39,13 @@ void InlineBytes::append(std::string_view bytes) {
   const std::string_view old = view();
   const std::size_t size = old.size() + bytes.size();
   if (!isOnHeap() && size <= inlineCapacity) {
-    std::memmove(raw_ + old.size(), bytes.data(), bytes.size());
+    char_traits<char>::move(inlineData() + old.size(), bytes.data(), bytes.size());
     raw_[tagOffset] = static_cast<unsigned char>(size);
     return;
   }
   if (isOnHeap() && size <= heapBlock().capacity) {
     Block block = heapBlock();
-    std::memmove(block.data + old.size(), bytes.data(), bytes.size());
+    char_traits<char>::move(block.data + old.size(), bytes.data(), bytes.size());
     block.size = size;
     holdBlock(block);
     return;
@@ -49,7 +53,7 @@ void InlineBytes::append(std::string_view bytes) {
   const std::size_t capacity = std::max(size, 2 * old.size());
   const Block block{allocate(capacity), size, capacity};
   std::memcpy(block.data, old.data(), old.size());
-  std::memcpy(block.data + old.size(), bytes.data(), bytes.size());
+  char_traits<char>::copy(block.data + old.size(), bytes.data(), bytes.size());
   if (isOnHeap()) freeBlock();
   holdBlock(block);
 }

@@ -130,6 +130,7 @@ class InlineBytes {
     std::size_t capacity;
   };
 
+  char* inlineData() { return reinterpret_cast<char*>(raw_); }
   Block heapBlock() const {
     Block block;
     std::memcpy(&block, raw_, sizeof block);

@@ -9,6 +9,7 @@
 #include <string>
 
 #include "messages/core/message.hpp"
+#include "messages/core/replacing.hpp"
 
 namespace orv {
 
