@@ -7,6 +7,7 @@
 #include <cstring>
 #include <string_view>
 #include <type_traits>
+#include <utility>
 
 namespace orv {
 
@@ -70,10 +71,9 @@ class InlineBytes {
     const std::size_t size = left.raw_[tagOffset];
     if (size != right.raw_[tagOffset]) return false;
     const char* const mask = contentMask(size);
-    const auto differenceAt = [&](std::size_t at) {
-      return (wordAt(left.raw_ + at) ^ wordAt(right.raw_ + at)) & wordAt(mask + at);
-    };
-    return (differenceAt(0) | differenceAt(8) | differenceAt(16) | differenceAt(24) | differenceAt(32)) == 0;
+    return anyWord([&](std::size_t at) {
+             return (wordAt(left.raw_ + at) ^ wordAt(right.raw_ + at)) & wordAt(mask + at);
+           }) == 0;
   }
 
   // Whether `bytes`, from whose start on `readable` bytes may be read, fit inside an object and are ASCII. False for
@@ -82,8 +82,17 @@ class InlineBytes {
     constexpr std::uint64_t highBits = 0x8080808080808080;
     if (bytes.size() > inlineCapacity || readable < objectSize) return false;
     const char* const mask = contentMask(bytes.size());
-    const auto wordOf = [&](std::size_t at) { return wordAt(bytes.data() + at) & wordAt(mask + at); };
-    return ((wordOf(0) | wordOf(8) | wordOf(16) | wordOf(24) | wordOf(32)) & highBits) == 0;
+    return (anyWord([&](std::size_t at) { return wordAt(bytes.data() + at) & wordAt(mask + at); }) &
+            highBits) == 0;
+  }
+
+  // All bits of what a function gives for the places of an object's words, without a loop.
+  template <class WordOf>
+  static std::uint64_t anyWord(WordOf wordOf) {
+    return [&]<std::size_t... words>(std::index_sequence<words...>) {
+      return (wordOf(words * sizeof(std::uint64_t)) | ...);
+    }
+    (std::make_index_sequence<objectSize / sizeof(std::uint64_t)>());
   }
 
   // objectSize bytes: `size` of them with all bits set, then zeros. With them, short contents are compared and checked
