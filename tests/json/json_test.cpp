@@ -1,0 +1,212 @@
+// What is read, what is refused and how it is said, and what is written.
+#include "json/json.hpp"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "messages/all_messages.hpp"
+#include "tests/testing/hex.hpp"
+
+namespace orv::test {
+namespace {
+
+// What the document is read as, encoded, or else the error's message.
+template <class M>
+std::string outcome(std::string_view document) {
+  const auto message = json::parse<M>(document);
+  return message ? toHex(message->serialize().value()) : message.error().message();
+}
+
+struct Case {
+  std::string_view name;
+  std::string_view document;
+  std::string_view outcome;
+};
+
+TEST(Json, ReadsEnvelopes) {
+  const Case cases[] = {
+      {"nothing", R"({})", ""},
+      {"white space around", " \t\r\n{ } \n", ""},
+      {"present at their defaults", R"({"version":0,"type":"unknown","data":""})", "08 00 10 00 1A 00"},
+      {"null is absent", R"({"version":null,"type":null,"data":null})", ""},
+      {"out of order", R"({"data":"AQ==","version":1})", "08 01 1A 01 01"},
+      {"number", R"({"version":4294967295})", "08 FF FF FF FF 0F"},
+      {"number as a float", R"({"version":1.0})", "08 01"},
+      {"number with an exponent", R"({"version":1e2})", "08 64"},
+      {"number that an exponent makes whole", R"({"version":25e-1,"version2":0})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"number as a string", R"({"version":"4294967295"})", "08 FF FF FF FF 0F"},
+      {"minus zero", R"({"version":-0})", "08 00"},
+      {"number too large", R"({"version":4294967296})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"number far too large", R"({"version":18446744073709551616})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"negative number", R"({"version":-1})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"fraction", R"({"version":0.5})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"string with more than digits", R"({"version":" 1"})",
+       "$.version: expected a whole number from 0 to 4294967295, found \" 1\""},
+      {"string too large", R"({"version":"4294967296"})",
+       "$.version: expected a whole number from 0 to 4294967295, found \"4294967296\""},
+      {"empty string for a number", R"({"version":""})",
+       "$.version: expected a whole number from 0 to 4294967295, found \"\""},
+      {"boolean for a number", R"({"version":true})",
+       "$.version: expected a whole number from 0 to 4294967295, found a boolean"},
+      {"enumeration by name", R"({"type":"groupMessage"})", "10 05"},
+      {"enumeration by number", R"({"type":5})", "10 05"},
+      {"enumeration without a name", R"({"type":9})", "10 09"},
+      {"negative enumeration", R"({"type":-1})", "10 FF FF FF FF FF FF FF FF FF 01"},
+      {"enumeration beyond 32 bits", R"({"type":2147483648})",
+       "$.type: expected a name or a whole number of 32 bits, found another number"},
+      {"enumeration misspelled", R"({"type":"groupmesage"})",
+       "$.type: unknown name \"groupmesage\" (did you mean \"groupMessage\"?)"},
+      {"enumeration of another kind", R"({"type":[]})", "$.type: expected a name or a number, found a list"},
+      {"bytes", R"({"data":"+/+/AA=="})", "1A 04 FB FF BF 00"},
+      {"bytes in the other alphabet", R"({"data":"-_-_AA=="})", "1A 04 FB FF BF 00"},
+      {"bytes without padding", R"({"data":"-_-_AA"})", "1A 04 FB FF BF 00"},
+      {"bytes with a line end in them", R"({"data":"AQ\n=="})", "$.data: expected base64, found \"AQ\n==\""},
+      {"bytes with too little padding", R"({"data":"AQ="})", "$.data: expected base64, found \"AQ=\""},
+      {"bytes with one digit too many", R"({"data":"AQIDB"})", "$.data: expected base64, found \"AQIDB\""},
+      {"number for bytes", R"({"data":1})", "$.data: expected a base64 string, found a number"},
+      {"no object", R"([])", "$: expected an object, found a list"},
+      {"null", R"(null)", "$: expected an object, found null"},
+      {"unknown field", R"({"vresion":1})", "$.vresion: unknown field (did you mean \"version\"?)"},
+      {"unknown field, absent", R"({"vresion":null})",
+       "$.vresion: unknown field (did you mean \"version\"?)"},
+      {"a name in another letter case", R"({"Version":1})",
+       "$.Version: unknown field (did you mean \"version\"?)"},
+      {"a name like no other", R"({"colour":1})", "$.colour: unknown field"},
+      {"a name with a space", R"({"my version":1})",
+       "$[\"my version\"]: unknown field (did you mean \"version\"?)"},
+      {"the same name twice", R"({"version":1,"version":1})", "$.version: the object has this member twice"},
+      {"the same name twice, spelled otherwise", R"({"version":1,"\u0076ersion":1})",
+       "$.version: the object has this member twice"},
+      {"the same unknown name twice", R"({"x":{"y":[0,{"z":1,"z":2}]}})",
+       "$.x.y[1].z: the object has this member twice"},
+      {"nothing at all", "",
+       "line 1, column 1: syntax error while parsing value - unexpected end of input; "
+       "expected '[', '{', or a literal"},
+      {"two documents", "{}\n{}",
+       "line 2, column 1: syntax error while parsing value - unexpected '{'; expected end of input"},
+      {"a comma too many", "{\"version\":1,\n \"type\":5,}",
+       "line 2, column 11: syntax error while parsing object key - unexpected '}'; expected string literal"},
+      {"ill-formed UTF-8", "{\"data\":\"\xFF\"}",
+       "line 1, column 10: syntax error while parsing value - invalid string: ill-formed UTF-8 byte; last "
+       "read: "
+       "'\"\xFF'"},
+      {"half a surrogate pair", R"({"data":"\uD800"})",
+       "line 1, column 16: syntax error while parsing value - invalid string: surrogate U+D800..U+DBFF must "
+       "be "
+       "followed by U+DC00..U+DFFF; last read: '\"\\uD800\"'"},
+      {"columns are characters", "{\"é\": x}",
+       "line 1, column 7: syntax error while parsing value - invalid literal; last read: '\"é\": x'"},
+  };
+  for (const Case& each : cases) EXPECT_EQ(outcome<SessionMessage>(each.document), each.outcome) << each.name;
+}
+
+TEST(Json, ReadsGroups) {
+  const Case cases[] = {
+      {"list of messages", R"({"initialize":{"groupUUID":"AQ","members":[{"handle":"a"},{}]}})",
+       "0A 0A 0A 01 01 12 03 0A 01 61 12 00"},
+      {"oneof member at its default", R"({"memberLeft":{}})", "22 00"},
+      {"oneof member that is null", R"({"memberLeft":{},"initialize":null})", "22 00"},
+      {"second member of a oneof", R"({"memberLeft":{},"initialize":{}})",
+       "$.initialize: a second member of a oneof"},
+      {"boolean", R"({"memberLeft":{"usesToken":true}})", "22 02 10 01"},
+      {"boolean as a string", R"({"memberLeft":{"usesToken":"true"}})",
+       "$.memberLeft.usesToken: expected true or false, found a string"},
+      {"a name of the accessor", R"({"memberLeft":{"groupUuid":""}})",
+       "$.memberLeft.groupUuid: unknown field (did you mean \"groupUUID\"?)"},
+      {"deep in a list", R"({"initialize":{"members":[{"handle":"a"},{"hndle":"b"}]}})",
+       "$.initialize.members[1].hndle: unknown field (did you mean \"handle\"?)"},
+      {"null in a list", R"({"initialize":{"members":[{},null]}})",
+       "$.initialize.members[1]: expected an object, found null"},
+      {"null for a list", R"({"initialize":{"members":null}})", "0A 00"},
+      {"object for a list", R"({"initialize":{"members":{}}})",
+       "$.initialize.members: expected a list, found an object"},
+      {"text for a message", R"({"initialize":"x"})", "$.initialize: expected an object, found a string"},
+  };
+  for (const Case& each : cases) EXPECT_EQ(outcome<Group>(each.document), each.outcome) << each.name;
+}
+
+TEST(Json, ReadsTexts) {
+  using Approval = JoinResponse::Content::ApprovalContent;
+  const Case cases[] = {
+      {"list", R"({"memberHandles":["a","","\u00e9\u0000"]})", "12 01 61 12 00 12 03 C3 A9 00"},
+      {"number in a list", R"({"memberHandles":["a",1]})",
+       "$.memberHandles[1]: expected a string, found a number"},
+      {"escapes", R"({"sessionIdentifier":"\"\\\/\b\f\n\r\t\uD83D\uDE00"})",
+       "0A 0C 22 5C 2F 08 0C 0A 0D 09 F0 9F 98 80"},
+      {"implicit presence at its default", R"({"sessionIdentifier":""})", ""},
+      {"boolean for a text", R"({"sessionIdentifier":false})",
+       "$.sessionIdentifier: expected a string, found a boolean"},
+  };
+  for (const Case& each : cases) EXPECT_EQ(outcome<Approval>(each.document), each.outcome) << each.name;
+}
+
+TEST(Json, KeepsWhatWasReadBeforeAnError) {
+  const auto document = json::Document::parse(R"({"handle":"a","tokenID":1})");
+  ASSERT_TRUE(document.has_value());
+  json::DocumentDecoder decoder(document->root());
+  Member member;
+  EXPECT_FALSE(member.decodeMessage(decoder).has_value());
+  EXPECT_EQ(member.handle(), "a");
+}
+
+TEST(Json, RefusesDeepNestingAndLongInputInTime) {
+  const std::string open(1'000'000, '[');
+  const std::string deep = outcome<Group>(open);
+  EXPECT_TRUE(deep.ends_with(": nested deeper than 100")) << deep;
+  std::string many = "{";
+  for (int index = 0; index < 200'000; ++index) many += "\"" + std::to_string(index) + "\":0,";
+  EXPECT_EQ(outcome<Group>(many + "\"7\":0}"), "$.7: the object has this member twice");
+  EXPECT_EQ(outcome<Group>(many + "\"x\":0}"), "$.0: unknown field");
+  const std::string name(100'000, 'n');
+  EXPECT_EQ(outcome<Group>("{\"" + name + "\":0}"), "$[\"" + name.substr(0, 64) + "…\"]: unknown field");
+}
+
+template <class M>
+std::string rendered(std::string_view bytes, json::RenderOptions options = {}) {
+  return json::render(M::parse(hex(bytes)).value(), options);
+}
+
+TEST(Json, IsRenderedInOneLineOrIndented) {
+  const std::string_view group = "0A 0B 0A 01 FB 12 04 0A 02 C3 A9 12 00";
+  EXPECT_EQ(rendered<Group>(group), R"({"initialize":{"groupUUID":"+w==","members":[{"handle":"é"},{}]}})");
+  EXPECT_EQ(rendered<Group>(group, {.isIndented = true}), R"({
+  "initialize": {
+    "groupUUID": "+w==",
+    "members": [
+      {
+        "handle": "é"
+      },
+      {}
+    ]
+  }
+})");
+}
+
+TEST(Json, ShowsNothingThatActsOnATerminal) {
+  // Quote, backslash, escape, delete, a control character of two bytes, a line separator.
+  EXPECT_EQ(rendered<Member>("0A 09 22 5C 1B 7F C2 9B E2 80 A8"),
+            R"({"handle":"\"\\\u001b\u007f\u009b\u2028"})");
+}
+
+TEST(Json, ShowsUnknownFieldsOnDemand) {
+  const std::string_view bytes =
+      "0A 01 61 38 96 01 45 01 00 00 00 49 02 00 00 00 00 00 00 00 52 01 FF 5B 08 01 5C";
+  EXPECT_EQ(rendered<Member>(bytes), R"({"handle":"a"})");
+  EXPECT_EQ(
+      rendered<Member>(bytes, {.showsUnknownFields = true}),
+      R"({"handle":"a","unknownFields":[)"
+      R"({"number":7,"wireType":"varint","value":"150"},)"
+      R"({"number":8,"wireType":"fixed32","value":1},)"
+      R"({"number":9,"wireType":"fixed64","value":"2"},)"
+      R"({"number":10,"wireType":"lengthDelimited","value":"/w=="},)"
+      R"({"number":11,"wireType":"startGroup","value":[{"number":1,"wireType":"varint","value":"1"}]}]})");
+}
+
+}  // namespace
+}  // namespace orv::test

@@ -1,0 +1,153 @@
+// What holds for every message.
+#include <gtest/gtest.h>
+
+#include <thread>
+
+#include "tests/testing/any_message.hpp"
+#include "tests/testing/hex.hpp"
+#include "tests/testing/official.hpp"
+
+namespace orv::test {
+namespace {
+
+std::string encoded(const AnyMessage& message) { return toHex(message.serialize().value()); }
+
+// Field 15 is defined nowhere.
+const std::string unknownRecord = hex("F8 00 81 00");
+
+// Runs the body with two encodings of each type that are random, valid and independent of each other.
+template <class Body>
+void forRandomEncodings(Body&& body) {
+  Random random;
+  for (const MessagePointer& type : allMessages()) {
+    for (std::size_t round = Random::rounds(200); round > 0 && !::testing::Test::HasFailure(); --round) {
+      const std::string left = randomEncoding(type->fullName(), random);
+      const std::string right = randomEncoding(type->fullName(), random);
+      SCOPED_TRACE(std::string(type->fullName()) + ", encodings " + toHex(left) + " and " + toHex(right));
+      body(*type, left, right);
+    }
+  }
+}
+
+TEST(AllMessages, AreEmptyByDefault) {
+  for (const MessagePointer& message : allMessages()) {
+    SCOPED_TRACE(message->fullName());
+    EXPECT_EQ(encoded(*message), "");
+    EXPECT_EQ(message->debugDescription(), "");
+    EXPECT_TRUE(message->isInitialized());
+    EXPECT_EQ(*message->parse("").value(), *message);
+    EXPECT_EQ(*message->parse(std::span<const std::byte>()).value(), *message);
+    EXPECT_EQ(faultOfEncoding(*message), "");
+  }
+}
+
+TEST(AllMessages, RoundTrip) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& left, const std::string&) {
+    EXPECT_EQ(faultOfReading(type, left), "");
+  });
+}
+
+TEST(AllMessages, AreEqualAndHashAlikeWhenTheirEncodingsAreTheSame) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& leftBytes, const std::string& rightBytes) {
+    const MessagePointer left = type.parse(leftBytes).value(), right = type.parse(rightBytes).value();
+    const bool areSame = leftBytes == rightBytes;
+    EXPECT_EQ(*left == *right, areSame);
+    EXPECT_EQ(*right == *left, areSame);
+    EXPECT_EQ(left->hashValue() == right->hashValue(), areSame);
+  });
+}
+
+TEST(AllMessages, AreUnequalToMessagesOfOtherTypes) {
+  for (const MessagePointer& left : allMessages()) {
+    for (const MessagePointer& right : allMessages()) EXPECT_EQ(*left == *right, left == right);
+  }
+}
+
+TEST(AllMessages, MergeAsIfOneEncodingStoodBehindTheOther) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& left, const std::string& right) {
+    const MessagePointer merged = type.parse(left).value();
+    ASSERT_TRUE(merged->merge(right));
+    EXPECT_EQ(*merged, *type.parse(left + right).value());
+    const auto official = newOfficial(type.fullName());
+    ASSERT_TRUE(official->ParseFromString(left + right));
+    EXPECT_EQ(encoded(*merged), toHex(official->SerializeAsString()));
+  });
+}
+
+TEST(AllMessages, AreReplacedWhenTheirMemoryIsUsedAgain) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& left, const std::string& right) {
+    const MessagePointer reused = type.parse(left).value();
+    ASSERT_TRUE(reused->reparse(right));
+    EXPECT_EQ(encoded(*reused), encoded(*type.parse(right).value()));
+    EXPECT_FALSE(reused->reparse(left + hex("78")));
+    EXPECT_EQ(encoded(*reused), encoded(*type.parse(left).value()));
+  });
+}
+
+TEST(AllMessages, AreReadByManyThreadsAtOnce) {
+  // Only a build that watches threads can fail here.
+  Random random;
+  for (const MessagePointer& type : allMessages()) {
+    const std::string bytes = randomEncoding(type->fullName(), random);
+    const MessagePointer message = type->parse(bytes).value();
+    const auto read = [&] {
+      EXPECT_EQ(*message, *message->copied());
+      EXPECT_EQ(message->hashValue(), message->copied()->hashValue());
+      EXPECT_EQ(message->debugDescription().empty(), message->encodedSize() == 0);
+      EXPECT_EQ(message->serialize(), bytes);
+      for (const NameMap::Entry& entry : message->nameMap().entries()) EXPECT_FALSE(entry.name.empty());
+    };
+    const std::jthread others[] = {std::jthread(read), std::jthread(read)};
+    read();
+  }
+}
+
+TEST(AllMessages, KeepWhatWasReadBeforeAnError) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& left, const std::string& right) {
+    const MessagePointer merged = type.parse(left).value();
+    EXPECT_FALSE(merged->merge(right + unknownRecord + hex("78")));
+    EXPECT_EQ(*merged, *type.parse(left + right + unknownRecord).value());
+  });
+}
+
+TEST(AllMessages, KeepUnknownFieldsByteForByteAndLast) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& bytes, const std::string&) {
+    const MessagePointer without = type.parse(bytes).value();
+    const MessagePointer with = type.parse(unknownRecord + bytes + unknownRecord).value();
+    EXPECT_TRUE(encoded(*with).ends_with(toHex(unknownRecord)));
+    EXPECT_EQ(with->encodedSize(), without->encodedSize() + 2 * unknownRecord.size());
+    EXPECT_FALSE(*with == *without);
+    EXPECT_FALSE(*without == *with);
+    with->mutableUnknownFields() = without->mutableUnknownFields();
+    EXPECT_EQ(*with, *without);
+  });
+}
+
+TEST(AllMessages, AreValuesThatShareNothing) {
+  forRandomEncodings([](const AnyMessage& type, const std::string& bytes, const std::string& more) {
+    const std::string kept = encoded(*type.parse(bytes).value());
+    const MessagePointer original = type.parse(bytes).value();
+    const MessagePointer copy = original->copied();
+    ASSERT_TRUE(copy->merge(more + unknownRecord));
+    EXPECT_EQ(encoded(*original), kept);
+    const std::string changed = encoded(*copy);
+
+    const MessagePointer assigned = type.parse(more).value();
+    assigned->assign(*original);
+    ASSERT_TRUE(original->merge(more + unknownRecord));
+    EXPECT_EQ(encoded(*assigned), kept);
+    EXPECT_EQ(encoded(*original), changed);
+
+    assigned->assign(*assigned);
+    EXPECT_EQ(encoded(*assigned), kept);
+    const MessagePointer moved = assigned->moved();
+    EXPECT_EQ(encoded(*moved), kept);
+    copy->assignMoved(*moved);
+    EXPECT_EQ(encoded(*copy), kept);
+    moved->assign(*original);  // what was moved from can be assigned to
+    EXPECT_EQ(encoded(*moved), changed);
+  });
+}
+
+}  // namespace
+}  // namespace orv::test

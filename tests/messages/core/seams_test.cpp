@@ -1,0 +1,174 @@
+// Decoders, conflict hooks and visitors that are not the library's.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+
+#include "messages/all_messages.hpp"
+#include "tests/testing/hex.hpp"
+#include "tests/testing/scripted_decoder.hpp"
+#include "tests/testing/tracing_visitor.hpp"
+
+namespace orv::test {
+namespace {
+
+using Fields = std::vector<ScriptedField>;
+using Calls = std::vector<std::string>;
+
+template <class M>
+std::string encoded(const M& message) {
+  return toHex(message.serialize().value());
+}
+
+TEST(CustomDecoder, IsAskedForEachFieldAndForTheHookAfterTheReading) {
+  const Fields fields{
+      {1, "a"}, {9, 1U}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}}}, {4, Fields{{1, "s"}}}, {3}};
+  Journal journal;
+  ScriptedDecoder decoder(fields, journal);
+  JoinResponse::Content content;
+  ASSERT_TRUE(content.decodeMessage(decoder));
+  EXPECT_EQ(encoded(content), "0A 01 61 22 09 0A 01 73 12 01 62 12 01 63");
+  const std::string next = "nextFieldNumber", hook = "handleConflictingOneOf", text = "repeated string",
+                    denied = "message orv.JoinResponse.Content.DeniedContent",
+                    approved = "message orv.JoinResponse.Content.ApprovalContent";
+  EXPECT_EQ(journal.calls, (Calls{next,     "string", next,     next, denied, next,  //
+                                  next,     approved, next,     text, next,   text, next,   hook, next,
+                                  approved, next,     "string", next, hook,   next, denied, next}));
+}
+
+TEST(CustomDecoder, EndsTheDecodingWithTheErrorOfItsNthCall) {
+  const Fields fields{
+      {1, "a"}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}, {3, "u"}}}, {4, Fields{{1, "s"}, {7, 1U}}},
+      {1, "d"}, {3, Fields{}}};
+  const auto play = [&](std::size_t count, Journal& journal, JoinResponse::Content& content) {
+    ScriptedDecoder decoder(std::span<const ScriptedField>(fields).first(count), journal);
+    return content.decodeMessage(decoder);
+  };
+  Journal complete;
+  JoinResponse::Content whole;
+  ASSERT_TRUE(play(fields.size(), complete, whole));
+  for (std::size_t call = 0; call < complete.calls.size(); ++call) {
+    SCOPED_TRACE("call " + std::to_string(call) + ", " + complete.calls[call]);
+    Journal journal{.failingCall = call};
+    JoinResponse::Content content;
+    const auto result = play(fields.size(), journal, content);
+    ASSERT_FALSE(result);
+    EXPECT_EQ(result.error(), journal.error);
+    EXPECT_EQ(journal.calls.size(), call + 1);
+    // The field that failed leaves nothing behind, those before it are there.
+    Journal other;
+    JoinResponse::Content before;
+    ASSERT_TRUE(play(journal.fieldsDone, other, before));
+    EXPECT_EQ(content, before);
+  }
+}
+
+TEST(CustomDecoder, MayRefuseConflicts) {
+  Journal journal{.refusesConflicts = true};
+  const Fields fields{{4, Fields{{1, "s"}}}, {4, Fields{{2, "b"}}}};
+  ScriptedDecoder decoder(fields, journal);
+  JoinResponse::Content content;
+  EXPECT_EQ(content.decodeMessage(decoder), std::unexpected(journal.error));
+  EXPECT_EQ(encoded(content), "22 03 0A 01 73");
+}
+
+TEST(CustomDecoder, ThatTakesNoPayloadSetsNoCase) {
+  Journal journal;
+  const Fields fields{{1}, {4, Fields{}}, {1}};
+  ScriptedDecoder decoder(fields, journal);
+  Group group;
+  ASSERT_TRUE(group.decodeMessage(decoder));
+  EXPECT_EQ(encoded(group), "22 00");
+  EXPECT_EQ(std::ranges::count(journal.calls, "handleConflictingOneOf"), 0);
+}
+
+TEST(ConflictHook, IsAskedOncePerOccurrenceWhereACaseIsHeld) {
+  const struct {
+    std::string_view input;
+    int askedTimes;
+    std::string_view whenRefused;  // what the group holds then
+  } cases[] = {
+      {"0A 00", 0, "0A 00"},
+      {"0A 00 22 00", 1, "0A 00"},
+      {"0A 02 12 00 0A 02 12 00", 1, "0A 02 12 00"},
+      {"22 03 0A 01 41 22 02 10 01", 1, "22 03 0A 01 41"},
+      {"22 00 0A 00 22 00 22 00", 3, "22 00"},
+      {"08 01 0A 00", 0, "0A 00 08 01"},        // what is not taken sets nothing
+      {"0A 00 10 01", 0, "0A 00 10 01"},        // and does not conflict
+      {"0A 02 12 00 08 01", 1, "0A 02 12 00"},  // unless the payload was there before
+      {"0A 00 0D 01*4 0B 0C", 2, "0A 00"},
+  };
+  for (const auto& row : cases) {
+    SCOPED_TRACE(row.input);
+    const std::string input = hex(row.input);
+    const auto bytes = std::as_bytes(std::span(input));
+    int asked = 0;
+    auto counting = [&]() -> std::expected<void, DecodeError> {
+      return (++asked, std::expected<void, DecodeError>());
+    };
+    BinaryDecoder accepting(bytes, counting);
+    Group group;
+    ASSERT_TRUE(group.decodeMessage(accepting));
+    EXPECT_EQ(asked, row.askedTimes);
+    EXPECT_EQ(group, Group::parse(input).value());
+
+    const DecodeError refusal{.cause = DecodeCause::conflictingOneOf, .length = 7, .offset = 123456};
+    auto refusing = [&]() -> std::expected<void, DecodeError> { return std::unexpected(refusal); };
+    BinaryDecoder decoder(bytes, refusing);
+    Group refused;
+    const auto result = refused.decodeMessage(decoder);
+    if (row.askedTimes == 0) {
+      EXPECT_TRUE(result);
+    } else {
+      EXPECT_EQ(result, std::unexpected(refusal));
+    }
+    EXPECT_EQ(encoded(refused), toHex(hex(row.whenRefused)));
+  }
+}
+
+TEST(ConflictHook, IsNotAskedAboutAPayloadThatCannotBeRead) {
+  const std::string input = hex("0A 02 12 00 0A 02 12 05");
+  bool isAsked = false;
+  auto hook = [&]() -> std::expected<void, DecodeError> {
+    return (isAsked = true, std::expected<void, DecodeError>());
+  };
+  BinaryDecoder decoder(std::as_bytes(std::span(input)), hook);
+  Group group;
+  EXPECT_FALSE(group.decodeMessage(decoder));
+  EXPECT_FALSE(isAsked);
+  EXPECT_EQ(encoded(group), "0A 02 12 00");
+}
+
+template <class M>
+Calls visitsOf(const M& message) {
+  TracingVisitor visitor;
+  EXPECT_TRUE(message.traverse(visitor));
+  return visitor.visits();
+}
+
+TEST(CustomVisitor, IsHandedWhatIsToBeEmittedInAscendingOrder) {
+  EXPECT_EQ(visitsOf(Group()), Calls());
+  EXPECT_EQ(visitsOf(SessionMessage::parse(hex("22 00 1A 00 10 09 08 00")).value()),
+            (Calls{"1 uint32 0", "2 enum 9", "3 bytes ", "0 unknown 22 00"}));
+  EXPECT_EQ(visitsOf(JoinRequest::Content::parse(hex("28 00 0A 00 1A 00")).value()),
+            (Calls{"3 string ", "5 bool false"}));
+  EXPECT_EQ(visitsOf(JoinResponse::Content::parse(hex("22 08 12 00 12 01 61 0A 01 73")).value()),
+            (Calls{"4 message orv.JoinResponse.Content.ApprovalContent", "1 string s", "2 2 strings"}));
+  EXPECT_EQ(visitsOf(Group::parse(hex("0A 07 12 00 12 03 12 01 74")).value()),
+            (Calls{"1 message orv.Group.Initialization", "2 2 messages", "2 string t"}));
+}
+
+TEST(CustomVisitor, EndsTheWalkWithTheErrorOfItsNthVisit) {
+  const Group group =
+      Group::parse(hex("0A 11 0A 01 41 12 05 0A 01 61 18 01 12 03 12 01 74 20 01 28 02")).value();
+  const Calls all = visitsOf(group);
+  ASSERT_EQ(all.size(), 8U);
+  for (std::size_t count = 0; count < all.size(); ++count) {
+    const auto error = std::make_shared<int>();
+    TracingVisitor visitor(count, error);
+    EXPECT_EQ(group.traverse(visitor), std::unexpected(TracingVisitor::Error(error)));
+    EXPECT_EQ(visitor.visits(), Calls(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(count)));
+  }
+}
+
+}  // namespace
+}  // namespace orv::test

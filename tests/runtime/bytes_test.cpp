@@ -1,0 +1,123 @@
+#include <gtest/gtest.h>
+
+#include "runtime/byte_buffer.hpp"
+#include "runtime/inline_bytes.hpp"
+#include "tests/testing/heap.hpp"
+#include "tests/testing/hex.hpp"
+
+namespace orv::test {
+namespace {
+
+// Around the most that lives in the object, and around doublings.
+constexpr std::size_t sizes[] = {0, 1, 16, 19, 20, 38, 39, 40, 41, 79, 80, 81, 255, 256, 1000};
+
+std::string contents(std::size_t size) {
+  std::string bytes(size, '\0');
+  for (std::size_t at = 0; at < size; ++at) bytes[at] = static_cast<char>(at * 7 + size);
+  return bytes;
+}
+
+InlineBytes make(std::size_t size) {
+  InlineBytes bytes;
+  bytes.assign(contents(size));
+  return bytes;
+}
+
+TEST(InlineBytes, LiveInTheObjectUpTo39) {
+  for (const std::size_t size : sizes) {
+    const InlineBytes bytes = make(size);
+    EXPECT_EQ(bytes.view(), contents(size));
+    EXPECT_EQ(bytes.size(), size);
+    EXPECT_EQ(bytes.isOnHeap(), size > 39);
+  }
+}
+
+TEST(InlineBytes, AreCopiedMovedAndAssignedWhateverBothHeldBefore) {
+  for (const std::size_t from : sizes) {
+    for (const std::size_t to : sizes) {
+      SCOPED_TRACE(std::to_string(from) + " to " + std::to_string(to));
+      InlineBytes source = make(from), target = make(to);
+      target = source;
+      EXPECT_EQ(target.view(), contents(from));
+      EXPECT_EQ(source.view(), contents(from));
+      source.append("x");
+      EXPECT_EQ(target.view(), contents(from));
+
+      InlineBytes moved = std::move(target);
+      EXPECT_EQ(moved.view(), contents(from));
+      target.assign(contents(to));  // what was moved from can be assigned to
+      target = std::move(moved);
+      EXPECT_EQ(target.view(), contents(from));
+      moved = make(to);
+      EXPECT_EQ(moved.view(), contents(to));
+      target.assign(contents(to));
+      EXPECT_EQ(target.view(), contents(to));
+      target.append(contents(from));
+      EXPECT_EQ(target.view(), contents(to) + contents(from));
+    }
+  }
+}
+
+TEST(InlineBytes, TakePartsOfThemselves) {
+  for (const std::size_t size : sizes) {
+    SCOPED_TRACE(size);
+    InlineBytes bytes = make(size);
+    const InlineBytes& itself = bytes;
+    bytes = itself;
+    EXPECT_EQ(bytes.view(), contents(size));
+    bytes = std::move(const_cast<InlineBytes&>(itself));
+    EXPECT_EQ(bytes.view(), contents(size));
+    bytes.append(bytes.view());
+    EXPECT_EQ(bytes.view(), contents(size) + contents(size));
+    bytes.append(bytes.view().substr(size / 2, size));
+    EXPECT_EQ(bytes.view(),
+              contents(size) + contents(size) + (contents(size) + contents(size)).substr(size / 2, size));
+    bytes.assign(bytes.view().substr(size / 2, size));
+    EXPECT_EQ(bytes.view(), (contents(size) + contents(size)).substr(size / 2, size));
+  }
+}
+
+TEST(InlineBytes, TakeReadableBytesFromTheEndOfAnInput) {
+  for (const std::size_t size : sizes) {
+    for (const std::size_t behind : {0U, 1U, 39U, 40U, 100U}) {
+      const std::string input = contents(size) + std::string(behind, 'b');
+      const std::vector<char> exact(input.begin(), input.end());  // its end is watched in sanitized builds
+      for (const std::size_t before : {0U, 39U, 50U}) {
+        InlineBytes bytes = make(before);
+        bytes.assignReadable({exact.data(), size}, exact.size());
+        EXPECT_EQ(bytes.view(), contents(size));
+      }
+    }
+  }
+}
+
+TEST(InlineBytes, GrowInFewAllocations) {
+  InlineBytes bytes;
+  const HeapMeter meter;
+  for (int count = 0; count < 100'000; ++count) bytes.append("x");
+  EXPECT_LT(meter.allocations(), 20U);
+  EXPECT_EQ(bytes.size(), 100'000U);
+}
+
+TEST(ByteBuffer, ComparesLengthAndBytes) {
+  const ByteBuffer buffer(std::string_view("\0\xFF", 2));
+  EXPECT_EQ(buffer, ByteBuffer(buffer.bytes()));
+  EXPECT_FALSE(buffer == ByteBuffer(std::string_view("\0", 1)));
+  EXPECT_FALSE(buffer == ByteBuffer(std::string_view("\0\xFE", 2)));
+  EXPECT_FALSE(ByteBuffer("\u00E9") == ByteBuffer("e\u0301"));
+  EXPECT_EQ(buffer[1], std::byte{0xFF});
+  EXPECT_EQ((buffer + buffer).size(), 4U);
+  EXPECT_TRUE(ByteBuffer().isEmpty() && ByteBuffer(std::span<const std::byte>()).isEmpty());
+}
+
+TEST(ByteBuffer, OfAUuidAllocatesNothing) {
+  const std::string uuid(16, 'u');
+  const HeapMeter meter;
+  const ByteBuffer buffer(uuid);
+  ByteBuffer copy = buffer;
+  copy = ByteBuffer(uuid);
+  EXPECT_EQ(meter.allocations(), 0U);
+}
+
+}  // namespace
+}  // namespace orv::test

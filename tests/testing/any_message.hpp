@@ -1,0 +1,72 @@
+// A message of any type, for what is tested of all types alike: the tests over them are compiled once, not once
+// for each type.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <expected>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "runtime/decode_error.hpp"
+#include "runtime/encode_error.hpp"
+#include "runtime/name_map.hpp"
+#include "runtime/unknown_storage.hpp"
+#include "tests/testing/scripted_decoder.hpp"
+
+namespace orv::test {
+
+class AnyMessage;
+using MessagePointer = std::unique_ptr<AnyMessage>;
+
+// Each operation is that of the message. An argument that is a message has the same type, unless it is compared with.
+class AnyMessage {
+ public:
+  virtual ~AnyMessage() = default;
+
+  virtual std::string_view fullName() const = 0;
+  virtual NameMap nameMap() const = 0;
+  virtual bool isInitialized() const = 0;
+
+  virtual MessagePointer copied() const = 0;
+  virtual MessagePointer moved() = 0;
+  virtual void assign(const AnyMessage& other) = 0;
+  virtual void assignMoved(AnyMessage& other) = 0;
+
+  virtual bool isEqualTo(const AnyMessage& other) const = 0;
+  virtual std::uint64_t hashValue() const = 0;
+  virtual std::string debugDescription() const = 0;
+  virtual UnknownStorage& mutableUnknownFields() = 0;
+
+  // A new message.
+  virtual std::expected<MessagePointer, DecodeError> parse(std::span<const std::byte> bytes) const = 0;
+  virtual std::expected<void, DecodeError> merge(std::string_view bytes) = 0;
+  virtual std::expected<void, DecodeError> reparse(std::string_view bytes) = 0;
+  virtual std::expected<void, ScriptedError> decode(ScriptedDecoder& decoder) = 0;
+
+  virtual std::expected<std::string, EncodeError> serialize() const = 0;
+  virtual std::expected<std::size_t, EncodeError> serializeInto(std::span<std::byte> buffer) const = 0;
+  virtual std::size_t encodedSize() const = 0;
+
+  std::expected<MessagePointer, DecodeError> parse(std::string_view bytes) const {
+    return parse(std::as_bytes(std::span(bytes)));
+  }
+  friend bool operator==(const AnyMessage& left, const AnyMessage& right) { return left.isEqualTo(right); }
+};
+
+// A default message of each type, in the order of the list of all messages.
+const std::vector<MessagePointer>& allMessages();
+
+// The one whose full name is this, or this behind "orv.".
+const AnyMessage& messageNamed(std::string_view name);
+
+// What does not hold of the message's encoding; empty when all does.
+std::string faultOfEncoding(const AnyMessage& message);
+
+// What does not hold of the bytes when they are read as a message of this type. The fuzzer checks it too.
+std::string faultOfReading(const AnyMessage& type, std::string_view bytes);
+
+}  // namespace orv::test

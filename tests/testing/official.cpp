@@ -1,0 +1,132 @@
+#include "tests/testing/official.hpp"
+
+#include <google/protobuf/unknown_field_set.h>
+#include <orv_official.pb.h>
+
+#include <array>
+#include <cstdint>
+#include <vector>
+
+namespace orv::test {
+
+namespace {
+
+using google::protobuf::FieldDescriptor;
+using google::protobuf::Message;
+using google::protobuf::UnknownFieldSet;
+
+std::string randomText(Random& random) {
+  static const std::array<std::string, 10> texts{
+      "",       "a",    "zoë",     "guest@example.com", "\U0001F600 grin", "한글", "a\u0316\u0301b",
+      "\u212B", "\"\n", "tab\t'\\"};
+  // The lengths around those that are kept in place, and around one that takes two bytes to write.
+  static constexpr std::array<std::size_t, 5> lengths{38, 39, 40, 127, 128};
+  return random.oneIn(3) ? std::string(random.pick(lengths), 'x') : random.pick(texts);
+}
+
+std::string randomBytes(Random& random) {
+  return random.oneIn(2) ? random.bytes(random.below(20)) : randomText(random);
+}
+
+void addRandomly(UnknownFieldSet& fields, const google::protobuf::Descriptor* known, Random& random,
+                 int depth) {
+  int number = random.oneIn(4) ? static_cast<int>(1 + random.number() % ((1 << 29) - 1))
+                               : static_cast<int>(1 + random.below(20));
+  while (known != nullptr && known->FindFieldByNumber(number) != nullptr) ++number;
+  switch (random.below(5)) {
+    case 0: fields.AddVarint(number, random.edgyNumber()); break;
+    case 1: fields.AddFixed32(number, static_cast<std::uint32_t>(random.number())); break;
+    case 2: fields.AddFixed64(number, random.number()); break;
+    case 3: {
+      UnknownFieldSet body;
+      while (depth > 0 && random.oneIn(2)) addRandomly(body, nullptr, random, depth - 1);
+      std::string bytes;
+      body.SerializeToString(&bytes);
+      fields.AddLengthDelimited(number, random.oneIn(2) ? bytes : randomBytes(random));
+      break;
+    }
+    default: {
+      UnknownFieldSet& group = *fields.AddGroup(number);
+      while (depth > 0 && random.oneIn(2)) addRandomly(group, nullptr, random, depth - 1);
+    }
+  }
+}
+
+void setRandomly(Message& message, const FieldDescriptor* field, Random& random) {
+  const auto& reflection = *message.GetReflection();
+  const bool isRepeated = field->is_repeated();
+  switch (field->cpp_type()) {
+    case FieldDescriptor::CPPTYPE_STRING: {
+      const std::string value =
+          field->type() == FieldDescriptor::TYPE_STRING ? randomText(random) : randomBytes(random);
+      if (isRepeated) {
+        reflection.AddString(&message, field, value);
+      } else {
+        reflection.SetString(&message, field, value);
+      }
+      break;
+    }
+    case FieldDescriptor::CPPTYPE_BOOL: reflection.SetBool(&message, field, random.oneIn(2)); break;
+    case FieldDescriptor::CPPTYPE_UINT32:
+      reflection.SetUInt32(&message, field, static_cast<std::uint32_t>(random.edgyNumber()));
+      break;
+    case FieldDescriptor::CPPTYPE_ENUM:
+      reflection.SetEnumValue(
+          &message, field,
+          random.oneIn(2) ? static_cast<int>(random.below(8)) : static_cast<int>(random.edgyNumber()));
+      break;
+    default:
+      fillRandomly(
+          isRepeated ? *reflection.AddMessage(&message, field) : *reflection.MutableMessage(&message, field),
+          random);
+  }
+}
+
+}  // namespace
+
+std::unique_ptr<Message> newOfficial(std::string_view fullName) {
+  // What it thinks of malformed input is asked for, not logged.
+  [[maybe_unused]] static auto* const silenced = google::protobuf::SetLogHandler(nullptr);
+  const auto* const pool = official::SessionMessage::descriptor()->file()->pool();
+  const std::string name = "official" + std::string(fullName.substr(fullName.find('.')));
+  const auto* const type = pool->FindMessageTypeByName(name);
+  return std::unique_ptr<Message>(
+      google::protobuf::MessageFactory::generated_factory()->GetPrototype(type)->New());
+}
+
+void fillRandomly(Message& message, Random& random) {
+  const auto* const type = message.GetDescriptor();
+  for (int at = 0; at < type->field_count(); ++at) {
+    if (random.oneIn(4)) continue;
+    std::size_t count = type->field(at)->is_repeated() ? random.below(4) : 1;
+    for (; count > 0; --count) setRandomly(message, type->field(at), random);
+  }
+  UnknownFieldSet& unknownFields = *message.GetReflection()->MutableUnknownFields(&message);
+  while (random.oneIn(4)) addRandomly(unknownFields, type, random, 3);
+}
+
+std::string randomEncoding(std::string_view fullName, Random& random) {
+  const auto message = newOfficial(fullName);
+  fillRandomly(*message, random);
+  return message->SerializeAsString();
+}
+
+bool hasUnknownFields(const Message& message) {
+  const auto& reflection = *message.GetReflection();
+  if (!reflection.GetUnknownFields(message).empty()) return true;
+  std::vector<const FieldDescriptor*> fields;
+  reflection.ListFields(message, &fields);
+  for (const FieldDescriptor* const field : fields) {
+    if (field->cpp_type() != FieldDescriptor::CPPTYPE_MESSAGE) continue;
+    const int count = field->is_repeated() ? reflection.FieldSize(message, field) : 1;
+    for (int at = 0; at < count; ++at) {
+      if (hasUnknownFields(field->is_repeated() ? reflection.GetRepeatedMessage(message, field, at)
+                                                : reflection.GetMessage(message, field))) {
+        return true;
+      }
+    }
+  }
+  return false;
+}
+
+}  // namespace orv::test

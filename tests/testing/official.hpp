@@ -1,0 +1,27 @@
+// An independent implementation of the messages: the code that protoc generates from the schema, in a package
+// of its own.
+#pragma once
+
+#include <google/protobuf/message.h>
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "tests/testing/random.hpp"
+
+namespace orv::test {
+
+// An empty message of the type that has this full name in the schema.
+std::unique_ptr<google::protobuf::Message> newOfficial(std::string_view fullName);
+
+// Sets fields as chance has it, edges and unknown fields included.
+void fillRandomly(google::protobuf::Message& message, Random& random);
+
+// The encoding of a random message. No two texts in it are canonically equivalent unless they are the same.
+std::string randomEncoding(std::string_view fullName, Random& random);
+
+// Whether the message or one in it holds unknown fields.
+bool hasUnknownFields(const google::protobuf::Message& message);
+
+}  // namespace orv::test
