@@ -1,0 +1,87 @@
+// One side's view of a connection: what it sends, receives and expects.
+#pragma once
+
+#include <chrono>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <variant>
+
+#include "examples/invitation/capture.hpp"
+#include "examples/invitation/narrator.hpp"
+#include "examples/invitation/outcome.hpp"
+#include "examples/invitation/payload.hpp"
+#include "examples/invitation/socket.hpp"
+#include "runtime/delimited_stream.hpp"
+
+namespace invitation {
+
+// Session messages over a socket, each behind its length. A message must arrive whole, or be taken by the
+// peer, within the time limit, however many pieces it comes in. Failures name the peer and what was due.
+class Conversation {
+ public:
+  // The narrator outlives the conversation, and so does the capture, if any.
+  Conversation(Socket socket, std::string peer, std::chrono::milliseconds timeLimit, const Narrator& narrator,
+               Capture* capture = nullptr);
+  Conversation(const Conversation&) = delete;  // the reader refers to it
+  Conversation& operator=(const Conversation&) = delete;
+
+  template <class M>
+  Outcome<> send(const M& payload) {
+    const auto message = pack(payload);
+    if (!message) return std::unexpected(message.error());
+    narrator_.tell("sends", nameOf(message->type()), inWords(payload));
+    return sendMessage(*message);
+  }
+
+  // The next message's payload, which must be an M.
+  template <class M>
+  Outcome<M> receive() {
+    auto payload = receivePayload(nameOf(kindOf<M>));
+    if (!payload) return std::unexpected(payload.error());
+    if (M* const received = std::get_if<M>(&*payload)) return std::move(*received);
+    return fault("something else came", nameOf(kindOf<M>));
+  }
+
+  // Receives a payload that must equal this one.
+  template <class M>
+  Outcome<> receiveExactly(const M& expected) {
+    const auto received = receive<M>();
+    if (!received) return std::unexpected(received.error());
+    return expectEqual(*received, expected);
+  }
+
+  template <class M>
+  Outcome<> expectEqual(const M& received, const M& expected) const {
+    if (received == expected) return {};
+    return failure("not what was expected of " + peer_ + "\nreceived " + std::string(M::protoMessageName) +
+                   ":\n" + received.debugDescription() + "expected:\n" + expected.debugDescription());
+  }
+
+  // Sends no more, and fails unless the peer does the same.
+  Outcome<> end();
+
+  // For a side that misbehaves: bytes that need not be a message, and a wait for the peer to hang up, which is
+  // longer than the peer waits.
+  Outcome<> sendRaw(std::string_view bytes);
+  Outcome<> awaitHangUp();
+
+ private:
+  Deadline deadline() const { return std::chrono::steady_clock::now() + timeLimit_; }
+  Outcome<> sendMessage(const orv::SessionMessage& message);
+  Outcome<Payload> receivePayload(const std::string& due);
+  Outcome<> receiveEnd(Deadline deadline);
+  std::unexpected<Failure> fault(std::string_view what, std::string_view due) const;
+  std::unexpected<Failure> fault(const orv::StreamError& error, std::string_view due) const;
+
+  Socket socket_;
+  std::string peer_;
+  std::chrono::milliseconds timeLimit_;
+  const Narrator& narrator_;
+  Capture* capture_;
+  Deadline readDeadline_;
+  Outcome<> readOutcome_;  // what the socket said of a read that failed
+  orv::DelimitedReader reader_;
+};
+
+}  // namespace invitation

@@ -1,0 +1,96 @@
+#include "examples/invitation/host.hpp"
+
+#include <string>
+#include <thread>
+
+#include "examples/invitation/conversation.hpp"
+#include "examples/invitation/sealing.hpp"
+#include "examples/invitation/story.hpp"
+
+namespace invitation {
+
+namespace {
+
+// The events of a group come one by one, as in life, so that a reader can follow.
+constexpr std::chrono::milliseconds betweenEvents{30};
+
+class Host {
+ public:
+  Host(Listener listener, Capture& capture, std::chrono::milliseconds timeLimit)
+      : listener_(std::move(listener)), capture_(capture), timeLimit_(timeLimit) {}
+
+  Outcome<> letIn(const story::Person& guest) {
+    auto socket = accept(guest);
+    if (!socket) return std::unexpected(socket.error());
+    Conversation conversation(std::move(*socket), std::string(guest.name), timeLimit_, narrator_, &capture_);
+    if (auto asked = conversation.receiveExactly(story::connectionRequest(guest)); !asked) return asked;
+    auto answered = conversation.send(story::connectionApproval(guest, keys_.publicKey()));
+    if (!answered) return answered;
+    if (auto joined = letJoin(guest, conversation); !joined) return joined;
+    for (const orv::Group& event : story::membershipEvents(guest)) {
+      std::this_thread::sleep_for(betweenEvents);
+      if (auto told = conversation.send(event); !told) return told;
+    }
+    if (auto left = conversation.receiveExactly(story::farewell()); !left) return left;
+    return conversation.end();
+  }
+
+  Outcome<> turnAway(const story::Person& guest) {
+    auto socket = accept(guest);
+    if (!socket) return std::unexpected(socket.error());
+    Conversation conversation(std::move(*socket), std::string(guest.name), timeLimit_, narrator_, &capture_);
+    if (auto asked = conversation.receiveExactly(story::connectionRequest(guest)); !asked) return asked;
+    if (auto answered = conversation.send(story::connectionDenial(guest)); !answered) return answered;
+    return conversation.end();
+  }
+
+  void tellOfCapture() const {
+    narrator_.tell("wrote", std::to_string(capture_.size()) + " messages", "to " + capture_.path());
+  }
+
+ private:
+  Outcome<Socket> accept(const story::Person& guest) {
+    auto socket = listener_.accept(std::chrono::steady_clock::now() + timeLimit_);
+    if (!socket) return failure(socket.error().message + " (" + std::string(guest.name) + " was due)");
+    return socket;
+  }
+
+  Outcome<> letJoin(const story::Person& guest, Conversation& conversation) {
+    const auto request = conversation.receive<orv::JoinRequest>();
+    if (!request) return std::unexpected(request.error());
+    const auto sealer = Sealer::forHost(keys_, request->publicKey());
+    if (!sealer) return std::unexpected(sealer.error());
+    const auto opened = sealer->open(request->encryptedData());
+    if (!opened) return std::unexpected(opened.error());
+    const auto body = orv::JoinRequest::Content::parse(*opened);
+    if (!body) return failure("malformed join body: " + body.error().message());
+    narrator_.tell("opens", "JoinRequest.Content", inWords(*body));
+    if (auto same = conversation.expectEqual(*body, story::joinRequest(guest)); !same) return same;
+
+    const auto approval = story::joinApproval(guest);
+    const auto plain = approval.serialize();
+    if (!plain) return failure(std::string(describe(plain.error())));
+    narrator_.tell("seals", "JoinResponse.Content", inWords(approval));
+    orv::JoinResponse response;
+    response.setEncryptedData(sealer->seal(*plain));
+    return conversation.send(response);
+  }
+
+  Listener listener_;
+  Capture& capture_;
+  std::chrono::milliseconds timeLimit_;
+  Narrator narrator_{std::string(story::host.name)};
+  KeyPair keys_;
+};
+
+}  // namespace
+
+Outcome<> playHost(Listener listener, Capture& capture, std::chrono::milliseconds timeLimit) {
+  Host host(std::move(listener), capture, timeLimit);
+  if (auto played = host.letIn(story::anna); !played) return played;
+  if (auto played = host.turnAway(story::ben); !played) return played;
+  host.tellOfCapture();
+  return {};
+}
+
+}  // namespace invitation

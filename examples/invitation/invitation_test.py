@@ -1,0 +1,300 @@
+#!/usr/bin/env python3
+"""Plays the invitation, well and badly, and looks at what it says, keeps and leaves behind.
+
+usage: invitation_test.py INVITATION PROTOC SCHEMA [unittest arguments]
+"""
+
+import os
+import re
+import signal
+import socket
+import subprocess
+import sys
+import tempfile
+import time
+import unittest
+
+INVITATION, PROTOC, SCHEMA = sys.argv[1:4]
+
+# Long enough for a healthy step on a busy machine, short enough to wait for.
+TIME_LIMIT = 1.5
+# By then a process that hangs has been found out.
+PATIENCE = 60
+
+ANNAS_REQUEST = 'identifier: "2C8E91B7" handle: "anna@tablet" displayName: "Anna\'s tablet"'
+DENIAL = 'identifier: "2C8E91B7" handle: "living-room@home" denied {}'
+
+
+def protoc(direction, message, data):
+    command = [PROTOC, direction + "=orv." + message, "--proto_path=" + os.path.dirname(SCHEMA), SCHEMA]
+    return subprocess.run(command, input=data, stdout=subprocess.PIPE, check=True).stdout
+
+
+def encode(message, text):
+    return protoc("--encode", message, text.encode())
+
+
+def decode(message, data):
+    return " ".join(protoc("--decode", message, data).decode().split())
+
+
+def varint(number):
+    groups = []
+    while True:
+        groups.append(number & 0x7F)
+        number >>= 7
+        if not number:
+            return bytes([group | 0x80 for group in groups[:-1]] + groups[-1:])
+
+
+def delimited(body):
+    return varint(len(body)) + body
+
+
+def escaped(data):
+    return "".join(f"\\{byte:03o}" for byte in data)
+
+
+def envelope(kind, payload, version=1):
+    """A session message behind its length."""
+    data = escaped(payload)
+    return delimited(encode("SessionMessage", f'version: {version} type: {kind} data: "{data}"'))
+
+
+def read_delimited(data):
+    bodies = []
+    while data:
+        length, shift, at = 0, 0, 0
+        while True:
+            length |= (data[at] & 0x7F) << shift
+            shift += 7
+            at += 1
+            if data[at - 1] < 0x80:
+                break
+        assert at + length <= len(data), "the file ends inside a message"
+        bodies.append(data[at:at + length])
+        data = data[at + length:]
+    return bodies
+
+
+def data_of(body):
+    """The bytes of field 3, which protoc shows escaped."""
+    shown = decode("SessionMessage", body)
+    escapes = re.search(r'data: "(.*)"$', shown).group(1)
+    return escapes.encode().decode("unicode_escape").encode("latin-1")
+
+
+class InvitationTest(unittest.TestCase):
+    def setUp(self):
+        self.place = tempfile.TemporaryDirectory()
+        self.addCleanup(self.place.cleanup)
+        self.capture = os.path.join(self.place.name, "capture")
+        self.socket_path = os.path.join(self.place.name, "socket")
+        self.temporary = os.path.join(self.place.name, "tmp")
+        os.mkdir(self.temporary)
+
+    def start(self, *arguments, time_limit=TIME_LIMIT):
+        command = [INVITATION, "--capture", self.capture, "--time-limit", str(time_limit), *arguments]
+        process = subprocess.Popen(command, stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True,
+                                   start_new_session=True, env={**os.environ, "TMPDIR": self.temporary})
+        self.addCleanup(lambda: process.poll() is None and os.killpg(process.pid, signal.SIGKILL))
+        return process
+
+    def finish(self, process):
+        output, errors = process.communicate(timeout=PATIENCE)
+        self.assertEqual(os.listdir(self.temporary), [], "something was left behind")
+        self.assertTrue(self.has_gone(process), "a process was left behind")
+        return process.returncode, output, errors
+
+    def has_gone(self, process):
+        """Whether the whole process group ends. What a sanitizer started takes a moment."""
+        deadline = time.monotonic() + 10
+        while time.monotonic() < deadline:
+            try:
+                os.killpg(process.pid, 0)
+            except ProcessLookupError:
+                return True
+            time.sleep(0.01)
+        return False
+
+    def connect(self):
+        client = socket.socket(socket.AF_UNIX)
+        self.addCleanup(client.close)
+        for _ in range(1000):
+            try:
+                client.connect(self.socket_path)
+                return client
+            except (FileNotFoundError, ConnectionRefusedError):
+                time.sleep(0.01)
+        self.fail("the host does not listen")
+
+    def test_both_sides_see_the_whole_story(self):
+        status, output, errors = self.finish(self.start(time_limit=20))
+        self.assertEqual((status, errors), (0, ""))
+        self.assertNotIn("\033", output)
+        told = [line.split(maxsplit=3) for line in output.splitlines()]
+        for receiver, sender, count in (("host", ("anna", "ben"), 4), ("anna", ("host",), 5), ("ben", ("host",), 1)):
+            received = [line[2:] for line in told if line[0] == receiver and line[1] == "receives"]
+            self.assertEqual(len(received), count)
+            sent = [line[2:] for line in told if line[0] in sender and line[1] == "sends"]
+            remaining = iter(sent)
+            self.assertTrue(all(line in remaining for line in received), receiver)
+
+    def test_the_capture_holds_the_session(self):
+        self.assertEqual(self.finish(self.start(time_limit=20))[0], 0)
+        with open(self.capture, "rb") as capture:
+            bodies = read_delimited(capture.read())
+        kinds = [re.match(r"version: 1 type: (\w+) ", decode("SessionMessage", body)).group(1) for body in bodies]
+        self.assertEqual(kinds, ["connectionRequest", "connectionResponse", "joinRequest", "joinResponse"]
+                         + ["groupMessage"] * 4 + ["connectionRequest", "connectionResponse"])
+        self.assertEqual(decode("ConnectionRequest", data_of(bodies[0])), ANNAS_REQUEST.replace("'", "\\'"))
+        self.assertRegex(decode("ConnectionResponse.Content", data_of(bodies[1])), "approved { invitationData: ")
+        self.assertEqual(decode("ConnectionResponse.Content", data_of(bodies[9])),
+                         'identifier: "D04B7733" handle: "living-room@home" denied { }')
+        for body in bodies[2:4]:
+            self.assertNotIn(b"anna", data_of(body).lower(), "a join body is not sealed")
+        events = [decode("Group", data_of(body)) for body in bodies[4:8]]
+        self.assertEqual([event.split(" ")[0] for event in events],
+                         ["initialize", "memberAdded", "memberRemoved", "memberLeft"])
+        self.assertIn('members { handle: "living-room@home" } members { handle: "anna@tablet" }', events[0])
+        self.assertIn('member { handle: "speaker@kitchen" tokenID: "token-1" }', events[1])
+
+    def test_a_misbehaving_guest_ends_it(self):
+        cases = [
+            ("garbage", 20, "host: orv.SessionMessage.data: length 5 runs 4 bytes past the end, at byte "),
+            ("close", 20, "host: the connection was closed (anna, joinRequest was due)"),
+            ("stall", TIME_LIMIT, "host: timed out (anna, joinRequest was due)"),
+            ("freeze", TIME_LIMIT, "a process did not end in time and was killed"),
+        ]
+        for how, time_limit, complaint in cases:
+            with self.subTest(how):
+                status, _, errors = self.finish(self.start("--misbehave", how, time_limit=time_limit))
+                self.assertEqual(status, 1)
+                self.assertIn("invitation: " + complaint, errors)
+
+    def test_a_host_that_is_sent_something_else_says_what(self):
+        hello = envelope("connectionRequest", encode("ConnectionRequest", ANNAS_REQUEST))
+        stranger = encode("ConnectionRequest", 'identifier: "2C8E91B7" handle: "mallory@tablet"')
+
+        def join(key, body):
+            text = f'publicKey: "{escaped(key)}" encryptedData: "{escaped(body)}"'
+            return hello + envelope("joinRequest", encode("JoinRequest", text))
+
+        cases = [
+            ("nothing", b"", "the connection was closed (anna, connectionRequest was due)"),
+            ("another protocol", b"GET / HTTP/1.1\r\n\r\n", "the stream ends inside a message, at byte "),
+            ("a length of five bytes", b"\xff\xff\xff\xff\x07", "longer than is allowed (2147483647 bytes)"),
+            ("a length of six bytes", b"\xff\xff\xff\xff\xff\x01", "length of 2^31 or more"),
+            ("a field number 0", b"\x02\x00\x01", "orv.SessionMessage: field number 0, at byte 1"),
+            ("an empty envelope", b"\x00", "a message of version 0 where version 1 is spoken"),
+            ("another version", envelope("groupMessage", b"", 2), "a message of version 2 where"),
+            ("no kind", envelope("unknown", b""), "a message of the kind unknown carries nothing"),
+            ("a kind without a name", envelope("9", b""), "a message of the kind 9 carries nothing"),
+            ("a malformed payload", envelope("connectionRequest", b"\x12\x05a"),
+             "malformed payload: orv.ConnectionRequest.handle: length 5 runs 4 bytes past the end, at byte 1"),
+            ("another kind", envelope("groupMessage", b""), "something else came (anna, connectionRequest"),
+            ("a stranger", envelope("connectionRequest", stranger), "not what was expected of anna"),
+            ("a short key", join(b"short", b""), "a public key of 5 bytes"),
+            ("a weak key", join(bytes(32), b""), "an unacceptable public key"),
+            ("an empty body", join(b"\x09" + bytes(31), b""), "a sealed body of 0 bytes"),
+            ("an unsealed body", join(b"\x09" + bytes(31), b"a" * 80), "a sealed body that was not sealed for us"),
+        ]
+        for name, sent, complaint in cases:
+            with self.subTest(name):
+                process = self.start("host", self.socket_path, time_limit=20)
+                client = self.connect()
+                client.sendall(sent)
+                client.shutdown(socket.SHUT_WR)
+                status, _, errors = self.finish(process)
+                self.assertEqual(status, 1)
+                self.assertIn("invitation: host: ", errors)
+                self.assertIn(complaint, errors)
+                self.assertFalse(os.path.exists(self.socket_path), "the socket was left behind")
+
+    def test_a_host_waits_no_longer_than_it_says(self):
+        for name, sent in (("nobody", None), ("silence", b""), ("slow bytes", b"\x40\x08")):
+            with self.subTest(name):
+                process = self.start("host", self.socket_path)
+                if sent is not None:
+                    client = self.connect()
+                    client.sendall(sent)
+                status, _, errors = self.finish(process)
+                self.assertEqual(status, 1)
+                self.assertIn("invitation: host: timed out (anna", errors)
+
+    def test_a_byte_now_and_then_does_not_keep_a_host_waiting(self):
+        process = self.start("host", self.socket_path)
+        client = self.connect()
+        client.sendall(b"\x7f")
+        started = time.monotonic()
+        while process.poll() is None and time.monotonic() - started < PATIENCE:
+            try:
+                client.sendall(b"\x0a")
+            except OSError:
+                pass
+            time.sleep(0.1)
+        status, _, errors = self.finish(process)
+        self.assertEqual(status, 1)
+        self.assertIn("invitation: host: timed out (anna, connectionRequest was due)", errors)
+
+    def test_a_guest_that_is_answered_otherwise_says_what(self):
+        cases = [
+            ("nothing", b"", "the connection was closed (host, connectionResponse was due)"),
+            ("a denial", envelope("connectionResponse", encode("ConnectionResponse.Content", DENIAL)),
+             "not what was expected of host"),
+            ("an end group", b"\x01\x0c", "orv.SessionMessage.version: end of a group that was not begun, at byte 1"),
+        ]
+        for name, answer, complaint in cases:
+            with self.subTest(name):
+                with socket.socket(socket.AF_UNIX) as listener:
+                    listener.bind(self.socket_path)
+                    listener.listen()
+                    process = self.start("guest", self.socket_path, "anna", time_limit=20)
+                    connection = listener.accept()[0]
+                    connection.sendall(answer)
+                    connection.shutdown(socket.SHUT_WR)
+                    status, _, errors = self.finish(process)
+                    connection.close()
+                os.unlink(self.socket_path)
+                self.assertEqual(status, 1)
+                self.assertIn("invitation: anna: ", errors)
+                self.assertIn(complaint, errors)
+
+    def test_a_guest_without_a_host_says_so(self):
+        status, _, errors = self.finish(self.start("guest", self.socket_path, "ben"))
+        self.assertEqual(status, 1)
+        self.assertIn("invitation: ben: cannot connect to " + self.socket_path, errors)
+
+    def test_an_interrupted_invitation_leaves_nothing(self):
+        for name in ("SIGINT", "SIGTERM", "SIGHUP"):
+            with self.subTest(name):
+                process = self.start("--misbehave", "stall", time_limit=100)
+                while "approved" not in process.stdout.readline():
+                    pass
+                process.send_signal(getattr(signal, name))
+                status, _, errors = self.finish(process)
+                self.assertEqual(status, 1)
+                self.assertIn("invitation: interrupted", errors)
+
+    def test_what_cannot_be_done_is_refused_first(self):
+        cases = [
+            (["--misbehave", "politely"], 2, "--misbehave takes garbage, close, stall or freeze"),
+            (["--time-limit", "0"], 2, "--time-limit takes a number of seconds"),
+            (["--time-limit", "1s"], 2, "--time-limit takes a number of seconds"),
+            (["--frobnicate", "1"], 2, "there is no option --frobnicate"),
+            (["--capture"], 2, "--capture takes a value"),
+            (["guest", self.socket_path, "mallory"], 2, "a guest is anna or ben"),
+            (["host"], 2, "that is no part to play"),
+            (["host", "x" * 200], 1, "a socket's path has 1 to 107 bytes"),
+            (["--capture", os.path.join(self.place.name, "no", "file")], 1, "cannot write "),
+        ]
+        for arguments, expected, complaint in cases:
+            with self.subTest(" ".join(arguments)):
+                status, output, errors = self.finish(self.start(*arguments))
+                self.assertEqual((status, output), (expected, ""))
+                self.assertIn(complaint, errors)
+                self.assertEqual(errors.count("\n"), 1)
+
+
+if __name__ == "__main__":
+    unittest.main(argv=[sys.argv[0], *sys.argv[4:]])
