@@ -1,0 +1,135 @@
+#include "json/renderer.hpp"
+
+#include <array>
+
+#include "json/base64.hpp"
+#include "runtime/utf8.hpp"
+#include "runtime/wire_reader.hpp"
+
+namespace orv::json {
+
+namespace {
+
+// In the order of WireType.
+constexpr std::array<std::string_view, 6> wireTypeNames{"varint",     "fixed64",  "lengthDelimited",
+                                                        "startGroup", "endGroup", "fixed32"};
+
+void appendEscape(char32_t codePoint, std::string& output) {
+  output += "\\u";
+  for (int shift = 12; shift >= 0; shift -= 4) output += "0123456789abcdef"[codePoint >> shift & 0xF];
+}
+
+// Characters that would act on a terminal, or end a line there or in a script, rather than be shown.
+bool isControl(char32_t codePoint) {
+  return codePoint < 0x20 || (codePoint >= 0x7F && codePoint < 0xA0) || codePoint == 0x2028 ||
+         codePoint == 0x2029;
+}
+
+}  // namespace
+
+void Renderer::open(char bracket) {
+  output_ += bracket;
+  ++depth_;
+  isAtFirst_ = true;
+}
+
+void Renderer::close(char bracket) {
+  --depth_;
+  if (options_.isIndented && !isAtFirst_) {
+    output_ += '\n';
+    output_.append(2 * depth_, ' ');
+  }
+  output_ += bracket;
+  isAtFirst_ = false;
+}
+
+void Renderer::startItem() {
+  if (!isAtFirst_) output_ += ',';
+  isAtFirst_ = false;
+  if (!options_.isIndented) return;
+  output_ += '\n';
+  output_.append(2 * depth_, ' ');
+}
+
+void Renderer::startMember(std::string_view name) {
+  startItem();
+  appendText(name);
+  output_ += options_.isIndented ? ": " : ":";
+}
+
+void Renderer::startMember(std::uint32_t number) {
+  const auto name = names_.name(number);
+  startMember(name ? std::string(*name) : std::to_string(number));
+}
+
+void Renderer::appendText(std::string_view utf8) {
+  output_ += '"';
+  while (!utf8.empty()) {
+    const utf8::Step step = utf8::step(utf8);
+    switch (step.codePoint) {
+      case '"': output_ += "\\\""; break;
+      case '\\': output_ += "\\\\"; break;
+      case '\n': output_ += "\\n"; break;
+      case '\r': output_ += "\\r"; break;
+      case '\t': output_ += "\\t"; break;
+      default:
+        if (isControl(step.codePoint)) {
+          appendEscape(step.codePoint, output_);
+        } else {
+          output_ += utf8.substr(0, step.length);
+        }
+    }
+    utf8.remove_prefix(step.length);
+  }
+  output_ += '"';
+}
+
+void Renderer::appendBytes(std::string_view bytes) {
+  output_ += '"';
+  appendBase64(bytes, output_);
+  output_ += '"';
+}
+
+Renderer::Result Renderer::visitUnknownFields(const UnknownStorage& unknownFields) {
+  if (!options_.showsUnknownFields) return {};
+  startMember("unknownFields");
+  open('[');
+  for (const UnknownField& field : unknownFields) renderUnknown(field);
+  close(']');
+  return {};
+}
+
+void Renderer::renderUnknown(const UnknownField& field) {
+  startItem();
+  open('{');
+  startMember("number");
+  output_ += std::to_string(field.tag.fieldNumber());
+  startMember("wireType");
+  appendText(wireTypeNames[static_cast<std::size_t>(field.tag.wireType())]);
+  startMember("value");
+  // What is kept is well-formed.
+  WireReader reader(field.value);
+  switch (field.tag.wireType()) {
+    case WireType::varint: appendText(std::to_string(*reader.readVarint())); break;
+    case WireType::fixed64: appendText(std::to_string(*reader.readFixed64())); break;
+    case WireType::fixed32: output_ += std::to_string(*reader.readFixed32()); break;
+    case WireType::lengthDelimited: {
+      const auto body = *reader.readLengthDelimited();
+      appendBytes({reinterpret_cast<const char*>(body.data()), body.size()});
+      break;
+    }
+    case WireType::startGroup:
+      open('[');
+      // The body ends with an end-group tag of its own.
+      for (auto inner = UnknownStorage::Iterator(field.value); inner->tag.wireType() != WireType::endGroup;
+           ++inner) {
+        renderUnknown(*inner);
+      }
+      close(']');
+      break;
+    case WireType::endGroup: break;
+  }
+  close('}');
+}
+
+}  // namespace orv::json
