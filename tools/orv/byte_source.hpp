@@ -1,0 +1,40 @@
+// Input as bytes, however it spells them.
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <span>
+#include <string>
+#include <variant>
+
+#include "tools/orv/byte_spelling.hpp"
+#include "tools/orv/failure.hpp"
+#include "tools/orv/format.hpp"
+#include "tools/orv/input_file.hpp"
+
+namespace orv::tool {
+
+// Reads a file in one of the formats that spell bytes.
+class ByteSource {
+ public:
+  // The file must outlive the source.
+  ByteSource(InputFile& file, Format format);
+
+  // As InputFile::read; after a negative answer failure() says what was wrong.
+  std::ptrdiff_t read(std::span<std::byte> buffer);
+  const Failure& failure() const { return *failure_; }
+
+ private:
+  std::ptrdiff_t readSpelled(std::span<std::byte> buffer);
+  std::expected<void, SpellingFault> take(std::string_view piece);
+  std::expected<void, SpellingFault> finish();
+
+  InputFile& file_;
+  std::variant<std::monostate, HexReader, Base64Reader> spelling_;
+  std::string pending_;  // bytes that were read and not yet handed out, from taken_ on
+  std::size_t taken_ = 0;
+  bool isAtEnd_ = false;
+  std::optional<Failure> failure_;
+};
+
+}  // namespace orv::tool

@@ -1,0 +1,151 @@
+// diff.
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+#include <string>
+#include <utility>
+
+#include "tools/orv/commands.hpp"
+#include "tools/orv/difference.hpp"
+#include "tools/orv/message_input.hpp"
+#include "tools/orv/output_file.hpp"
+#include "tools/orv/progress.hpp"
+
+namespace orv::tool {
+
+namespace {
+
+// One of the two files.
+struct Side {
+  static Outcome<Side> open(const std::string& path, const Options& options) {
+    auto file = InputFile::open(path);
+    if (!file) return std::unexpected(std::move(file.error()));
+    Side side{std::make_unique<InputFile>(std::move(*file)), nullptr, nullptr};
+    const Format format = options.from.value_or(Format::binary);
+    side.frames = FrameReader::make(*side.file, {format, options.isDelimited, options.maximumSize});
+    side.messages = std::make_unique<MessageInput>(*side.frames, format, options);
+    return side;
+  }
+
+  std::unique_ptr<InputFile> file;
+  std::unique_ptr<FrameReader> frames;
+  std::unique_ptr<MessageInput> messages;
+};
+
+class Comparison {
+ public:
+  Comparison(const Options& options, OutputFile& output)
+      : options_(options), output_(output), palette_(options.colour, options.output ? -1 : STDOUT_FILENO) {}
+
+  bool hasFoundDifferences() const { return hasFoundDifferences_; }
+  // Whether nothing that may follow matters.
+  bool isDecided() const { return hasFoundDifferences_ && options_.isQuiet; }
+
+  // Compares the messages that both sides stand at.
+  Outcome<void> compare(const MessageInput& before, const MessageInput& after) {
+    const auto left = before.message();
+    if (!left) return std::unexpected(left.error());
+    const auto right = after.message();
+    if (!right) return std::unexpected(right.error());
+    for (const Difference& difference : differences(**left, **right)) {
+      if (auto told = tell(before, difference); !told) return told;
+    }
+    if (!options_.comparesEncodings || before.encoding() == after.encoding()) return {};
+    const auto mismatch = std::ranges::mismatch(before.encoding(), after.encoding());
+    const auto at = static_cast<unsigned long long>(mismatch.in1 - before.encoding().begin());
+    std::array<char, 96> place;
+    std::snprintf(place.data(), place.size(), "%zu bytes, the first that differs is byte %llu (0x%04llx)",
+                  after.encoding().size(), at, at);
+    return tell(before, {Difference::Kind::changed, "encoding",
+                         std::to_string(before.encoding().size()) + " bytes", place.data()});
+  }
+
+  // A message that only one side has.
+  Outcome<void> tellExtra(const MessageInput& extra, Difference::Kind kind) {
+    const std::string size = std::to_string(extra.encoding().size()) + " bytes";
+    return tell(extra, {kind, {}, size, size});
+  }
+
+ private:
+  Outcome<void> tell(const MessageInput& messages, const Difference& difference) {
+    const bool isFirst = !std::exchange(hasFoundDifferences_, true);
+    if (options_.isQuiet) return {};
+    std::string lines;
+    if (isFirst) {
+      palette_.append(lines, Palette::Colour::removed, "--- " + options_.files[0]);
+      lines += '\n';
+      palette_.append(lines, Palette::Colour::added, "+++ " + options_.files[1]);
+      lines += '\n';
+    }
+    std::string place;
+    if (options_.isDelimited) place = "message " + std::to_string(messages.frame().number) + ": ";
+    if (!difference.path.empty()) place += difference.path + ": ";
+    switch (difference.kind) {
+      case Difference::Kind::changed:
+        lines += "~ " + place;
+        palette_.append(lines, Palette::Colour::removed, difference.before);
+        lines += " -> ";
+        palette_.append(lines, Palette::Colour::added, difference.after);
+        break;
+      case Difference::Kind::removed:
+        palette_.append(lines, Palette::Colour::removed, "- " + place + difference.before);
+        break;
+      case Difference::Kind::added:
+        palette_.append(lines, Palette::Colour::added, "+ " + place + difference.after);
+        break;
+    }
+    lines += '\n';
+    return output_.write(lines);
+  }
+
+  const Options& options_;
+  OutputFile& output_;
+  Palette palette_;
+  bool hasFoundDifferences_ = false;
+};
+
+Outcome<void> compareFiles(const Options& options, Comparison& comparison, Progress& progress) {
+  auto before = Side::open(options.files[0], options);
+  if (!before) return std::unexpected(std::move(before.error()));
+  auto after = Side::open(options.files[1], options);
+  if (!after) return std::unexpected(std::move(after.error()));
+  while (!comparison.isDecided()) {
+    const auto hasLeft = before->messages->next();
+    if (!hasLeft) return std::unexpected(hasLeft.error());
+    const auto hasRight = after->messages->next();
+    if (!hasRight) return std::unexpected(hasRight.error());
+    if (!*hasLeft && !*hasRight) return {};
+    Outcome<void> compared;
+    if (*hasLeft && *hasRight) {
+      compared = comparison.compare(*before->messages, *after->messages);
+    } else {
+      compared = *hasLeft ? comparison.tellExtra(*before->messages, Difference::Kind::removed)
+                          : comparison.tellExtra(*after->messages, Difference::Kind::added);
+    }
+    if (!compared) return compared;
+    const Frame& frame = (*hasLeft ? before : after)->messages->frame();
+    progress.update(frame.number, frame.offset);
+  }
+  return {};
+}
+
+}  // namespace
+
+ExitStatus runDiff(const Options& options) {
+  OutputFile output(options.output);
+  Comparison comparison(options, output);
+  Progress progress(output.isTerminal());
+  auto outcome = compareFiles(options, comparison, progress);
+  progress.clear();
+  if (auto flushed = outcome ? output.finish() : output.flush(); !flushed) outcome = flushed;
+  if (!outcome) {
+    report(outcome.error());
+    // Who reads no further has seen what differs.
+    if (outcome.error().status != ExitStatus::done) return outcome.error().status;
+  }
+  return comparison.hasFoundDifferences() ? ExitStatus::different : ExitStatus::done;
+}
+
+}  // namespace orv::tool

@@ -1,0 +1,123 @@
+#include "tools/orv/dump_layout.hpp"
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+
+namespace orv::tool {
+
+namespace {
+
+constexpr std::size_t offsetDigits = 4;
+constexpr std::size_t pathColumn = 32;
+constexpr std::size_t kindColumn = 7;
+
+// Terminals from these widths on have room for so much.
+constexpr std::size_t wide = 140;
+constexpr std::size_t middling = 100;
+constexpr std::size_t narrow = 72;
+
+std::size_t rowSize(std::size_t width) {
+  if (width == 0) return 8;
+  return width >= wide ? 16 : width >= narrow ? 8 : 4;
+}
+
+bool startsCharacter(char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }
+
+std::size_t columns(std::string_view text) {
+  return static_cast<std::size_t>(std::ranges::count_if(text, startsCharacter));
+}
+
+// The text in so many columns, with an ellipsis where it is cut.
+std::string fitted(std::string_view text, std::size_t room) {
+  if (columns(text) <= room) return std::string(text);
+  if (room == 0) return {};
+  std::size_t end = 0;
+  for (std::size_t taken = 0; taken < room; ++taken) {
+    if (taken + 1 == room) break;
+    do ++end;
+    while (end < text.size() && !startsCharacter(text[end]));
+  }
+  return std::string(text.substr(0, end)) + "…";
+}
+
+}  // namespace
+
+DumpLayout::DumpLayout(std::size_t width, Palette palette)
+    : width_(width),
+      bytesPerRow_(rowSize(width)),
+      isAligned_(width == 0 || width >= middling),
+      palette_(palette) {}
+
+std::size_t DumpLayout::noteColumn() const { return offsetDigits + 2 + 3 * bytesPerRow_ + 1; }
+
+void DumpLayout::appendHeading(std::string& output, std::string_view text) const {
+  palette_.append(output, Palette::Colour::payload, text);
+  output += '\n';
+}
+
+void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Note& note) const {
+  const std::size_t size = bytes.header.size() + bytes.value.size();
+  for (std::size_t row = 0; row == 0 || row < size; row += bytesPerRow_) {
+    appendBytes(output, bytes, row);
+    if (row == 0) appendNote(output, note);
+    while (output.ends_with(' ')) output.pop_back();
+    output += '\n';
+  }
+}
+
+void DumpLayout::appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const {
+  std::array<char, 24> offset;
+  std::snprintf(offset.data(), offset.size(), "%0*llx", static_cast<int>(offsetDigits),
+                static_cast<unsigned long long>(bytes.offset + row));
+  palette_.append(output, Palette::Colour::offset, offset.data());
+  output += "  ";
+  const auto hex = [](std::span<const std::byte> part) {
+    std::string text;
+    for (const std::byte byte : part) {
+      text += "0123456789abcdef"[std::to_integer<unsigned>(byte) >> 4];
+      text += "0123456789abcdef"[std::to_integer<unsigned>(byte) & 0xF];
+      text += ' ';
+    }
+    return text;
+  };
+  const std::size_t headerEnd = bytes.header.size();
+  const std::size_t end = std::min(row + bytesPerRow_, headerEnd + bytes.value.size());
+  const std::size_t split = std::clamp(headerEnd, row, std::max(row, end));
+  palette_.append(output, Palette::Colour::tag,
+                  hex(bytes.header.subspan(std::min(row, headerEnd), split - row)));
+  if (end > split) {
+    palette_.append(output, bytes.valueColour, hex(bytes.value.subspan(split - headerEnd, end - split)));
+  }
+  output.append(3 * (bytesPerRow_ - (std::max(row, end) - row)) + 1, ' ');
+}
+
+void DumpLayout::appendNote(std::string& output, const Note& note) const {
+  const std::size_t start = noteColumn();
+  std::size_t room = width_ == 0 ? std::string::npos : width_ - std::min(width_, start);
+  const auto append = [&](Palette::Colour colour, std::string_view text, std::size_t column) {
+    const std::string fitting = fitted(text, room);
+    const std::size_t taken = columns(fitting);
+    palette_.append(output, colour, fitting);
+    const std::size_t padding =
+        std::min(room - taken, 2 + (isAligned_ && column > taken ? column - taken : 0));
+    output.append(padding, ' ');
+    if (width_ != 0) room -= taken + padding;
+  };
+  const std::size_t indentation = std::min(room, 2 * note.depth);
+  output.append(indentation, ' ');
+  if (width_ != 0) room -= indentation;
+  append(note.colour == Palette::Colour::value ? Palette::Colour::name : note.colour, note.path,
+         pathColumn - std::min(pathColumn, 2 * note.depth));
+  append(Palette::Colour::kind, note.kind, kindColumn);
+  append(note.colour, note.value, 0);
+}
+
+void DumpLayout::appendError(std::string& output, std::string_view text) const {
+  const bool fits = width_ == 0 || noteColumn() + columns(text) <= width_;
+  output.append(fits ? noteColumn() : 0, ' ');
+  palette_.append(output, Palette::Colour::error, text);
+  output += '\n';
+}
+
+}  // namespace orv::tool

@@ -1,0 +1,53 @@
+// How an annotated dump is set, for a given width.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "tools/orv/terminal.hpp"
+
+namespace orv::tool {
+
+// Sets the rows of a dump: offset, bytes, and beside the bytes' first row what they are.
+class DumpLayout {
+ public:
+  // A width of 0 is that of no terminal: rows are as long as they are.
+  DumpLayout(std::size_t width, Palette palette);
+
+  // What stands beside bytes.
+  struct Note {
+    std::size_t depth = 0;  // of payloads
+    std::string_view path;
+    std::string_view kind;
+    std::string value;
+    Palette::Colour colour = Palette::Colour::value;
+  };
+
+  // Bytes that are one record, or part of it: first those of tag and length, then those of the value.
+  struct Bytes {
+    std::uint64_t offset;
+    std::span<const std::byte> header;
+    std::span<const std::byte> value;
+    Palette::Colour valueColour = Palette::Colour::value;
+  };
+
+  void appendHeading(std::string& output, std::string_view text) const;
+  void appendRecord(std::string& output, const Bytes& bytes, const Note& note) const;
+  // A line in the notes' place, or from the left where it is too long for that.
+  void appendError(std::string& output, std::string_view text) const;
+
+ private:
+  void appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const;
+  void appendNote(std::string& output, const Note& note) const;
+  std::size_t noteColumn() const;
+
+  std::size_t width_;
+  std::size_t bytesPerRow_;
+  bool isAligned_;  // whether paths and kinds are set in columns
+  Palette palette_;
+};
+
+}  // namespace orv::tool

@@ -1,0 +1,49 @@
+#include "tools/orv/message_type.hpp"
+
+#include <algorithm>
+#include <vector>
+
+#include "json/nearest_name.hpp"
+
+namespace orv::tool {
+
+namespace {
+
+constexpr auto types = [] {
+  std::array<MessageType, AllMessages::size> list{};
+  std::size_t index = 0;
+  AllMessages::forEach([&]<class M>() {
+    list[index] = {index, M::protoMessageName};
+    ++index;
+  });
+  return list;
+}();
+
+std::string_view lastWord(std::string_view name) { return name.substr(name.rfind('.') + 1); }
+
+}  // namespace
+
+std::span<const MessageType> allMessageTypes() { return types; }
+
+std::expected<const MessageType*, std::string> findMessageType(std::string_view name) {
+  std::vector<const MessageType*> sameLastWord;
+  std::vector<std::string_view> names;
+  for (const MessageType& type : types) {
+    if (name == type.fullName || name == type.shortName()) return &type;
+    if (name == lastWord(type.fullName)) sameLastWord.push_back(&type);
+    names.push_back(type.shortName());
+  }
+  if (sameLastWord.size() == 1) return sameLastWord.front();
+  const std::string quoted = "\"" + std::string(name) + "\"";
+  if (sameLastWord.empty()) {
+    return std::unexpected("unknown message type " + quoted + json::suggestion(name, names));
+  }
+  std::string error = quoted + " could be";
+  for (const MessageType* type : sameLastWord) {
+    error += type == sameLastWord.front() ? " " : type == sameLastWord.back() ? " or " : ", ";
+    error += type->shortName();
+  }
+  return std::unexpected(error);
+}
+
+}  // namespace orv::tool

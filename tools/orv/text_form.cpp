@@ -1,0 +1,148 @@
+#include "tools/orv/text_form.hpp"
+
+#include <google/protobuf/descriptor.h>
+#include <google/protobuf/descriptor.pb.h>
+#include <google/protobuf/io/tokenizer.h>
+#include <google/protobuf/message.h>
+#include <google/protobuf/text_format.h>
+
+#include <map>
+#include <memory>
+#include <tuple>
+#include <utility>
+
+#include "runtime/utf8.hpp"
+#include "tools/orv/text_schema.hpp"
+
+namespace orv::tool {
+
+namespace {
+
+namespace pb = google::protobuf;
+
+// Keeps the first error.
+class FirstError final : public pb::io::ErrorCollector {
+ public:
+  void AddError(int line, pb::io::ColumnNumber column, const std::string& message) override {
+    if (fault_.has_value()) return;
+    std::string reason = message;
+    if (reason.ends_with('.')) reason.pop_back();
+    fault_ = {std::move(reason), static_cast<std::size_t>(line) + 1, static_cast<std::size_t>(column) + 1};
+  }
+  TextFault fault() const { return fault_.value_or(TextFault{"no message in the text format", 1, 1}); }
+
+ private:
+  std::optional<TextFault> fault_;
+};
+
+struct ParsedText {
+  std::unique_ptr<pb::Message> message;
+  std::unique_ptr<pb::TextFormat::ParseInfoTree> locations;
+};
+
+enum class UnknownNames : bool { refuse, skip };
+
+std::expected<ParsedText, TextFault> parse(TextSchema& schema, std::string_view typeName,
+                                           std::string_view text, UnknownNames unknownNames) {
+  constexpr int maximumNesting = 100;
+  ParsedText parsed{schema.newMessage(typeName), std::make_unique<pb::TextFormat::ParseInfoTree>()};
+  FirstError errors;
+  pb::TextFormat::Parser parser;
+  parser.RecordErrorsTo(&errors);
+  parser.WriteLocationsTo(parsed.locations.get());
+  parser.SetRecursionLimit(maximumNesting);
+  parser.AllowUnknownField(unknownNames == UnknownNames::skip);
+  if (!parser.ParseFromString(std::string(text), parsed.message.get()))
+    return std::unexpected(errors.fault());
+  return parsed;
+}
+
+// A list in brackets is at one place, that of its first item.
+TextFault faultAt(const pb::TextFormat::ParseInfoTree& locations, const pb::FieldDescriptor& field, int index,
+                  std::string reason) {
+  auto place = locations.GetLocation(&field, index);
+  for (; place.line < 0 && index > 0; --index) place = locations.GetLocation(&field, index - 1);
+  return {std::move(reason), static_cast<std::size_t>(place.line + 1),
+          static_cast<std::size_t>(place.column + 1)};
+}
+
+std::string textAt(const pb::Message& message, const pb::FieldDescriptor& field, int index) {
+  const pb::Reflection& reflection = *message.GetReflection();
+  return field.is_repeated() ? reflection.GetRepeatedString(message, &field, index)
+                             : reflection.GetString(message, &field);
+}
+
+const pb::Message& messageAt(const pb::Message& message, const pb::FieldDescriptor& field, int index) {
+  const pb::Reflection& reflection = *message.GetReflection();
+  return field.is_repeated() ? reflection.GetRepeatedMessage(message, &field, index)
+                             : reflection.GetMessage(message, &field);
+}
+
+// The parser takes escapes of any bytes, also in texts, and says nothing.
+std::expected<void, TextFault> checkTexts(const pb::Message& message,
+                                          const pb::TextFormat::ParseInfoTree& locations) {
+  std::vector<const pb::FieldDescriptor*> fields;
+  message.GetReflection()->ListFields(message, &fields);
+  for (const pb::FieldDescriptor* field : fields) {
+    const int count = field->is_repeated() ? message.GetReflection()->FieldSize(message, field) : 1;
+    for (int index = 0; index < count; ++index) {
+      const int place = field->is_repeated() ? index : -1;
+      if (field->type() == pb::FieldDescriptor::TYPE_STRING) {
+        if (utf8::isWellFormed(textAt(message, *field, index))) continue;
+        const std::string item = field->is_repeated() ? '[' + std::to_string(index) + ']' : "";
+        return std::unexpected(
+            faultAt(locations, *field, place, "ill-formed UTF-8 in " + field->name() + item));
+      }
+      if (field->cpp_type() != pb::FieldDescriptor::CPPTYPE_MESSAGE) break;
+      const auto* const nested = locations.GetTreeForNested(field, place);
+      if (nested == nullptr) continue;
+      if (auto checked = checkTexts(messageAt(message, *field, index), *nested); !checked) return checked;
+    }
+  }
+  return {};
+}
+
+std::expected<std::string, TextFault> encode(std::expected<ParsedText, TextFault> parsed) {
+  if (!parsed) return std::unexpected(std::move(parsed.error()));
+  if (auto checked = checkTexts(*parsed->message, *parsed->locations); !checked)
+    return std::unexpected(checked.error());
+  return parsed->message->SerializePartialAsString();
+}
+
+VessaSessionMessageType typeOfEnvelope(const pb::Message& envelope) {
+  const pb::FieldDescriptor* const field = envelope.GetDescriptor()->FindFieldByName("type");
+  return VessaSessionMessageType(envelope.GetReflection()->GetEnumValue(envelope, field));
+}
+
+bool isBefore(const TextFault& left, const TextFault& right) {
+  return std::tie(left.line, left.column) < std::tie(right.line, right.column);
+}
+
+}  // namespace
+
+std::expected<std::string, TextFault> encodeTextForm(const MessageType& type, std::string_view text,
+                                                     const PayloadPairing& payloads) {
+  const auto parseClosed = [&] {
+    return parse(TextSchema::shipped(), type.fullName, text, UnknownNames::refuse);
+  };
+  if (&type != &typeOf<SessionMessage>()) return encode(parseClosed());
+
+  // First with a data that is some message, to see whether it is one, and which.
+  auto seen =
+      parse(TextSchema::withOpenData(typeOf<ConnectionResponse>()), type.fullName, text, UnknownNames::skip);
+  if (!seen) {
+    auto closed = parseClosed();
+    // The reading that got further has the better reason.
+    if (!closed && isBefore(closed.error(), seen.error())) return std::unexpected(seen.error());
+    return encode(std::move(closed));
+  }
+  const pb::FieldDescriptor* const data = seen->message->GetDescriptor()->FindFieldByName("data");
+  if (!seen->message->GetReflection()->HasField(*seen->message, data)) return encode(parseClosed());
+  const MessageType* const payload = payloads.payloadOf(typeOfEnvelope(*seen->message));
+  if (payload == nullptr) {
+    return std::unexpected(faultAt(*seen->locations, *data, -1, "a message, but no \"type\" says which"));
+  }
+  return encode(parse(TextSchema::withOpenData(*payload), type.fullName, text, UnknownNames::refuse));
+}
+
+}  // namespace orv::tool
