@@ -1,0 +1,45 @@
+# Installing the library: headers under include/orv, and find_package(orv) giving orv::messages. Where orv::json was
+# built, find_package(orv COMPONENTS json) gives it too.
+include(CMakePackageConfigHelpers)
+include(GNUInstallDirs)
+
+set(orvPackageDirectory ${CMAKE_INSTALL_LIBDIR}/cmake/orv)
+
+# A library, under the name that it has in the project, with the headers of these folders.
+function(orv_install target exportSet)
+  string(REPLACE "orv_" "" exportName ${target})
+  set_target_properties(${target} PROPERTIES EXPORT_NAME ${exportName})
+  install(TARGETS ${target} EXPORT ${exportSet} COMPONENT library
+    ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR}
+    INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/orv)
+  install(EXPORT ${exportSet} NAMESPACE orv:: DESTINATION ${orvPackageDirectory} COMPONENT library)
+  foreach(folder IN LISTS ARGN)
+    # The others are for the library's own sources.
+    install(DIRECTORY ${PROJECT_SOURCE_DIR}/${folder} COMPONENT library
+      DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/orv
+      FILES_MATCHING PATTERN "*.hpp"
+      PATTERN "built_in.hpp" EXCLUDE
+      PATTERN "canonical.hpp" EXCLUDE)
+  endforeach()
+endfunction()
+
+orv_install(orv_messages orvMessagesTargets runtime messages)
+if(TARGET orv_json)
+  orv_install(orv_json orvJsonTargets json)
+endif()
+
+install(FILES ${PROJECT_SOURCE_DIR}/proto/orv.proto COMPONENT library DESTINATION ${CMAKE_INSTALL_DATADIR}/orv)
+
+configure_package_config_file(${CMAKE_CURRENT_LIST_DIR}/orvConfig.cmake.in ${PROJECT_BINARY_DIR}/orvConfig.cmake
+  INSTALL_DESTINATION ${orvPackageDirectory})
+write_basic_package_version_file(${PROJECT_BINARY_DIR}/orvConfigVersion.cmake COMPATIBILITY SameMinorVersion)
+install(FILES ${PROJECT_BINARY_DIR}/orvConfig.cmake ${PROJECT_BINARY_DIR}/orvConfigVersion.cmake COMPONENT library
+  DESTINATION ${orvPackageDirectory})
+
+if(ORV_BUILD_TESTS)
+  add_test(NAME Build.AnInstalledLibraryServesItsUsers
+    COMMAND ${CMAKE_COMMAND} -DBUILD=${PROJECT_BINARY_DIR} -DCONSUMER=${PROJECT_SOURCE_DIR}/examples/custom
+      -DCOMPILER=${CMAKE_CXX_COMPILER} "-DFLAGS=${CMAKE_CXX_FLAGS}"
+      -P ${PROJECT_SOURCE_DIR}/cmake/test_installation.cmake)
+  set_tests_properties(Build.AnInstalledLibraryServesItsUsers PROPERTIES TIMEOUT 600)
+endif()
