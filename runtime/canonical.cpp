@@ -61,15 +61,15 @@ void orderMarks(std::vector<char32_t>& codePoints) {
 std::vector<char32_t> canonicalDecomposition(std::string_view utf8) {
   std::vector<char32_t> output;
   output.reserve(utf8.size());
-  while (!utf8.empty()) {
-    const utf8::Step next = utf8::step(utf8);
-    utf8.remove_prefix(next.length);
-    // No code point below U+00C0 decomposes.
-    if (next.codePoint < 0xC0) {
-      output.push_back(next.codePoint);
-    } else {
-      appendDecomposition(next.codePoint, output);
+  for (std::size_t at = 0; at < utf8.size();) {
+    if (const auto byte = static_cast<unsigned char>(utf8[at]); byte < 0x80) {
+      output.push_back(byte);
+      ++at;
+      continue;
     }
+    const utf8::Step next = utf8::step(utf8.substr(at));
+    appendDecomposition(next.codePoint, output);
+    at += next.length;
   }
   orderMarks(output);
   return output;

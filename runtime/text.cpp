@@ -1,5 +1,7 @@
 #include "runtime/text.hpp"
 
+#include <algorithm>
+#include <string>
 #include <vector>
 
 #include "runtime/canonical.hpp"
@@ -33,10 +35,14 @@ void Text::hash(Hasher& into) const {
     into.combine(bytes);
     return;
   }
-  // Texts that are equal have one decomposition, and an ASCII text is its own: fed as UTF-8, all hash alike.
-  std::string decomposed;
-  for (const char32_t codePoint : canonicalDecomposition(bytes)) utf8::append(codePoint, decomposed);
-  into.combine(std::string_view(decomposed));
+  // Equal texts have one decomposition. One that is ASCII (of a Kelvin sign, say) is fed as an ASCII text is.
+  const std::vector<char32_t> decomposition = canonicalDecomposition(bytes);
+  if (std::ranges::all_of(decomposition, [](char32_t codePoint) { return codePoint < 0x80; })) {
+    into.combine(std::string_view(std::string(decomposition.begin(), decomposition.end())));
+  } else {
+    const auto* const start = reinterpret_cast<const char*>(decomposition.data());
+    into.combine(std::string_view(start, decomposition.size() * sizeof(char32_t)));
+  }
 }
 
 bool Text::isCanonicallyEqual(std::string_view left, std::string_view right) {
