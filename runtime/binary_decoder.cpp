@@ -27,8 +27,8 @@ BinaryDecoder::Result BinaryDecoder::readLongTag() {
   return {};
 }
 
-const BinaryDecoder& BinaryDecoder::outermost() const {
-  const BinaryDecoder* decoder = this;
+BinaryDecoder& BinaryDecoder::outermost() {
+  BinaryDecoder* decoder = this;
   while (decoder->outer_ != nullptr) decoder = decoder->outer_;
   return *decoder;
 }
@@ -48,8 +48,8 @@ std::unexpected<BinaryDecoder::Failure> BinaryDecoder::fail(DecodeCause cause, c
   return failed();
 }
 
-std::expected<void, DecodeError> BinaryDecoder::failure() const {
-  const BinaryDecoder& outermost = this->outermost();
+std::expected<void, DecodeError> BinaryDecoder::failure() {
+  BinaryDecoder& outermost = this->outermost();
   std::expected<void, DecodeError> result(std::unexpect);
   DecodeError& error = result.error();
   if (outermost.refusal_.has_value()) {

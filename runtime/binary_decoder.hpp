@@ -83,7 +83,7 @@ class BinaryDecoder {
   BinaryDecoder& operator=(const BinaryDecoder&) = delete;
 
   // What was wrong, as decodeMessage answers it. Only for a decoder one of whose operations failed.
-  std::expected<void, DecodeError> failure() const;
+  std::expected<void, DecodeError> failure();
 
   // The operations that Decoder lists.
 
@@ -330,8 +330,7 @@ class BinaryDecoder {
 
   Result keepUnknown(UnknownStorage& unknownFields);
   Result readLongTag();
-  const BinaryDecoder& outermost() const;
-  BinaryDecoder& outermost() { return const_cast<BinaryDecoder&>(std::as_const(*this).outermost()); }
+  BinaryDecoder& outermost();
 
   WireReader reader_;
   const std::byte* readableEnd_;            // of the whole input

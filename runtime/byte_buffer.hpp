@@ -15,8 +15,8 @@ namespace orv {
 class ByteBuffer {
  public:
   constexpr ByteBuffer() noexcept = default;
-  ByteBuffer(
-      std::span<const std::byte> bytes) {  // NOLINT(google-explicit-constructor): a span converts freely
+  // NOLINTNEXTLINE(google-explicit-constructor): a span converts freely
+  ByteBuffer(std::span<const std::byte> bytes) {
     bytes_.assign({reinterpret_cast<const char*>(bytes.data()), bytes.size()});
   }
   // The characters' bytes as they stand.

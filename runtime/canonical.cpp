@@ -14,8 +14,9 @@ namespace orv {
 
 namespace {
 
-utf8proc_propval_t combiningClass(char32_t codePoint) {
-  return utf8proc_get_property(static_cast<utf8proc_int32_t>(codePoint))->combining_class;
+std::size_t combiningClass(char32_t codePoint) {
+  return static_cast<std::size_t>(
+      utf8proc_get_property(static_cast<utf8proc_int32_t>(codePoint))->combining_class);
 }
 
 // The longest canonical decomposition of one code point has four (U+1F82, for one); utf8proc says if it needs
@@ -33,7 +34,7 @@ void appendDecomposition(char32_t codePoint, std::vector<char32_t>& output) {
 // A stable sort by combining class, in linear time however long the run: by counting, as there are 256 classes.
 void orderRun(std::span<char32_t> run) {
   std::array<std::size_t, 257> starts{};
-  for (const char32_t mark : run) ++starts[combiningClass(mark) + 1U];
+  for (const char32_t mark : run) ++starts[combiningClass(mark) + 1];
   std::partial_sum(starts.begin(), starts.end(), starts.begin());
   std::vector<char32_t> ordered(run.size());
   for (const char32_t mark : run) ordered[starts[combiningClass(mark)]++] = mark;
