@@ -60,6 +60,7 @@ DocumentDecoder::Result DocumentDecoder::decodeSingularBoolField(bool& value) {
 }
 
 DocumentDecoder::Result DocumentDecoder::decodeRepeatedStringField(std::vector<Text>& texts) {
+  makeRoom(texts);
   return forEachItem([&]() -> Result {
     auto text = readText();
     if (!text) return std::unexpected(std::move(text.error()));

@@ -72,6 +72,7 @@ class DocumentDecoder {
 
   template <class M>
   Result decodeRepeatedMessageField(std::vector<M>& messages) {
+    makeRoom(messages);
     return forEachItem([&]() -> Result {
       M message;
       if (auto result = readMessage(message); !result) return result;
@@ -112,6 +113,11 @@ class DocumentDecoder {
     }
     itemIndex_.reset();
     return {};
+  }
+
+  template <class T>
+  void makeRoom(std::vector<T>& list) const {
+    if (value_->kind() == Value::Kind::list) list.reserve(list.size() + value_->size());
   }
 
   std::expected<std::optional<std::uint32_t>, Error> nextNumber(NameMap names);

@@ -19,8 +19,9 @@ std::string randomText(Random& random) {
   static const std::array<std::string, 10> texts{
       "",       "a",    "zoë",     "guest@example.com", "\U0001F600 grin", "한글", "a\u0316\u0301b",
       "\u212B", "\"\n", "tab\t'\\"};
-  // The lengths around those that are kept in place, and around one that takes two bytes to write.
+  // The lengths around those that are kept in place, and around those that take another byte to write.
   static constexpr std::array<std::size_t, 5> lengths{38, 39, 40, 127, 128};
+  if (random.oneIn(100)) return std::string((std::size_t{1} << 14) - random.below(20), 'y');
   return random.oneIn(3) ? std::string(random.pick(lengths), 'x') : random.pick(texts);
 }
 

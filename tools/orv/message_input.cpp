@@ -47,6 +47,7 @@ Outcome<void> MessageInput::encodeJson() {
 }
 
 Outcome<void> MessageInput::check() const {
+  if (!isBytes(format_)) return {};
   PayloadPairing closed;
   closed.leaveClosed();
   const auto message = parseMessage(*options_.type, std::as_bytes(std::span(encoding_)), closed);

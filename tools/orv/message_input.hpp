@@ -27,7 +27,8 @@ class MessageInput {
   // The message's binary encoding: as it came if it came as bytes, and then not yet checked.
   std::string_view encoding() const { return encoding_; }
 
-  // Fails unless the encoding is a message. What an envelope holds is not looked at.
+  // Fails unless the encoding is a message, which is in doubt where it came as bytes. What an envelope holds is not
+  // looked at.
   Outcome<void> check() const;
 
   // The message with its envelope opened. Where an envelope in text or JSON has its data as a string of bytes that are

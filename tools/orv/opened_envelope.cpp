@@ -1,6 +1,5 @@
 #include "tools/orv/opened_envelope.hpp"
 
-#include "messages/core/built_in.hpp"
 #include "tools/orv/typed_value.hpp"
 
 namespace orv::tool {

@@ -2,7 +2,9 @@
 #pragma once
 
 #include <algorithm>
+#include <expected>
 #include <optional>
+#include <string>
 #include <string_view>
 #include <tuple>
 #include <utility>
@@ -23,6 +25,23 @@ class OpenedEnvelope final : public Message<OpenedEnvelope<Payload>> {
     if (envelope.hasVersion()) version_ = envelope.version();
     if (envelope.hasType()) type_ = envelope.type();
     this->setUnknownFields(envelope.unknownFields());
+  }
+
+  // As every message has them. The library compiles those for its own types; here the rules are named as they are for
+  // any visitor.
+  std::string debugDescription() const {
+    std::string text;
+    TextRenderer renderer(text, OpenedEnvelope::_protobuf_nameMap());
+    (void)this->template traverse<TextRenderer>(renderer);
+    return text;
+  }
+  std::expected<std::string, EncodeError> serialize() const {
+    std::string bytes;
+    BinaryEncoder encoder(bytes);
+    if (auto walked = this->template traverse<BinaryEncoder>(encoder); !walked)
+      return std::unexpected(walked.error());
+    encoder.finish();
+    return bytes;
   }
 
  private:

@@ -118,7 +118,7 @@ void addColour(CommandSetup& setup, Options& options) {
 }
 
 void addMaximumSize(CommandSetup& setup, Options& options) {
-  setup.option("--max-size", "SIZE", "the most bytes that a message may have (default 64MiB)",
+  setup.option("--max-size", "SIZE", "the most bytes that a message may have (default 16MiB)",
                [&options](const std::string& given) {
                  const auto size = sizeInBytes(given);
                  if (!size) refuse("--max-size", "\"" + given + "\" is no size (1000000, 64KiB, 1G)");

@@ -95,8 +95,8 @@ std::expected<void, TextFault> checkTexts(const pb::Message& message,
       }
       if (field->cpp_type() != pb::FieldDescriptor::CPPTYPE_MESSAGE) break;
       const auto* const nested = locations.GetTreeForNested(field, place);
-      if (nested == nullptr) continue;
-      if (auto checked = checkTexts(messageAt(message, *field, index), *nested); !checked) return checked;
+      auto checked = checkTexts(messageAt(message, *field, index), nested != nullptr ? *nested : locations);
+      if (!checked) return checked;
     }
   }
   return {};
