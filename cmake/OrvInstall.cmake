@@ -5,6 +5,9 @@ include(GNUInstallDirs)
 
 set(orvPackageDirectory ${CMAKE_INSTALL_LIBDIR}/cmake/orv)
 
+# These are for the library's own sources.
+set(orvPrivateHeaders messages/core/built_in.hpp messages/core/replacing.hpp runtime/canonical.hpp)
+
 # A library, under the name that it has in the project, with the headers of these folders.
 function(orv_install target exportSet)
   string(REPLACE "orv_" "" exportName ${target})
@@ -14,12 +17,11 @@ function(orv_install target exportSet)
     INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/orv)
   install(EXPORT ${exportSet} NAMESPACE orv:: DESTINATION ${orvPackageDirectory} COMPONENT library)
   foreach(folder IN LISTS ARGN)
-    # The others are for the library's own sources.
+    set(excluded ${orvPrivateHeaders})
+    list(TRANSFORM excluded REPLACE ".*/(.*)" "PATTERN;\\1;EXCLUDE")
     install(DIRECTORY ${PROJECT_SOURCE_DIR}/${folder} COMPONENT library
       DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/orv
-      FILES_MATCHING PATTERN "*.hpp"
-      PATTERN "built_in.hpp" EXCLUDE
-      PATTERN "canonical.hpp" EXCLUDE)
+      FILES_MATCHING PATTERN "*.hpp" ${excluded})
   endforeach()
 endfunction()
 
@@ -39,6 +41,7 @@ install(FILES ${PROJECT_BINARY_DIR}/orvConfig.cmake ${PROJECT_BINARY_DIR}/orvCon
 if(ORV_BUILD_TESTS)
   add_test(NAME Build.AnInstalledLibraryServesItsUsers
     COMMAND ${CMAKE_COMMAND} -DBUILD=${PROJECT_BINARY_DIR} -DCONSUMER=${PROJECT_SOURCE_DIR}/examples/custom
+      "-DPRIVATE_HEADERS=${orvPrivateHeaders}"
       -DCOMPILER=${CMAKE_CXX_COMPILER} "-DFLAGS=${CMAKE_CXX_FLAGS}"
       -P ${PROJECT_SOURCE_DIR}/cmake/test_installation.cmake)
   set_tests_properties(Build.AnInstalledLibraryServesItsUsers PROPERTIES TIMEOUT 600)

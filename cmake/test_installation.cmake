@@ -1,6 +1,9 @@
 # Installs the build in BUILD into a folder of its own, builds the project CONSUMER against that, and runs its tests.
 set(place ${BUILD}/installation_test)
 file(REMOVE_RECURSE ${place})
+if(NOT PRIVATE_HEADERS)
+  message(FATAL_ERROR "no headers are private?")
+endif()
 
 function(run)
   execute_process(COMMAND ${ARGN} RESULT_VARIABLE status OUTPUT_VARIABLE output ERROR_VARIABLE output)
@@ -10,7 +13,7 @@ function(run)
 endfunction()
 
 run(${CMAKE_COMMAND} --install ${BUILD} --component library --prefix ${place}/installed)
-foreach(private messages/core/built_in.hpp runtime/canonical.hpp)
+foreach(private IN LISTS PRIVATE_HEADERS)
   if(EXISTS ${place}/installed/include/orv/${private})
     message(FATAL_ERROR "${private} was installed")
   endif()
