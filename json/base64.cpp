@@ -14,8 +14,8 @@ constexpr std::uint8_t noDigit = 64;
 constexpr auto digits = [] {
   std::array<std::uint8_t, 256> table{};
   table.fill(noDigit);
-  for (std::uint8_t value = 0; value < alphabet.size(); ++value)
-    table[static_cast<unsigned char>(alphabet[value])] = value;
+  for (std::size_t value = 0; value < alphabet.size(); ++value)
+    table[static_cast<unsigned char>(alphabet[value])] = static_cast<std::uint8_t>(value);
   table['-'] = table['+'];
   table['_'] = table['/'];
   return table;

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <numeric>
 #include <vector>
 
 namespace orv::json {
@@ -14,7 +13,7 @@ char lowered(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' +
 // How many characters must be put in, taken out or exchanged to make one name of the other (Levenshtein).
 std::size_t distance(std::string_view from, std::string_view to) {
   std::vector<std::size_t> row(to.size() + 1);
-  std::iota(row.begin(), row.end(), std::size_t{0});
+  for (std::size_t j = 0; j < row.size(); ++j) row[j] = j;
   for (std::size_t i = 0; i < from.size(); ++i) {
     std::size_t diagonal = row[0];
     row[0] = i + 1;

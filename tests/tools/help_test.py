@@ -38,7 +38,9 @@ def completion(helps):
             listed = set(re.findall(r"\b(binary|hex|base64|text|json)\b", formats))
             expect(f"completion of {name} {option}", completed(COMMAND, name, option, ""), listed)
     expect("completion without a command", completed(COMMAND, "--"), options(helps["decode"]) | {"--version"})
-    expect("completion of types", completed(COMMAND, "types", "JoinReq"), {"JoinRequest", "JoinRequest.Content"})
+    expect(
+        "completion of types", completed(COMMAND, "types", "JoinReq"), {"JoinRequest", "JoinRequest.Content"}
+    )
     expect("completion of a type", completed(COMMAND, "-t", "Memb"), {"Member"})
     expect("completion of a payload", completed(COMMAND, "--payload", "joinRequest", "=", "Memb"), {"Member"})
 
@@ -77,7 +79,9 @@ def examples(helps):
             if any(shutil.which(word) is None for word in re.findall(r"\| (\w+)", line) if word != "orv"):
                 print(f"not run for want of a program: {line}")
                 continue
-            done = subprocess.run(["bash", "-o", "pipefail", "-c", line], env=search, capture_output=True, timeout=60)
+            done = subprocess.run(
+                ["bash", "-o", "pipefail", "-c", line], env=search, capture_output=True, timeout=60
+            )
             expect(f"example {line}", (done.returncode, done.stderr), (0, b""))
 
 

@@ -16,7 +16,9 @@ def message(size):
 
 def peak_memory(arguments, pieces):
     """Feeds the pieces to the command; answers its status and the most memory that it held, in bytes."""
-    process = subprocess.Popen([COMMAND, *arguments], stdin=subprocess.PIPE, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+    process = subprocess.Popen(
+        [COMMAND, *arguments], stdin=subprocess.PIPE, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL
+    )
 
     def feed():
         try:
@@ -35,11 +37,17 @@ def peak_memory(arguments, pieces):
 
 
 def documents(count):
-    return (b'{"version":1,"type":"joinRequest","data":{"encryptedData":"' + b"AAAA" * 80 + b'"}}\n' for _ in range(count))
+    return (
+        b'{"version":1,"type":"joinRequest","data":{"encryptedData":"' + b"AAAA" * 80 + b'"}}\n'
+        for _ in range(count)
+    )
 
 
 def texts(count):
-    return (b'# message\nversion: 1\ntype: joinRequest\ndata { encryptedData: "' + b"e" * 300 + b'" }\n' for _ in range(count))
+    return (
+        b'# message\nversion: 1\ntype: joinRequest\ndata { encryptedData: "' + b"e" * 300 + b'" }\n'
+        for _ in range(count)
+    )
 
 
 def test():

@@ -10,19 +10,29 @@ import threading
 
 from tool import COMMAND, delimited, expect, in_scratch_directory, record, run, write
 
-ENVELOPE = bytes.fromhex("08 01 10 05 1A 2B 0A 29 0A 01 FF 12 07 0A 05") + b"carol" + bytes.fromhex("12 1B 0A 0F") + \
-    b"dave's tablet 2" + bytes.fromhex("12 08") + b"token-77"
+ENVELOPE = (
+    bytes.fromhex("08 01 10 05 1A 2B 0A 29 0A 01 FF 12 07 0A 05")
+    + b"carol"
+    + bytes.fromhex("12 1B 0A 0F")
+    + b"dave's tablet 2"
+    + bytes.fromhex("12 08")
+    + b"token-77"
+)
 TRUNCATED = ENVELOPE[:-1]
 
 
-def on_terminal(arguments, columns=80, environment=(), captured=("stdout", "stderr"), stdin=subprocess.DEVNULL):
+def on_terminal(
+    arguments, columns=80, environment=(), captured=("stdout", "stderr"), stdin=subprocess.DEVNULL
+):
     """Runs the command with some of its streams on a terminal; the status, and what the terminal was sent."""
     master, slave = pty.openpty()
     fcntl.ioctl(slave, termios.TIOCSWINSZ, struct.pack("HHHH", 24, columns, 0, 0))
     streams = {name: slave if name in captured else subprocess.DEVNULL for name in ("stdout", "stderr")}
     variables = {**os.environ, "TERM": "xterm", **dict(environment)}
     variables = {name: value for name, value in variables.items() if value is not None}
-    process = subprocess.Popen([COMMAND, *arguments], stdin=slave if stdin == "terminal" else stdin, env=variables, **streams)
+    process = subprocess.Popen(
+        [COMMAND, *arguments], stdin=slave if stdin == "terminal" else stdin, env=variables, **streams
+    )
     os.close(slave)
     shown = b""
 
@@ -60,7 +70,11 @@ def colours():
     write("message.bin", ENVELOPE)
     plain = run("inspect", "message.bin").stdout
     expect("no colours without a terminal", b"\033" in plain, False)
-    expect("colours without a terminal, on demand", b"\033[" in run("inspect", "--color", "always", "message.bin").stdout, True)
+    expect(
+        "colours without a terminal, on demand",
+        b"\033[" in run("inspect", "--color", "always", "message.bin").stdout,
+        True,
+    )
     no_colour = [("NO_COLOR", None)]
     for name, arguments, environment, expected in [
         ("a terminal", [], no_colour, True),
@@ -76,11 +90,17 @@ def colours():
 
 def refusals():
     status, shown = on_terminal(["encode", "document.json"])
-    expect("binary output on a terminal", (status, shown),
-           (2, "orv: encode: binary output is not for a terminal: use --to hex, or -o FILE\n"))
+    expect(
+        "binary output on a terminal",
+        (status, shown),
+        (2, "orv: encode: binary output is not for a terminal: use --to hex, or -o FILE\n"),
+    )
     status, shown = on_terminal([], stdin="terminal")
-    expect("nothing to read", (status, shown),
-           (2, "orv: decode: nothing to read: name a file or pipe one in (orv --help tells more)\n"))
+    expect(
+        "nothing to read",
+        (status, shown),
+        (2, "orv: decode: nothing to read: name a file or pipe one in (orv --help tells more)\n"),
+    )
 
 
 def progress():

@@ -9,27 +9,55 @@ import sys
 
 from tool import SKIPPED, delimited, expect, in_scratch_directory, record
 
-TREE = os.path.join(os.path.dirname(os.path.abspath(__file__)), "../..")
+TREE = os.path.realpath(os.path.join(os.path.dirname(__file__), "../.."))
 PORT = 4711
 
 # Envelopes, and what the dissector is to say of each: kind, payload message, and something that is in the payload.
 ENVELOPES = [
-    (bytes.fromhex("08 01 10 03") + record(3, record(1, b"id-1") + record(2, b"carol")), "connectionRequest",
-     "orv.ConnectionRequest", "handle = carol"),
-    (bytes.fromhex("10 04") + record(3, record(4, record(1, b"\xca\xfe"))), "connectionResponse",
-     "orv.ConnectionResponse.Content", "invitationData"),
+    (
+        bytes.fromhex("08 01 10 03") + record(3, record(1, b"id-1") + record(2, b"carol")),
+        "connectionRequest",
+        "orv.ConnectionRequest",
+        "handle = carol",
+    ),
+    (
+        bytes.fromhex("10 04") + record(3, record(4, record(1, b"\xca\xfe"))),
+        "connectionResponse",
+        "orv.ConnectionResponse.Content",
+        "invitationData",
+    ),
     # The type behind the data, and given twice.
-    (record(3, record(2, b"sealed" * 50)) + bytes.fromhex("10 05 10 02"), "joinResponse", "orv.JoinResponse",
-     "encryptedData"),
+    (
+        record(3, record(2, b"sealed" * 50)) + bytes.fromhex("10 05 10 02"),
+        "joinResponse",
+        "orv.JoinResponse",
+        "encryptedData",
+    ),
     (bytes.fromhex("10 01") + record(3, b""), "joinRequest", "orv.JoinRequest", "orv.JoinRequest"),
-    (bytes.fromhex("10 05 25 00 00 00 00") + record(3, bytes.fromhex("22 02 10 01")), "groupMessage", "orv.Group",
-     "usesToken = true"),
+    (
+        bytes.fromhex("10 05 25 00 00 00 00") + record(3, bytes.fromhex("22 02 10 01")),
+        "groupMessage",
+        "orv.Group",
+        "usesToken = true",
+    ),
     (bytes.fromhex("10 09") + record(3, b"\xff"), "type 9", None, "data"),
 ]
 
 
 def ip(protocol, payload):
-    header = struct.pack(">BBHHHBBH4s4s", 0x45, 0, 20 + len(payload), 1, 0, 64, protocol, 0, bytes([10, 0, 0, 1]), bytes([10, 0, 0, 2]))
+    header = struct.pack(
+        ">BBHHHBBH4s4s",
+        0x45,
+        0,
+        20 + len(payload),
+        1,
+        0,
+        64,
+        protocol,
+        0,
+        bytes([10, 0, 0, 1]),
+        bytes([10, 0, 0, 2]),
+    )
     return header + payload
 
 
@@ -51,9 +79,23 @@ def capture(path, packets):
 
 def dissected(path, *arguments):
     done = subprocess.run(
-        ["tshark", "-X", f"lua_script:{TREE}/tools/wireshark/orv.lua", "-o", f'uat:protobuf_search_paths:"{TREE}/proto","TRUE"',
-         "-o", f"orv.udp:{PORT}", "-o", f"orv.tcp:{PORT}", "-r", path, *arguments],
-        capture_output=True, timeout=120)
+        [
+            "tshark",
+            "-X",
+            f"lua_script:{TREE}/tools/wireshark/orv.lua",
+            "-o",
+            f'uat:protobuf_search_paths:"{TREE}/proto","TRUE"',
+            "-o",
+            f"orv.udp:{PORT}",
+            "-o",
+            f"orv.tcp:{PORT}",
+            "-r",
+            path,
+            *arguments,
+        ],
+        capture_output=True,
+        timeout=120,
+    )
     expect(f"{path}: status", done.returncode, 0)
     expect(f"{path}: complaints", re.findall(rb"[Ll]ua.*", done.stdout + done.stderr), [])
     return done.stdout.decode()
@@ -76,7 +118,11 @@ def check(path):
     found = trees(path)
     expect(f"{path}: envelopes", len(found), len(ENVELOPES))
     for tree, (_, kind, payload, content) in zip(found, ENVELOPES):
-        expect(f"{path}: {kind}: heading", tree.splitlines()[0], kind if payload is None else f"{kind}, {payload}")
+        expect(
+            f"{path}: {kind}: heading",
+            tree.splitlines()[0],
+            kind if payload is None else f"{kind}, {payload}",
+        )
         expect(f"{path}: {kind}: payload as a message", f"Message: {payload}" in tree, payload is not None)
         expect(f"{path}: {kind}: content", content in tree, True)
 
@@ -89,13 +135,19 @@ def test():
     stream = delimited(*envelopes)
     for size in (len(stream), 1, 7, 100):
         segments = range(0, len(stream), size)
-        capture("tcp.pcap", [tcp(1 + start, stream[start:start + size]) for start in segments])
+        capture("tcp.pcap", [tcp(1 + start, stream[start : start + size]) for start in segments])
         check("tcp.pcap")
 
     # What is no envelope is marked, and disturbs nothing.
     junk = [b"\xff" * 6, bytes.fromhex("1A FF FF FF FF 0F"), bytes.fromhex("10 05 1A 05 12 17"), b""]
     capture("junk.pcap", [udp(payload) for payload in junk] + [tcp(1, b"\xff" * 20)])
-    expect("junk: information", names("junk.pcap"), ["no type", "no type (malformed)", "groupMessage (malformed)", ""])
+    expect(
+        "junk: information",
+        names("junk.pcap"),
+        ["no type", "no type (malformed)", "groupMessage (malformed)"],
+    )
+    marked = dissected("junk.pcap", "-Y", "orv.malformed", "-T", "fields", "-e", "frame.number")
+    expect("junk: marked as malformed", marked.split(), ["2", "3", "5"])
 
 
 if shutil.which("tshark") is None:

@@ -44,7 +44,7 @@ CommandLineDescription describeCommandLine() {
                "payload as a message or an object, or its bytes as a string.",
        .operands = "[FILE]...",
        .options = {},
-       .examples = {{"echo '{\"handle\":\"carol\"}' | orv encode -t Member --to hex",
+       .examples = {{R"(echo '{"handle":"carol"}' | orv encode -t Member --to hex)",
                      "a member in hexadecimal digits"},
                     {"orv --to json message.bin | jq '.version = 2' | orv encode -o changed.bin",
                      "changes a message"}}},

@@ -2,8 +2,7 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
-#include <cstdio>
+#include <cstdint>
 #include <string>
 #include <utility>
 
@@ -12,6 +11,7 @@
 #include "tools/orv/message_input.hpp"
 #include "tools/orv/output_file.hpp"
 #include "tools/orv/progress.hpp"
+#include "tools/orv/value_text.hpp"
 
 namespace orv::tool {
 
@@ -54,12 +54,12 @@ class Comparison {
     }
     if (!options_.comparesEncodings || before.encoding() == after.encoding()) return {};
     const auto mismatch = std::ranges::mismatch(before.encoding(), after.encoding());
-    const auto at = static_cast<unsigned long long>(mismatch.in1 - before.encoding().begin());
-    std::array<char, 96> place;
-    std::snprintf(place.data(), place.size(), "%zu bytes, the first that differs is byte %llu (0x%04llx)",
-                  after.encoding().size(), at, at);
-    return tell(before, {Difference::Kind::changed, "encoding",
-                         std::to_string(before.encoding().size()) + " bytes", place.data()});
+    const auto at = static_cast<std::uint64_t>(mismatch.in1 - before.encoding().begin());
+    return tell(before, {.kind = Difference::Kind::changed,
+                         .path = "encoding",
+                         .before = std::to_string(before.encoding().size()) + " bytes",
+                         .after = std::to_string(after.encoding().size()) +
+                                  " bytes, the first that differs is " + bytePlace(at)});
   }
 
   // A message that only one side has.

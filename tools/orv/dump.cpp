@@ -122,10 +122,8 @@ void Dump::showError(const DecodeError& error) {
         rows, {offsetOf(shownUpTo_), rest.first(before), rest.first(shown).subspan(before), note.colour},
         note);
   }
-  std::array<char, 64> place;
-  const auto at = static_cast<unsigned long long>(offset_ + error.offset);
-  std::snprintf(place.data(), place.size(), "error at byte %llu (0x%04llx): ", at, at);
-  layout_.appendError(rows, place.data() + error.path.text() + ": " + error.reason());
+  layout_.appendError(rows, "error at " + bytePlace(offset_ + error.offset) + ": " + error.path.text() +
+                                ": " + error.reason());
   write(rows);
 }
 

@@ -1,8 +1,8 @@
 #include "tools/orv/dump_layout.hpp"
 
 #include <algorithm>
-#include <array>
-#include <cstdio>
+
+#include "tools/orv/value_text.hpp"
 
 namespace orv::tool {
 
@@ -19,7 +19,8 @@ constexpr std::size_t narrow = 72;
 
 std::size_t rowSize(std::size_t width) {
   if (width == 0) return 8;
-  return width >= wide ? 16 : width >= narrow ? 8 : 4;
+  if (width >= wide) return 16;
+  return width >= narrow ? 8 : 4;
 }
 
 bool startsCharacter(char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }
@@ -32,11 +33,10 @@ std::size_t columns(std::string_view text) {
 std::string fitted(std::string_view text, std::size_t room) {
   if (columns(text) <= room) return std::string(text);
   if (room == 0) return {};
+  // The ellipsis takes the place of the first character that is left out.
   std::size_t end = 0;
-  for (std::size_t taken = 0; taken < room; ++taken) {
-    if (taken + 1 == room) break;
-    do ++end;
-    while (end < text.size() && !startsCharacter(text[end]));
+  for (std::size_t started = 0; end < text.size(); ++end) {
+    if (startsCharacter(text[end]) && ++started == room) break;
   }
   return std::string(text.substr(0, end)) + "…";
 }
@@ -67,10 +67,7 @@ void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Not
 }
 
 void DumpLayout::appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const {
-  std::array<char, 24> offset;
-  std::snprintf(offset.data(), offset.size(), "%0*llx", static_cast<int>(offsetDigits),
-                static_cast<unsigned long long>(bytes.offset + row));
-  palette_.append(output, Palette::Colour::offset, offset.data());
+  palette_.append(output, Palette::Colour::offset, hexOffset(bytes.offset + row));
   output += "  ";
   const auto hex = [](std::span<const std::byte> part) {
     std::string text;

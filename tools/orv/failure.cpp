@@ -44,7 +44,7 @@ void report(const Failure& failure) {
   if (failure.line.empty()) return;
   const std::string line = printable(failure.line) + '\n';
   // Nothing can be done where this fails too.
-  (void)!::write(STDERR_FILENO, line.data(), line.size());
+  [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, line.data(), line.size());
 }
 
 }  // namespace orv::tool

@@ -1,12 +1,12 @@
 #include "tools/orv/frame_reader.hpp"
 
 #include <array>
-#include <cstdio>
 #include <utility>
 
 #include "runtime/delimited_stream.hpp"
 #include "tools/orv/byte_source.hpp"
 #include "tools/orv/text_stream.hpp"
+#include "tools/orv/value_text.hpp"
 
 namespace orv::tool {
 
@@ -130,10 +130,7 @@ Failure FrameReader::malformed(const Frame& frame, std::string_view reason) cons
 }
 
 Failure FrameReader::malformedBytes(const Frame& frame, std::uint64_t offset, std::string_view reason) const {
-  const auto at = static_cast<unsigned long long>(frame.offset + offset);
-  std::array<char, 64> place;
-  std::snprintf(place.data(), place.size(), "byte %llu (0x%04llx): ", at, at);
-  return malformed(frame, place.data() + std::string(reason));
+  return malformed(frame, bytePlace(frame.offset + offset) + ": " + std::string(reason));
 }
 
 Failure FrameReader::malformedText(const Frame& frame, std::size_t line, std::size_t column,

@@ -11,9 +11,8 @@
 #include "tools/orv/options.hpp"
 #include "tools/orv/output_file.hpp"
 
+namespace orv::tool {
 namespace {
-
-using namespace orv::tool;
 
 // In the order of Command.
 constexpr std::array run{runConvert, runConvert,  runInspect, runConvert,
@@ -49,15 +48,17 @@ ExitStatus runCommandLine(int argumentCount, const char* const* arguments) {
 }
 
 }  // namespace
+}  // namespace orv::tool
 
 int main(int argumentCount, char** arguments) {
+  using orv::tool::ExitStatus;
   // A write to a closed pipe fails, and ends the work, without a signal.
   std::signal(SIGPIPE, SIG_IGN);
-  occupyStandardDescriptors();
+  orv::tool::occupyStandardDescriptors();
   try {
-    return static_cast<int>(runCommandLine(argumentCount, arguments));
+    return static_cast<int>(orv::tool::runCommandLine(argumentCount, arguments));
   } catch (const std::bad_alloc&) {
-    report({ExitStatus::fileError, "orv: out of memory"});
+    orv::tool::report({ExitStatus::fileError, "orv: out of memory"});
     return static_cast<int>(ExitStatus::fileError);
   }
 }

@@ -1,12 +1,11 @@
 #include "tools/orv/message_output.hpp"
 
-#include <array>
-#include <cstdio>
 #include <utility>
 
 #include "json/base64.hpp"
 #include "runtime/delimited_stream.hpp"
 #include "tools/orv/text_stream.hpp"
+#include "tools/orv/value_text.hpp"
 
 namespace orv::tool {
 
@@ -63,11 +62,7 @@ void MessageOutput::appendText(const MessageInput& input, const MessageValue& me
   if (options_.isDelimited) {
     if (!isFirst_) piece_ += '\n';
     piece_ += textSeparator;
-    piece_ += ' ' + std::to_string(input.frame().number);
-    std::array<char, 64> place;
-    const auto offset = static_cast<unsigned long long>(input.frame().offset);
-    std::snprintf(place.data(), place.size(), ", at byte %llu (0x%04llx)\n", offset, offset);
-    piece_ += place.data();
+    piece_ += ' ' + std::to_string(input.frame().number) + ", at " + bytePlace(input.frame().offset) + '\n';
   }
   piece_ += message.text();
 }

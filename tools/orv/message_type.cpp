@@ -38,9 +38,9 @@ std::expected<const MessageType*, std::string> findMessageType(std::string_view 
   if (sameLastWord.empty()) {
     return std::unexpected("unknown message type " + quoted + json::suggestion(name, names));
   }
-  std::string error = quoted + " could be";
+  std::string error = quoted + " could be ";
   for (const MessageType* type : sameLastWord) {
-    error += type == sameLastWord.front() ? " " : type == sameLastWord.back() ? " or " : ", ";
+    if (type != sameLastWord.front()) error += type == sameLastWord.back() ? " or " : ", ";
     error += type->shortName();
   }
   return std::unexpected(error);

@@ -42,9 +42,9 @@ class CommandSetup {
   }
 
   void option(const std::string& names, const std::string& valueName, const std::string& text,
-              std::function<void(const std::string&)> take) {
+              const std::function<void(const std::string&)>& take) {
     describe(names, valueName, text);
-    app_.add_option_function<std::string>(names, std::move(take))->trigger_on_parse();
+    app_.add_option_function<std::string>(names, take)->trigger_on_parse();
   }
 
   void operands(std::vector<std::string>& values) {
@@ -80,7 +80,7 @@ void addFormat(CommandSetup& setup, const std::string& name, const std::string& 
                std::optional<Format>& value, std::vector<Format> allowed, std::optional<Format> byDefault) {
   const std::string what = text + ": " + listed(allowed, byDefault);
   setup.option(name, "FORMAT", what, [&value, name, allowed = std::move(allowed)](const std::string& given) {
-    const auto found = std::ranges::find(formatNames, given);
+    const auto* const found = std::ranges::find(formatNames, given);
     const auto format = static_cast<Format>(found - formatNames.begin());
     if (std::ranges::find(allowed, format) == allowed.end()) {
       refuse(name, "\"" + given + "\" is none of " + listed(allowed, std::nullopt));

@@ -2,9 +2,7 @@
 
 #include <unistd.h>
 
-#include <array>
-#include <cstddef>
-#include <cstdio>
+#include <string>
 
 #include "tools/orv/terminal.hpp"
 
@@ -14,6 +12,10 @@ namespace {
 
 constexpr std::chrono::milliseconds patience{1000};
 constexpr std::chrono::milliseconds interval{200};
+
+void show(const std::string& text) {
+  [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, text.data(), text.size());
+}
 
 }  // namespace
 
@@ -27,18 +29,15 @@ void Progress::update(std::uint64_t messages, std::uint64_t bytes) {
   const Clock::time_point now = Clock::now();
   if (now < next_) return;
   next_ = now + interval;
-  std::array<char, 96> line;
-  const int size =
-      std::snprintf(line.data(), line.size(), "\r%llu messages, %.1f MiB\033[K",
-                    static_cast<unsigned long long>(messages), static_cast<double>(bytes) / 0x1p20);
-  (void)!::write(STDERR_FILENO, line.data(), static_cast<std::size_t>(size));
+  const std::uint64_t tenths = bytes * 10 >> 20;
+  show("\r" + std::to_string(messages) + " messages, " + std::to_string(tenths / 10) + '.' +
+       std::to_string(tenths % 10) + " MiB\033[K");
   isShown_ = true;
 }
 
 void Progress::clear() {
   if (!isShown_) return;
-  constexpr char erase[] = "\r\033[K";
-  (void)!::write(STDERR_FILENO, erase, sizeof erase - 1);
+  show("\r\033[K");
   isShown_ = false;
 }
 

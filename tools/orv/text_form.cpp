@@ -78,25 +78,32 @@ const pb::Message& messageAt(const pb::Message& message, const pb::FieldDescript
                              : reflection.GetMessage(message, &field);
 }
 
+using TextCheck = std::expected<void, TextFault>;
+
+TextCheck checkTexts(const pb::Message& message, const pb::TextFormat::ParseInfoTree& locations);
+
+// Checks one value of a field: a text, or the texts in a message.
+TextCheck checkValue(const pb::Message& message, const pb::FieldDescriptor& field, int index,
+                     const pb::TextFormat::ParseInfoTree& locations) {
+  const int place = field.is_repeated() ? index : -1;
+  if (field.type() == pb::FieldDescriptor::TYPE_MESSAGE) {
+    const auto* const nested = locations.GetTreeForNested(&field, place);
+    return checkTexts(messageAt(message, field, index), nested != nullptr ? *nested : locations);
+  }
+  if (field.type() != pb::FieldDescriptor::TYPE_STRING) return {};
+  if (utf8::isWellFormed(textAt(message, field, index))) return {};
+  const std::string item = field.is_repeated() ? '[' + std::to_string(index) + ']' : "";
+  return std::unexpected(faultAt(locations, field, place, "ill-formed UTF-8 in " + field.name() + item));
+}
+
 // The parser takes escapes of any bytes, also in texts, and says nothing.
-std::expected<void, TextFault> checkTexts(const pb::Message& message,
-                                          const pb::TextFormat::ParseInfoTree& locations) {
+TextCheck checkTexts(const pb::Message& message, const pb::TextFormat::ParseInfoTree& locations) {
   std::vector<const pb::FieldDescriptor*> fields;
   message.GetReflection()->ListFields(message, &fields);
   for (const pb::FieldDescriptor* field : fields) {
     const int count = field->is_repeated() ? message.GetReflection()->FieldSize(message, field) : 1;
     for (int index = 0; index < count; ++index) {
-      const int place = field->is_repeated() ? index : -1;
-      if (field->type() == pb::FieldDescriptor::TYPE_STRING) {
-        if (utf8::isWellFormed(textAt(message, *field, index))) continue;
-        const std::string item = field->is_repeated() ? '[' + std::to_string(index) + ']' : "";
-        return std::unexpected(
-            faultAt(locations, *field, place, "ill-formed UTF-8 in " + field->name() + item));
-      }
-      if (field->cpp_type() != pb::FieldDescriptor::CPPTYPE_MESSAGE) break;
-      const auto* const nested = locations.GetTreeForNested(field, place);
-      auto checked = checkTexts(messageAt(message, *field, index), nested != nullptr ? *nested : locations);
-      if (!checked) return checked;
+      if (auto checked = checkValue(message, *field, index, locations); !checked) return checked;
     }
   }
   return {};

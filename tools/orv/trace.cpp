@@ -38,15 +38,15 @@ std::expected<bool, DecodeError> trace(const MessageType& type, std::span<const 
 }
 
 std::expected<std::optional<std::uint32_t>, TracingDecoder::Error> TracingDecoder::nextNumber() {
-  if (valueStart_ != nullptr && reader_.position() == valueStart_) {
+  if (hasField_ && reader_.position() == valueStart_) {
     if (auto traced = traceUnknown(); !traced) return std::unexpected(traced.error());
   }
-  valueStart_ = nullptr;
-  tag_ = Tag{0};
+  hasField_ = false;
   if (reader_.isAtEnd()) return std::nullopt;
   recordStart_ = reader_.position();
   const auto tag = reader_.readTag();
   if (!tag) return malformed;
+  hasField_ = true;
   tag_ = *tag;
   valueStart_ = reader_.position();
   return tag->fieldNumber();

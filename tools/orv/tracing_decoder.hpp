@@ -93,7 +93,9 @@ class TracingDecoder {
   int nesting_ = 0;
   const MessageFacts* message_ = nullptr;
   const std::byte* recordStart_ = nullptr;
-  const std::byte* valueStart_ = nullptr;  // of the field whose number was given last, if nobody took it yet
+  const std::byte* valueStart_ =
+      nullptr;  // of the field whose number was given last; nobody took it if it is next
+  bool hasField_ = false;
   Tag tag_{0};
   std::string prefix_;                                // of the paths of this message's fields
   std::string path_;                                  // of the field that is being read

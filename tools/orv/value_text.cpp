@@ -1,7 +1,6 @@
 #include "tools/orv/value_text.hpp"
 
 #include <algorithm>
-#include <cstddef>
 
 #include "runtime/utf8.hpp"
 
@@ -22,6 +21,19 @@ void appendHex(unsigned char byte, std::string& output) {
 std::string sizeNote(std::size_t size) { return " (" + std::to_string(size) + " bytes)"; }
 
 }  // namespace
+
+std::string hexOffset(std::uint64_t offset) {
+  constexpr std::size_t fewest = 4;
+  std::string digits;
+  for (; offset != 0 || digits.size() < fewest; offset >>= 4) {
+    digits.insert(digits.begin(), "0123456789abcdef"[offset & 0xF]);
+  }
+  return digits;
+}
+
+std::string bytePlace(std::uint64_t offset) {
+  return "byte " + std::to_string(offset) + " (0x" + hexOffset(offset) + ")";
+}
 
 bool isReadable(std::string_view bytes) {
   while (!bytes.empty()) {

@@ -1,10 +1,18 @@
 // Values as a line of text for people.
 #pragma once
 
+#include <cstddef>
+#include <cstdint>
 #include <string>
 #include <string_view>
 
 namespace orv::tool {
+
+// An offset in hexadecimal digits, at least four.
+std::string hexOffset(std::uint64_t offset);
+
+// "byte 12 (0x000c)"
+std::string bytePlace(std::uint64_t offset);
 
 // Whether the bytes are well-formed text without control characters.
 bool isReadable(std::string_view bytes);
