@@ -36,6 +36,7 @@ BinaryDecoder& BinaryDecoder::outermost() {
 std::unexpected<BinaryDecoder::Failure> BinaryDecoder::fail(DecodeCause cause, const std::byte* at,
                                                             std::uint32_t length, std::uint32_t detail) {
   BinaryDecoder& outermost = this->outermost();
+  outermost.refusal_.reset();
   outermost.fault_.cause = cause;
   outermost.fault_.at = at;
   outermost.fault_.length = length;

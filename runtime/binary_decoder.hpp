@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <expected>
 #include <limits>
+#include <memory>
 #include <optional>
 #include <span>
 #include <string_view>
@@ -27,8 +28,8 @@
 namespace orv {
 
 // What a BinaryDecoder asks when a oneof member arrives while its group already holds a case. It refers to a
-// callable that returns std::expected<void, DecodeError> and must outlive it. An error refuses the member and
-// ends the decoding; it reaches the caller as it was made.
+// callable that returns std::expected<void, DecodeError>, throws nothing and outlives it. An error refuses
+// the member and ends the decoding; it reaches the caller as it was made.
 class ConflictHook {
  public:
   // Accepts: the member read last wins.
@@ -38,7 +39,9 @@ class ConflictHook {
   requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
            std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
       ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
-      : callable_(&callable), call_([](void* target) -> std::expected<void, DecodeError> {
+      : callable_(const_cast<void*>(static_cast<const void*>(std::addressof(
+            callable)))),  // NOLINT(cppcoreguidelines-pro-type-const-cast): given back its type
+        call_([](void* target) -> std::expected<void, DecodeError> {
           return (*static_cast<Callable*>(target))();
         }) {}
 
@@ -57,17 +60,17 @@ class ConflictHook {
 //   BinaryDecoder decoder(bytes);
 //   const auto result = message.decodeMessage(decoder);
 //
-// (parse and merge are the same in one call.) Decoding n bytes takes time and memory in proportion to n, whatever
-// they are. A decodeMessage that is given a BinaryDecoder fails with a DecodeError: what is wrong, at which byte,
-// in which field.
+// (parse and merge are the same in one call.) Decoding n bytes takes time and memory in proportion to n,
+// whatever they are. A decodeMessage that is given a BinaryDecoder fails with a DecodeError: what is wrong,
+// at which byte, in which field.
 //
 // Each nested message is read by a decoder of its own, which knows the one that reads the enclosing message.
 class BinaryDecoder {
  public:
-  // What the single operations fail with: nothing but the fact, where a DecodeError passed up through every level
-  // of nesting cost a tenth of all decoding. failure() then says what was wrong. It is copied by hand because g++ 12
-  // packs small results that copy trivially into registers by way of memory, in pieces that the processor cannot
-  // forward: with that, decoding takes twice as long.
+  // What the single operations fail with: nothing but the fact, where a DecodeError passed up through every
+  // level of nesting cost a tenth of all decoding. failure() then says what was wrong. It is copied by hand
+  // because g++ 12 packs small results that copy trivially into registers by way of memory, in pieces that
+  // the processor cannot forward: with that, decoding takes twice as long.
   struct Failure {
     Failure() = default;
     Failure(const Failure&) noexcept {}
@@ -128,9 +131,9 @@ class BinaryDecoder {
   // A failed read leaves the slot as it was: absent, or holding what it held.
   template <class M>
   Result decodeSingularMessageField(std::optional<M>& slot) {
-    if (!isAtMessageField()) return {};
+    if (!isAtLengthDelimitedField()) return {};
     if (slot.has_value()) {
-      if (auto checked = checkMessageField<M>(); !checked) return checked;
+      if (auto checked = checkMessageField(*slot); !checked) return checked;
       return mergeMessageField(*slot);
     }
     auto read = readNewMessage(slot.emplace());
@@ -161,19 +164,21 @@ class BinaryDecoder {
 
   static constexpr bool canReread = true;
 
-  bool isAtMessageField() const { return isLengthDelimited(); }
+  bool isAtLengthDelimitedField() const { return isLengthDelimited(); }
 
   template <class M>
   Result readNewMessage(M& message) {
     return readMessage(message, mode_);
   }
 
-  // Reads the field into a message that is then dropped.
+  // Reads the field into a message that is then dropped: a copy of the one that is there if a oneof in it
+  // decides whether the hook is asked.
   template <class M>
-  Result checkMessageField() {
-    if (mode_ != Mode::careful || !isAtMessageField()) return {};
+  Result checkMessageField(const M& held) {
+    if (mode_ != Mode::careful || !isAtLengthDelimitedField()) return {};
     const WireReader here = reader_;
     M scratch;
+    if constexpr (M::messageFacts().holdsOneof()) scratch = held;
     auto read = readMessage(scratch, Mode::checking);
     reader_ = here;
     return read;
@@ -215,7 +220,8 @@ class BinaryDecoder {
 
   bool isLengthDelimited() const { return tag_.wireType() == WireType::lengthDelimited; }
 
-  // What follows is inlined by order: g++ 12 calls most of it otherwise, at the price of a fifth of all decoding.
+  // What follows is inlined by order: g++ 12 calls most of it otherwise, at the price of a fifth of all
+  // decoding.
 
   // Whether the length-delimited field could be read.
   [[gnu::always_inline]] bool readBody(std::span<const std::byte>& body) {
@@ -306,9 +312,9 @@ class BinaryDecoder {
     return static_cast<std::size_t>(readableEnd_ - bytes.data());
   }
 
-  // Before an element is added to a full list: room for it and for the records of the same field that follow its
-  // own directly. A list that arrives in one run is thus allocated twice at most: for its first few elements, so that
-  // an error among them is found before the whole run was counted, and then for all.
+  // Before an element is added to a full list: room for it and for the records of the same field that follow
+  // its own directly. A list that arrives in one run is thus allocated twice at most: for its first few
+  // elements, so that an error among them is found before the whole run was counted, and then for all.
   template <class T>
   void makeRoom(std::vector<T>& list) const {
     if (list.size() < list.capacity()) [[likely]]
@@ -346,8 +352,9 @@ class BinaryDecoder {
   const std::byte* begin_ = nullptr;
   ConflictHook hook_;
 
-  // What became of the outermost decoder; meaningless until something failed. The parts of the error stand here one
-  // by one and become a DecodeError where the caller wants it: put together and then copied, they take twice as long.
+  // What became of the outermost decoder; meaningless until something failed. The parts of the error stand
+  // here one by one and become a DecodeError where the caller wants it: put together and then copied, they
+  // take twice as long.
   WireFault fault_;
   std::array<std::uint32_t, FieldPath::capacity> numbers_;
   std::uint8_t depth_;

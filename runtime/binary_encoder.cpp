@@ -79,7 +79,7 @@ BinaryEncoder::Result BinaryEncoder::makeRoom(std::size_t size) {
   if (size > largestEncoding || needed > largestEncoding) return std::unexpected(EncodeError::tooLarge);
   if (growing_ == nullptr) return std::unexpected(EncodeError::bufferTooSmall);
   constexpr std::size_t firstGrowth = 256;
-  const std::size_t capacity = std::max({needed, 2 * written(), firstGrowth});
+  const std::size_t capacity = std::min(std::max({needed, 2 * written(), firstGrowth}), largestEncoding);
   const std::size_t kept = written();
   growing_->resize_and_overwrite(oldSize_ + capacity, [](char*, std::size_t all) { return all; });
   begin_ = growing_->data() + oldSize_;

@@ -45,8 +45,9 @@ class BinaryEncoder {
         growing_(&output),
         oldSize_(output.size()) {}
 
-  // Writes from the start of `buffer`, which stays the caller's. With careful guesses an encoding fits where it fits
-  // exactly; with bold ones, which are right more often, it may need a few bytes more while it is being written.
+  // Writes from the start of `buffer`, which stays the caller's. With careful guesses an encoding fits where
+  // it fits exactly; with bold ones, which are right more often, it may need a few bytes more while it is
+  // being written.
   enum class Guesses : std::uint8_t { bold, careful };
   explicit BinaryEncoder(std::span<std::byte> buffer, Guesses guesses = Guesses::careful)
       : begin_(reinterpret_cast<char*>(buffer.data())),
@@ -61,6 +62,13 @@ class BinaryEncoder {
   std::size_t finish() {
     if (growing_ != nullptr) trimString();
     return written();
+  }
+
+  // Clears what fixed-size steps left behind the encoding in a caller's buffer: parts of other contents, it
+  // may be.
+  void wipeOverrun() {
+    constexpr std::size_t longestOverrun = InlineBytes::objectSize + 16;
+    if (room() != 0) std::memset(cursor_, 0, std::min(room(), longestOverrun));
   }
 
   // The format's lengths, and those of the libraries that read it, are signed 32-bit numbers.
@@ -84,8 +92,7 @@ class BinaryEncoder {
   // The low 32 bits of the raw value travel, sign-extended to 64: ten bytes for a negative one.
   template <class Enumeration>
   Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
-    const auto travelling = static_cast<std::int32_t>(value.rawValue());
-    return writeNumber(static_cast<std::uint64_t>(std::int64_t{travelling}), number);
+    return writeNumber(travellingValue(value.rawValue()), number);
   }
 
   template <class M>
@@ -127,11 +134,13 @@ class BinaryEncoder {
     return static_cast<char>(number << 3 | static_cast<std::uint32_t>(type));
   }
 
-  // Where there is room enough, short contents are written in one fixed-size step; what is behind them is overwritten.
+  // Where there is room enough, short contents are written in one fixed-size step; what is behind them is
+  // overwritten.
   Result writeBytes(const InlineBytes& bytes, std::uint32_t number) {
     const std::string_view contents = bytes.view();
     if (number < shortNumbers) [[likely]] {
-      // A copy of the cursor, because what is written through it might, for all the compiler knows, be the cursor.
+      // A copy of the cursor, because what is written through it might, for all the compiler knows, be the
+      // cursor.
       char* target = cursor_;
       if (!bytes.isOnHeap() && room() >= 2 + InlineBytes::objectSize) [[likely]] {
         target[0] = shortTag(number, WireType::lengthDelimited);

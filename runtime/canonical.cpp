@@ -31,7 +31,8 @@ void appendDecomposition(char32_t codePoint, std::vector<char32_t>& output) {
   for (std::size_t at = 0; at < kept; ++at) output.push_back(static_cast<char32_t>(parts[at]));
 }
 
-// A stable sort by combining class, in linear time however long the run: by counting, as there are 256 classes.
+// A stable sort by combining class, in linear time however long the run: by counting, as there are 256
+// classes.
 void orderRun(std::span<char32_t> run) {
   std::array<std::size_t, 257> starts{};
   for (const char32_t mark : run) ++starts[combiningClass(mark) + 1];
@@ -41,8 +42,8 @@ void orderRun(std::span<char32_t> run) {
   std::ranges::copy(ordered, run.begin());
 }
 
-// The canonical ordering of D108 and D109: inside each run of marks, by combining class, equal classes in place. The
-// usual exchange of neighbours takes quadratic time on a long run.
+// The canonical ordering of D108 and D109: inside each run of marks, by combining class, equal classes in
+// place. The usual exchange of neighbours takes quadratic time on a long run.
 void orderMarks(std::vector<char32_t>& codePoints) {
   const auto isMark = [](char32_t codePoint) { return codePoint >= 0x300 && combiningClass(codePoint) != 0; };
   const auto byClass = [](char32_t left, char32_t right) {
@@ -79,8 +80,7 @@ std::vector<char32_t> canonicalDecomposition(std::string_view utf8) {
 bool areCanonicallyEquivalent(std::string_view left, std::string_view right) {
   // What both share up to an ASCII character may be left out: no mark is ordered across it and nothing
   // composes with what stands before it.
-  std::size_t shared = static_cast<std::size_t>(
-      std::mismatch(left.begin(), left.end(), right.begin(), right.end()).first - left.begin());
+  auto shared = static_cast<std::size_t>(std::ranges::mismatch(left, right).in1 - left.begin());
   while (shared > 0 && static_cast<unsigned char>(left[shared - 1]) >= 0x80) --shared;
   if (shared > 0) --shared;
   left.remove_prefix(shared);

@@ -39,8 +39,8 @@ class FieldPath {
   // Steps beyond this many are left out, the innermost first.
   static constexpr std::size_t capacity = 5;
 
-  // The path from the outermost message over these fields, the outermost first. Number 0 stands for no field: it is
-  // where a message has none. What is deeper than `capacity` is left out and counted in `omitted`.
+  // The path from the outermost message over these fields, the outermost first. Number 0 stands for no field:
+  // it is where a message has none. What is deeper than `capacity` is left out and counted in `omitted`.
   void assign(const MessageFacts& outermost, std::span<const std::uint32_t> numbers, std::size_t omitted) {
     outermost_ = &outermost;
     size_ = static_cast<std::uint16_t>(numbers.size());

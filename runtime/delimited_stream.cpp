@@ -67,9 +67,10 @@ class DelimitedReader::Source {
   std::uint64_t messageOffset() const { return messageOffset_; }
 
  private:
-  std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0) const {
+  std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0) {
     const auto actual = stream_.hasFailed() ? StreamError::Cause::readFailed : cause;
-    return std::unexpected(StreamError{.cause = actual, .offset = messageOffset_, .length = length});
+    error_ = StreamError{.cause = actual, .offset = messageOffset_, .length = length};
+    return std::unexpected(*error_);
   }
 
   ReadFunctionStream stream_;
@@ -78,9 +79,11 @@ class DelimitedReader::Source {
   std::uint64_t messageOffset_ = 0;
   std::uint64_t nextOffset_ = 0;
   std::vector<std::byte> message_;
+  std::optional<StreamError> error_;  // the first, which is the last
 };
 
 std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::Source::next() {
+  if (error_.has_value()) return std::unexpected(*error_);
   // One for each message: it counts what it reads in an int.
   io::CodedInputStream input(&buffered_);
   messageOffset_ = nextOffset_;

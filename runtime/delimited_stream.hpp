@@ -48,7 +48,8 @@ struct StreamError {
 };
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
-// are announced. After an error the stream cannot be read on.
+// are announced. A malformed message is
+// passed over; after any other error the stream ends with that error, again and again.
 class DelimitedReader {
  public:
   static constexpr std::size_t defaultMaximumSize = std::size_t{64} << 20;
@@ -89,6 +90,7 @@ void appendDelimited(std::string_view bytes, std::string& output);
 
 // Appends a message behind its length.
 template <class M>
+requires requires(const M& message) { message.serialize(); }
 [[nodiscard]] std::expected<void, EncodeError> appendDelimited(const M& message, std::string& output) {
   const auto bytes = message.serialize();
   if (!bytes) return std::unexpected(bytes.error());

@@ -4,6 +4,7 @@
 #include <bit>
 #include <cstddef>
 #include <cstdint>
+#include <expected>
 #include <vector>
 
 #include "runtime/byte_buffer.hpp"
@@ -13,10 +14,15 @@
 
 namespace orv {
 
-// How many bytes a varint takes: one for each seven bits up to the highest that is set. 9/64 is a seventh rounded up,
-// and exact for up to 64 bits.
+// How many bytes a varint takes: one for each seven bits up to the highest that is set. 9/64 is a seventh
+// rounded up, and exact for up to 64 bits.
 constexpr std::size_t varintSize(std::uint64_t value) {
   return (9 * static_cast<std::size_t>(std::bit_width(value | 1)) + 64) / 64;
+}
+
+// The varint of an enumeration's raw value: its low 32 bits, sign-extended.
+constexpr std::uint64_t travellingValue(std::int64_t rawValue) {
+  return static_cast<std::uint64_t>(std::int64_t{static_cast<std::int32_t>(rawValue)});
 }
 
 // A visitor that adds up what BinaryEncoder would write.
@@ -39,8 +45,7 @@ class SizeCounter {
   }
   template <class Enumeration>
   Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
-    const auto travelling = static_cast<std::int32_t>(value.rawValue());
-    return add(number, varintSize(static_cast<std::uint64_t>(std::int64_t{travelling})));
+    return add(number, varintSize(travellingValue(value.rawValue())));
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {

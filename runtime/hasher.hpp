@@ -1,7 +1,10 @@
 // Collects what a value is made of into one number.
 #pragma once
 
+#include <concepts>
+#include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <string_view>
 
 namespace orv {
@@ -25,3 +28,16 @@ class Hasher {
 };
 
 }  // namespace orv
+
+// Texts, byte buffers, enumerations and messages as keys of unordered containers.
+template <class T>
+requires requires(const T& value, orv::Hasher& hasher) {
+  { value.hash(hasher) } -> std::same_as<void>;
+}
+struct std::hash<T> {
+  std::size_t operator()(const T& value) const {
+    orv::Hasher hasher;
+    value.hash(hasher);
+    return hasher.finish();
+  }
+};

@@ -59,10 +59,9 @@ void InlineBytes::append(std::string_view bytes) {
 }
 
 void InlineBytes::replaceByOwnBlock() {
-  const Block shared = heapBlock();
-  const Block own{allocate(shared.size), shared.size, shared.size};
-  std::memcpy(own.data, shared.data, shared.size);
-  holdBlock(own);
+  const std::string_view shared = view();
+  raw_[tagOffset] = 0;  // the block stays the other object's
+  assign(shared);
 }
 
 void InlineBytes::freeBlock() noexcept { ::operator delete(heapBlock().data); }

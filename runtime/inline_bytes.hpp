@@ -76,8 +76,8 @@ class InlineBytes {
            }) == 0;
   }
 
-  // Whether `bytes`, from whose start on `readable` bytes may be read, fit inside an object and are ASCII. False for
-  // longer bytes and at the end of what may be read, whatever they are.
+  // Whether `bytes`, from whose start on `readable` bytes may be read, fit inside an object and are ASCII.
+  // False for longer bytes and at the end of what may be read, whatever they are.
   static bool isShortAscii(std::string_view bytes, std::size_t readable) {
     constexpr std::uint64_t highBits = 0x8080808080808080;
     if (bytes.size() > inlineCapacity || readable < objectSize) return false;
@@ -95,8 +95,8 @@ class InlineBytes {
     (std::make_index_sequence<objectSize / sizeof(std::uint64_t)>());
   }
 
-  // objectSize bytes: `size` of them with all bits set, then zeros. With them, short contents are compared and checked
-  // in words without a branch for their length.
+  // objectSize bytes: `size` of them with all bits set, then zeros. With them, short contents are compared
+  // and checked in words without a branch for their length.
   static const char* contentMask(std::size_t size) { return masks.data() + (objectSize - size); }
   static std::uint64_t wordAt(const void* bytes) {
     std::uint64_t word;

@@ -14,12 +14,21 @@ struct FieldFacts {
   std::string_view name;
   const MessageFacts* message;  // the type of a nested message; none for other fields
   bool isRepeated;
+  bool isOneofMember;
 };
 
 // One constant per message type; all that it refers to lasts as long as the program.
 struct MessageFacts {
   std::string_view fullName;
   std::span<const FieldFacts> fields;  // in ascending order of their numbers
+
+  // Whether the message, or one nested in it, has a oneof.
+  constexpr bool holdsOneof() const {
+    for (const FieldFacts& field : fields) {
+      if (field.isOneofMember || (field.message != nullptr && field.message->holdsOneof())) return true;
+    }
+    return false;
+  }
 
   // None for a number that the message does not define.
   constexpr const FieldFacts* field(std::uint32_t number) const {

@@ -2,6 +2,8 @@
 
 #include <google/protobuf/io/coded_stream.h>
 
+#include <limits>
+
 namespace orv {
 
 namespace {
@@ -25,8 +27,9 @@ std::string TextRenderer::fieldName(std::uint32_t number) const {
   return name ? std::string(*name) : std::to_string(number);
 }
 
-// Unknown fields, read as the official printer reads them. What is kept is well-formed; bytes that only may be a message
-// are one in the library's own opinion, which is laxer than this one's: it is what makes the text the same.
+// Unknown fields, read as the official printer reads them. What is kept is well-formed; bytes that only may
+// be a message are one in the library's own opinion, which is laxer than this one's: it is what makes the
+// text the same.
 class TextRenderer::UnknownFieldsRenderer {
  public:
   explicit UnknownFieldsRenderer(TextRenderer& renderer) : renderer_(renderer) {}
@@ -148,10 +151,18 @@ void TextRenderer::appendQuoted(std::string_view bytes) {
 }
 
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
-  const auto records = unknownFields.records();
-  CodedInputStream input(reinterpret_cast<const std::uint8_t*>(records.data()),
-                         static_cast<int>(records.size()));
-  (void)UnknownFieldsRenderer(*this).renderRecords(input, unknownLevels);
+  UnknownFieldsRenderer renderer(*this);
+  for (const UnknownField& field : unknownFields) {
+    // The library counts in an int. Only a group can be a larger record.
+    if (field.record.size() > std::numeric_limits<int>::max()) {
+      (void)quoted(std::to_string(field.tag.fieldNumber()),
+                   {reinterpret_cast<const char*>(field.value.data()), field.value.size()});
+      continue;
+    }
+    CodedInputStream input(reinterpret_cast<const std::uint8_t*>(field.record.data()),
+                           static_cast<int>(field.record.size()));
+    (void)renderer.renderRecords(input, unknownLevels);
+  }
   return {};
 }
 

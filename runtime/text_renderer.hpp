@@ -16,9 +16,9 @@
 
 namespace orv {
 
-// A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format Language
-// Specification"), a field a line. Unknown fields are written by number; one that is length-delimited and
-// reads as a sequence of records is shown as a message, as the official printer does, to ten levels.
+// A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format"), a field a line.
+// Unknown fields are written by number; one that is length-delimited and reads as a sequence of records is
+// shown as a message, as the official printer does, to ten levels.
 class TextRenderer {
  public:
   using Error = NeverFails;

@@ -16,7 +16,7 @@ namespace orv {
 template <class V>
 using VisitResult = std::expected<void, typename V::Error>;
 
-// The error of visitors that cannot fail: there is no value of it.
+// The error of visitors that cannot fail: nobody makes one.
 enum class NeverFails : std::uint8_t {};
 
 // Takes the fields of a message from its traverse, in ascending order of their numbers, the unknown fields

@@ -41,8 +41,9 @@ struct WireFault {
 template <class T>
 using WireResult = std::expected<T, WireFault>;
 
-// A position in a stretch of bytes, which must outlive the reader. After a fault the position is where the
-// piece that could not be read begins.
+// A position in a stretch of bytes, which must outlive the reader. After a failed
+// read the position is where the piece begins that could not be read; after a failed skip it may be anywhere
+// behind.
 class WireReader {
  public:
   WireReader() = default;
@@ -75,8 +76,8 @@ class WireReader {
     return readLongLengthDelimited();
   }
 
-  // The common case of each, for readers in a hurry: a tag of one byte, a length of one byte and all of its
-  // bytes there. Otherwise nothing is read, and the tag is 0.
+  // The common case of each, for readers in a hurry: a tag of one byte, a length of one or two bytes and all
+  // of its bytes there. Otherwise nothing is read, and the tag is 0.
   Tag readShortTag() {
     if (cursor_ == limit_) [[unlikely]]
       return Tag{0};
@@ -113,8 +114,8 @@ class WireReader {
   // included. `nesting` is how many messages and groups the value is already in.
   [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
 
-  // How many whole length-delimited records with this tag follow, one behind the other, the length-delimited value
-  // that is next; at most `most`. Consumes nothing.
+  // How many whole length-delimited records with this tag follow, one behind the other, the length-delimited
+  // value that is next; at most `most`. Consumes nothing.
   std::size_t countFollowing(Tag tag, std::size_t most) const;
 
  private:

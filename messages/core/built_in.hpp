@@ -3,6 +3,7 @@
 // compiles none of them.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <span>
@@ -106,10 +107,18 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
 template <class M>
 std::expected<std::size_t, EncodeError> Message<M>::serializeInto(std::span<std::byte> buffer) const {
   BinaryEncoder bold(buffer, BinaryEncoder::Guesses::bold);
-  if (visitFields(bold)) return bold.finish();
+  if (visitFields(bold)) {
+    bold.wipeOverrun();
+    return bold.finish();
+  }
   // It may have been a guess that took too much room.
   BinaryEncoder careful(buffer, BinaryEncoder::Guesses::careful);
-  if (auto walked = visitFields(careful); !walked) return std::unexpected(walked.error());
+  const auto walked = visitFields(careful);
+  if (!walked) {
+    std::ranges::fill(buffer, std::byte{0});
+    return std::unexpected(walked.error());
+  }
+  careful.wipeOverrun();
   return careful.finish();
 }
 

@@ -1,4 +1,5 @@
-// The rule by which a message is replaced by one that is read, in the memory of what it holds: what reparse does.
+// The rule by which a message is replaced by one that is read, in the memory of what it holds: what reparse
+// does.
 #pragma once
 
 #include <cstddef>
@@ -13,12 +14,12 @@
 
 namespace orv::rules {
 
-// The first occurrence of a field in a message that is being replaced: its old value goes, and its memory is used
-// again. A field that is not taken keeps its old value for now.
+// The first occurrence of a field in a message that is being replaced: its old value goes, and its memory is
+// used again. A field that is not taken keeps its old value for now.
 template <class D, class Storage>
 DecodeResult<D> replaceStored(D& decoder, Storage& storage) {
   if constexpr (StorageTraits<Storage>::isRepeated) {
-    if (decoder.isAtMessageField()) storage.clear();
+    if (decoder.isAtLengthDelimitedField()) storage.clear();
   } else if constexpr (AnyMessage<typename StorageTraits<Storage>::Value>) {
     if (storage.has_value()) return decoder.replaceMessageField(*storage);
   }
@@ -27,7 +28,7 @@ DecodeResult<D> replaceStored(D& decoder, Storage& storage) {
 
 template <class Case, class D, class... Cases>
 DecodeResult<D> replaceOneofMember(D& decoder, std::optional<std::variant<Cases...>>& group) {
-  if (!decoder.isAtMessageField()) return {};
+  if (!decoder.isAtLengthDelimitedField()) return {};
   if (group.has_value()) {
     if (Case* const held = std::get_if<Case>(&*group)) return decoder.replaceMessageField(*held);
     group.reset();
@@ -43,8 +44,8 @@ inline constexpr bool isSameStorage = std::is_same_v<std::integral_constant<decl
 
 namespace orv {
 
-// What decodeFields does to a default message, in the memory of what this one holds. A field's old value goes when the
-// first occurrence of the field is read, or in the end.
+// What decodeFields does to a default message, in the memory of what this one holds. A field's old value goes
+// when the first occurrence of the field is read, or in the end.
 template <class M>
 template <class D>
 DecodeResult<D> Message<M>::replaceFields(D& decoder) {

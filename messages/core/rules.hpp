@@ -81,7 +81,7 @@ DecodeResult<D> decodeOneofMember(D& decoder, std::optional<std::variant<Cases..
   Case* const held = heldACase ? std::get_if<Case>(&*group) : nullptr;
   if constexpr (RereadingDecoder<D>) {
     if (!heldACase) {
-      if (!decoder.isAtMessageField()) return {};
+      if (!decoder.isAtLengthDelimitedField()) return {};
       if (auto read = decoder.readNewMessage(presentCase<Case>(group)); !read) {
         group.reset();
         return read;
@@ -89,7 +89,7 @@ DecodeResult<D> decodeOneofMember(D& decoder, std::optional<std::variant<Cases..
       return {};
     }
     if (held != nullptr) {
-      if (auto checked = decoder.template checkMessageField<Case>(); !checked) return checked;
+      if (auto checked = decoder.checkMessageField(*held); !checked) return checked;
       if (auto accepted = decoder.handleConflictingOneOf(); !accepted) return accepted;
       return decoder.mergeMessageField(*held);
     }
@@ -163,7 +163,8 @@ std::size_t likelySize(const Storage& storage) {
   } else if constexpr (requires { storage.has_value(); }) {
     return storage.has_value() ? likelySize(*storage) : 0;
   } else if constexpr (StorageTraits<Storage>::isRepeated) {
-    // A member with a typical handle and token takes two thirds of its size in memory, a typical handle as well.
+    // A member with a typical handle and token takes two thirds of its size in memory, a typical handle as
+    // well.
     return storage.size() * sizeof(typename Storage::value_type) * 2 / 3;
   } else {
     return headSize;
@@ -182,7 +183,7 @@ constexpr FieldFacts factsOfRow(const Field<pointer, Case>& row) {
   using Value = std::conditional_t<std::is_void_v<Case>, typename Traits::Value, Case>;
   const MessageFacts* message = nullptr;
   if constexpr (AnyMessage<Value>) message = &Value::messageFacts();
-  return {row.number, row.name, message, Traits::isRepeated};
+  return {row.number, row.name, message, Traits::isRepeated, !std::is_void_v<Case>};
 }
 
 }  // namespace orv::rules
