@@ -1,5 +1,5 @@
-// A message of any type, for what is tested of all types alike: the tests over them are compiled once, not once
-// for each type.
+// A message of any type, for what is tested of all types alike: the tests over them are compiled once, not
+// once for each type.
 #pragma once
 
 #include <cstddef>
@@ -22,7 +22,8 @@ namespace orv::test {
 class AnyMessage;
 using MessagePointer = std::unique_ptr<AnyMessage>;
 
-// Each operation is that of the message. An argument that is a message has the same type, unless it is compared with.
+// Each operation is that of the message. An argument that is a message has the same type, unless it is
+// compared with.
 class AnyMessage {
  public:
   virtual ~AnyMessage() = default;

@@ -1,5 +1,5 @@
-// A decoder that is no BinaryDecoder: it plays back a list of fields, notes what it is asked for and fails when
-// told to.
+// A decoder that is no BinaryDecoder: it plays back a list of fields, notes what it is asked for and fails
+// when told to.
 #pragma once
 
 #include <cstddef>
@@ -21,7 +21,7 @@ namespace orv::test {
 // Without a value, it is a field that no operation takes.
 struct ScriptedField {
   std::uint32_t number;
-  std::variant<std::monostate, std::string, std::uint64_t, std::vector<ScriptedField>> value{};
+  std::variant<std::monostate, std::string, std::int64_t, std::vector<ScriptedField>> value{};
 };
 
 // An error of the double's own. Two are equal when they are one and the same.
@@ -60,16 +60,16 @@ class ScriptedDecoder {
   Result decodeSingularBytesField(std::optional<ByteBuffer>& value) {
     return take<std::string>("optional bytes", value);
   }
-  Result decodeSingularBoolField(bool& value) { return take<std::uint64_t>("bool", value); }
+  Result decodeSingularBoolField(bool& value) { return take<std::int64_t>("bool", value); }
   Result decodeSingularBoolField(std::optional<bool>& value) {
-    return take<std::uint64_t>("optional bool", value);
+    return take<std::int64_t>("optional bool", value);
   }
   Result decodeSingularUInt32Field(std::optional<std::uint32_t>& value) {
-    return take<std::uint64_t>("optional uint32", value);
+    return take<std::int64_t>("optional uint32", value);
   }
   template <class E>
   Result decodeSingularEnumField(std::optional<E>& value) {
-    return take<std::uint64_t>("optional enum", value);
+    return take<std::int64_t>("optional enum", value);
   }
   Result decodeRepeatedStringField(std::vector<Text>& texts) {
     Text text;
@@ -117,11 +117,7 @@ class ScriptedDecoder {
   }
   template <class Storage, class Value>
   static void assign(Storage& storage, const Value& value) {
-    if constexpr (std::is_constructible_v<Storage, Value>) {
-      storage = static_cast<Storage>(value);
-    } else {
-      storage = Storage(static_cast<std::int64_t>(value));
-    }
+    storage = static_cast<Storage>(value);
   }
 
   template <class M>

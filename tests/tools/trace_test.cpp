@@ -16,7 +16,8 @@ namespace {
 
 constexpr std::size_t roundsPerType = 2000;
 
-// Holds the records against the bytes: those of a record stand behind those of the one before, so that all are shown.
+// Holds the records against the bytes: those of a record stand behind those of the one before, so that all
+// are shown.
 class Seamless final : public tool::TraceSink {
  public:
   explicit Seamless(std::span<const std::byte> bytes) : shownUpTo_(bytes.data()) {}

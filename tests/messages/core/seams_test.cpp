@@ -20,8 +20,8 @@ std::string encoded(const M& message) {
 }
 
 TEST(CustomDecoder, IsAskedForEachFieldAndForTheHookAfterTheReading) {
-  const Fields fields{
-      {1, "a"}, {9, 1U}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}}}, {4, Fields{{1, "s"}}}, {3}};
+  const Fields fields{{1, "a"}, {9, 1}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}}}, {4, Fields{{1, "s"}}},
+                      {3}};
   Journal journal;
   ScriptedDecoder decoder(fields, journal);
   JoinResponse::Content content;
@@ -37,7 +37,7 @@ TEST(CustomDecoder, IsAskedForEachFieldAndForTheHookAfterTheReading) {
 
 TEST(CustomDecoder, EndsTheDecodingWithTheErrorOfItsNthCall) {
   const Fields fields{
-      {1, "a"}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}, {3, "u"}}}, {4, Fields{{1, "s"}, {7, 1U}}},
+      {1, "a"}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}, {3, "u"}}}, {4, Fields{{1, "s"}, {7, 1}}},
       {1, "d"}, {3, Fields{}}};
   const auto play = [&](std::size_t count, Journal& journal, JoinResponse::Content& content) {
     ScriptedDecoder decoder(std::span<const ScriptedField>(fields).first(count), journal);
