@@ -1,5 +1,5 @@
-# Installing the library: headers under include/orv, and find_package(orv) giving orv::messages. Where orv::json was
-# built, find_package(orv COMPONENTS json) gives it too.
+# Installing the library: headers under include/orv, and find_package(orv) giving orv::messages. Where
+# orv::json was built, find_package(orv COMPONENTS json) gives it too.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 

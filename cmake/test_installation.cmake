@@ -1,4 +1,5 @@
-# Installs the build in BUILD into a folder of its own, builds the project CONSUMER against that, and runs its tests.
+# Installs the build in BUILD into a folder of its own, builds the project CONSUMER against that, and runs its
+# tests.
 set(place ${BUILD}/installation_test)
 file(REMOVE_RECURSE ${place})
 if(NOT PRIVATE_HEADERS)

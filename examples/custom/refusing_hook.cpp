@@ -24,7 +24,8 @@ int main() {
   const auto lastWins = orv::Group::parse(twoEvents);
   std::printf("by default the last one wins: %s\n", lastWins ? eventOf(*lastWins).c_str() : "an error");
 
-  // The hook's error reaches the caller as it was made. The decoder refers to the hook, which must outlive it.
+  // The hook's error reaches the caller as it was made. The decoder refers to the hook, which must outlive
+  // it.
   int conflicts = 0;
   auto refuse = [&]() -> std::expected<void, orv::DecodeError> {
     ++conflicts;

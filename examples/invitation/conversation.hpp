@@ -61,8 +61,8 @@ class Conversation {
   // Sends no more, and fails unless the peer does the same.
   Outcome<> end();
 
-  // For a side that misbehaves: bytes that need not be a message, and a wait for the peer to hang up, which is
-  // longer than the peer waits.
+  // For a side that misbehaves: bytes that need not be a message, and a wait for the peer to hang up, which
+  // is longer than the peer waits.
   Outcome<> sendRaw(std::string_view bytes);
   Outcome<> awaitHangUp();
 

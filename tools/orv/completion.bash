@@ -30,7 +30,6 @@ _orv() {
   if ((COMP_CWORD > 1)) && [[ " $commands " == *" ${COMP_WORDS[1]} "* ]]; then
     command=${COMP_WORDS[1]}
   fi
-  compopt -o default 2> /dev/null
   case $previous in
     -t | --type | --payload | =) words=$("${COMP_WORDS[0]}" types 2> /dev/null | sed -n 's/^orv\.\([^ ]*\).*/\1/p') ;;
     --from | --to) words=$(_orv_formats "$command" "$previous") ;;
@@ -50,4 +49,4 @@ _orv() {
   mapfile -t COMPREPLY < <(compgen -W "$words" -- "$current")
 }
 
-complete -F _orv orv
+complete -o default -F _orv orv

@@ -14,13 +14,14 @@ struct Difference {
 
   Kind kind;
   std::string path;
-  // As people read it; empty on the side that has nothing there. Long values are shown from where they differ.
+  // As people read it; empty on the side that has nothing there. Long values are shown from where they
+  // differ.
   std::string before;
   std::string after;
 };
 
-// By the model's own equality: no differences when the messages are equal, and at least one when they are not. In the
-// order of the fields.
+// By the model's own equality: no differences when the messages are equal, and at least one when they are
+// not. In the order of the fields.
 std::vector<Difference> differences(const MessageValue& before, const MessageValue& after);
 
 }  // namespace orv::tool

@@ -23,8 +23,8 @@ class Dump final : public TraceSink {
   Dump(OutputFile& output, const DumpLayout& layout, std::span<const std::byte> message, std::uint64_t offset)
       : output_(output), layout_(layout), message_(message), offset_(offset), shownUpTo_(message.data()) {}
 
-  // Shows the message, an envelope with its payload in place. Malformed bytes are shown up to the error, with the error
-  // where it stands; that is the answer then.
+  // Shows the message, an envelope with its payload in place. Malformed bytes are shown up to the error, with
+  // the error where it stands; that is the answer then.
   Outcome<std::optional<DecodeError>> show(const MessageType& type, const PayloadPairing& payloads);
 
   bool record(const TracedRecord& record) override;

@@ -35,8 +35,9 @@ inline std::unexpected<Failure> endQuietly() { return fail(ExitStatus::done, {})
 // "file: reason", with what errno says.
 std::unexpected<Failure> failWithErrno(std::string_view file);
 
-// Prints the failure's line, if it has any, on standard error. Control characters and ill-formed text in it, which come
-// from file names and from input, are made visible, so that it is one line and leaves the terminal alone.
+// Prints the failure's line, if it has any, on standard error. Control characters and ill-formed text in it,
+// which come from file names and from input, are made visible, so that it is one line and leaves the terminal
+// alone.
 void report(const Failure& failure);
 
 }  // namespace orv::tool

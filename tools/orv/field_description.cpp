@@ -15,8 +15,8 @@ namespace orv::tool {
 
 namespace {
 
-// A decoder whose input is a list of field numbers. It notes the operation that the message reads the last one with,
-// and whether the message asks about a conflict in a oneof.
+// A decoder whose input is a list of field numbers. It notes the operation that the message reads the last
+// one with, and whether the message asks about a conflict in a oneof.
 class FieldProbe {
  public:
   using Error = NeverFails;

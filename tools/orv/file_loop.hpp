@@ -11,8 +11,8 @@
 
 namespace orv::tool {
 
-// Calls `work` with each file's path and writes what it left in the output. A file that fails is reported, behind the
-// output that came before, and the others go on; the first failure gives the status.
+// Calls `work` with each file's path and writes what it left in the output. A file that fails is reported,
+// behind the output that came before, and the others go on; the first failure gives the status.
 template <class Work>
 ExitStatus forEachFile(const Options& options, OutputFile& output, Progress& progress, Work work) {
   ExitStatus status = ExitStatus::done;

@@ -41,8 +41,8 @@ class FrameReader {
   // None at the end of the input.
   [[nodiscard]] virtual Outcome<std::optional<Frame>> next() = 0;
 
-  // A failure in this frame: "file: message 3: byte 140 (0x008c): reason". The offset counts from the frame's first
-  // byte.
+  // A failure in this frame: "file: message 3: byte 140 (0x008c): reason". The offset counts from the frame's
+  // first byte.
   Failure malformedBytes(const Frame& frame, std::uint64_t offset, std::string_view reason) const;
   // "file: message 3: line 17, column 4: reason"; the line counts from the frame's first.
   Failure malformedText(const Frame& frame, std::size_t line, std::size_t column,

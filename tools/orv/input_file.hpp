@@ -22,10 +22,12 @@ class InputFile {
   // As errors name it.
   const std::string& name() const { return name_; }
 
-  // Answers how many bytes it put into the buffer, 0 at the end, a negative number and errno when reading failed.
+  // Answers how many bytes it put into the buffer, 0 at the end, a negative number and errno when reading
+  // failed.
   std::ptrdiff_t read(std::span<std::byte> buffer);
 
-  // The first character that is no white space, which stays to be read; none if there is none near the beginning.
+  // The first character that is no white space, which stays to be read; none if there is none near the
+  // beginning.
   std::optional<char> firstVisibleCharacter();
 
  private:

@@ -18,7 +18,8 @@
 
 namespace orv::tool {
 
-// A field on the way from the outermost message to a value. Unknown fields come last, as one field that is a list.
+// A field on the way from the outermost message to a value. Unknown fields come last, as one field that is a
+// list.
 struct Step {
   static constexpr std::uint32_t unknownFields = 0xFFFFFFFF;
 
@@ -56,8 +57,8 @@ struct UnknownRecord {
   friend bool operator==(const UnknownRecord&, const UnknownRecord&) = default;
 };
 
-// One value of a message tree and its place. Values are equal as the model has it: texts when they are canonically
-// equivalent.
+// One value of a message tree and its place. Values are equal as the model has it: texts when they are
+// canonically equivalent.
 struct Leaf {
   std::vector<Step> place;
   std::variant<MessagePresence, Text, ByteBuffer, bool, std::uint32_t, EnumerationValue, UnknownRecord> value;
@@ -67,8 +68,8 @@ struct Leaf {
   bool isIn(const Leaf& message) const;
 };
 
-// A visitor that lists the leaves of what it walks, in ascending order of their places; a message stands before what
-// is in it.
+// A visitor that lists the leaves of what it walks, in ascending order of their places; a message stands
+// before what is in it.
 class LeafCollector {
  public:
   using Error = NeverFails;

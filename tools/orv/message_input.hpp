@@ -27,12 +27,12 @@ class MessageInput {
   // The message's binary encoding: as it came if it came as bytes, and then not yet checked.
   std::string_view encoding() const { return encoding_; }
 
-  // Fails unless the encoding is a message, which is in doubt where it came as bytes. What an envelope holds is not
-  // looked at.
+  // Fails unless the encoding is a message, which is in doubt where it came as bytes. What an envelope holds
+  // is not looked at.
   Outcome<void> check() const;
 
-  // The message with its envelope opened. Where an envelope in text or JSON has its data as a string of bytes that are
-  // not the payload they should be, it stays closed.
+  // The message with its envelope opened. Where an envelope in text or JSON has its data as a string of bytes
+  // that are not the payload they should be, it stays closed.
   Outcome<AnyMessage> message() const;
 
   // The failure for an error in the encoding.

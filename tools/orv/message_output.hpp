@@ -16,8 +16,8 @@ class MessageOutput {
   // The file must outlive the output. The options say whether the output is a stream, and what JSON shows.
   MessageOutput(OutputFile& file, Format format, const Options& options);
 
-  // Writes the message that the input stands at. A message that came as bytes is written to bytes as it came, once it
-  // was checked.
+  // Writes the message that the input stands at. A message that came as bytes is written to bytes as it came,
+  // once it was checked.
   [[nodiscard]] Outcome<void> write(const MessageInput& input);
 
  private:

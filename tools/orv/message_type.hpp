@@ -23,8 +23,8 @@ struct MessageType {
 
 std::span<const MessageType> allMessageTypes();
 
-// Finds a type by its full name, its name without the package, or the last word of it where that is one type's alone.
-// The error says what is wrong with the name.
+// Finds a type by its full name, its name without the package, or the last word of it where that is one
+// type's alone. The error says what is wrong with the name.
 std::expected<const MessageType*, std::string> findMessageType(std::string_view name);
 
 namespace detail {
@@ -47,8 +47,8 @@ const MessageType& typeOf() {
   return allMessageTypes()[detail::IndexIn<M, AllMessages>::value];
 }
 
-// One function per type, to be called by a type's index: `make` is called once with each message type as its template
-// argument.
+// One function per type, to be called by a type's index: `make` is called once with each message type as its
+// template argument.
 template <class Function, class Make>
 constexpr std::array<Function*, AllMessages::size> functionPerType(Make make) {
   std::array<Function*, AllMessages::size> table{};

@@ -39,7 +39,8 @@ using AnyMessage = std::unique_ptr<MessageValue>;
 std::expected<AnyMessage, DecodeError> parseMessage(const MessageType& type, std::span<const std::byte> bytes,
                                                     const PayloadPairing& payloads);
 
-// As parseMessage, from a JSON document. An envelope's data may be the payload as an object, or its bytes as a string.
+// As parseMessage, from a JSON document. An envelope's data may be the payload as an object, or its bytes as
+// a string.
 std::expected<AnyMessage, json::Error> readJsonMessage(const MessageType& type, json::Value document,
                                                        const PayloadPairing& payloads);
 

@@ -13,8 +13,8 @@
 
 namespace orv::tool {
 
-// A SessionMessage with its payload as a message in place of its bytes. Both are encoded alike, so it is a message
-// itself, and everything that works on messages shows, reads and compares the payload in its place.
+// A SessionMessage with its payload as a message in place of its bytes. Both are encoded alike, so it is a
+// message itself, and everything that works on messages shows, reads and compares the payload in its place.
 template <class Payload>
 class OpenedEnvelope final : public Message<OpenedEnvelope<Payload>> {
  public:
@@ -27,8 +27,8 @@ class OpenedEnvelope final : public Message<OpenedEnvelope<Payload>> {
     this->setUnknownFields(envelope.unknownFields());
   }
 
-  // As every message has them. The library compiles those for its own types; here the rules are named as they are for
-  // any visitor.
+  // As every message has them. The library compiles those for its own types; here the rules are named as they
+  // are for any visitor.
   std::string debugDescription() const {
     std::string text;
     TextRenderer renderer(text, OpenedEnvelope::_protobuf_nameMap());

@@ -28,7 +28,8 @@ struct Options {
   bool showsUnknownFields = false;
   bool comparesEncodings = false;
   bool isQuiet = false;
-  // A message takes several times its size in memory, up to about sixty times where it is nothing but empty members.
+  // A message takes several times its size in memory, up to about sixty times where it is nothing but empty
+  // members.
   std::size_t maximumSize = std::size_t{16} << 20;
   ColourChoice colour = ColourChoice::automatic;
   std::vector<std::string> files;  // or the names of message types, for the command types

@@ -25,8 +25,8 @@ class PayloadPairing {
   // From now on data is bytes, whatever the type.
   void leaveClosed() { opens_ = false; }
 
-  // "TYPE" for the payload of every envelope, "KIND=TYPE" for those of one type, which is given by its name or its
-  // number. The error says what is wrong with it.
+  // "TYPE" for the payload of every envelope, "KIND=TYPE" for those of one type, which is given by its name
+  // or its number. The error says what is wrong with it.
   std::expected<void, std::string> override(std::string_view pairing);
 
  private:
@@ -39,8 +39,8 @@ class PayloadPairing {
 inline constexpr auto dataNumber =
     static_cast<std::uint32_t>(*SessionMessage::_protobuf_nameMap().number("data"));
 
-// Where the payload stands in an envelope's encoding: in the last data field, which is the one that counts. Looks as
-// far as the encoding is well-formed; empty, and at its beginning, when there is none.
+// Where the payload stands in an envelope's encoding: in the last data field, which is the one that counts.
+// Looks as far as the encoding is well-formed; empty, and at its beginning, when there is none.
 std::span<const std::byte> payloadBytes(std::span<const std::byte> envelope);
 
 // The kind that the pairing above gives this payload, if any.

@@ -6,8 +6,8 @@
 
 namespace orv::tool {
 
-// A line on standard error that is renewed from time to time once the work takes long, and goes at its end. Shown only
-// when standard error is a terminal and the output is not.
+// A line on standard error that is renewed from time to time once the work takes long, and goes at its end.
+// Shown only when standard error is a terminal and the output is not.
 class Progress {
  public:
   explicit Progress(bool outputIsTerminal);

@@ -18,8 +18,8 @@ struct TextFault {
   std::size_t column;
 };
 
-// The binary encoding of a message that is given in the text format, by libprotobuf's own parser and the schema. An
-// envelope's data may be its payload as a message, or its bytes as a string.
+// The binary encoding of a message that is given in the text format, by libprotobuf's own parser and the
+// schema. An envelope's data may be its payload as a message, or its bytes as a string.
 std::expected<std::string, TextFault> encodeTextForm(const MessageType& type, std::string_view text,
                                                      const PayloadPairing& payloads);
 

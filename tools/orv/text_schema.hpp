@@ -13,8 +13,8 @@
 
 namespace orv::tool {
 
-// The message types of the shipped schema, or of one that differs from it in one thing: an envelope's data is a message
-// of the payload's type. Made on first use, never freed.
+// The message types of the shipped schema, or of one that differs from it in one thing: an envelope's data is
+// a message of the payload's type. Made on first use, never freed.
 class TextSchema {
  public:
   static TextSchema& shipped();

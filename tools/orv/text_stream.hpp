@@ -10,12 +10,13 @@
 
 namespace orv::tool {
 
-// A line that begins so stands before each message of a stream in the text format, which takes it as a comment.
+// A line that begins so stands before each message of a stream in the text format, which takes it as a
+// comment.
 inline constexpr std::string_view textSeparator = "# message";
 
-// Cuts a stream into the texts of its messages. A JSON document ends with the line in which its last bracket is closed,
-// so one document a line and documents of several lines will both do; a message in the text format ends before a line
-// that begins with textSeparator.
+// Cuts a stream into the texts of its messages. A JSON document ends with the line in which its last bracket
+// is closed, so one document a line and documents of several lines will both do; a message in the text format
+// ends before a line that begins with textSeparator.
 class TextStream {
  public:
   enum class Kind : std::uint8_t { json, text };

@@ -39,9 +39,9 @@ class TraceSink {
   ~TraceSink() = default;
 };
 
-// Runs decodeMessage of a message of the type over the bytes. Answers whether the sink saw them to their end; the error
-// of malformed bytes is the one that parsing them gives, and the records before it were handed out. Nothing of the
-// message is kept, so memory does not grow with the input.
+// Runs decodeMessage of a message of the type over the bytes. Answers whether the sink saw them to their end;
+// the error of malformed bytes is the one that parsing them gives, and the records before it were handed out.
+// Nothing of the message is kept, so memory does not grow with the input.
 std::expected<bool, DecodeError> trace(const MessageType& type, std::span<const std::byte> bytes,
                                        TraceSink& sink);
 

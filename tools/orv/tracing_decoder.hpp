@@ -19,8 +19,8 @@
 
 namespace orv::tool {
 
-// Reads records as the binary decoder does and reports them. It hands no values to the message: a oneof group stays
-// unset, so that no payload is ever copied.
+// Reads records as the binary decoder does and reports them. It hands no values to the message: a oneof group
+// stays unset, so that no payload is ever copied.
 class TracingDecoder {
  public:
   // Why it ends early. What is malformed the binary decoder can tell better.

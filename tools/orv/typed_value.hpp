@@ -42,7 +42,8 @@ std::expected<AnyMessage, json::Error> readTyped(json::Value document) {
   return valueOf(std::move(*message));
 }
 
-// Both are in opened_envelope.cpp, away from the plain types, because each makes as much code as all of those.
+// Both are in opened_envelope.cpp, away from the plain types, because each makes as much code as all of
+// those.
 std::expected<AnyMessage, DecodeError> openEnvelope(const SessionMessage& envelope,
                                                     const MessageType& payload);
 std::expected<AnyMessage, json::Error> readOpenedJson(const MessageType& payload, json::Value document);

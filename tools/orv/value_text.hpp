@@ -17,8 +17,8 @@ std::string bytePlace(std::uint64_t offset);
 // Whether the bytes are well-formed text without control characters.
 bool isReadable(std::string_view bytes);
 
-// Text in quotes on one line, with C escapes for what cannot be shown; cut where it is long, and then with its length.
-// It begins with the byte `from`, which is no more than the text's size.
+// Text in quotes on one line, with C escapes for what cannot be shown; cut where it is long, and then with
+// its length. It begins with the byte `from`, which is no more than the text's size.
 std::string quotedText(std::string_view utf8, std::size_t from = 0);
 
 // Bytes as hexadecimal digits, cut where they are many, from the byte `from` on.
