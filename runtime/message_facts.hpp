@@ -14,7 +14,7 @@ struct FieldFacts {
   std::string_view name;
   const MessageFacts* message;  // the type of a nested message; none for other fields
   bool isRepeated;
-  bool isOneofMember;
+  bool holdsOneof;  // is a member of a oneof, or its message has one
 };
 
 // One constant per message type; all that it refers to lasts as long as the program.
@@ -25,7 +25,7 @@ struct MessageFacts {
   // Whether the message, or one nested in it, has a oneof.
   constexpr bool holdsOneof() const {
     for (const FieldFacts& field : fields) {
-      if (field.isOneofMember || (field.message != nullptr && field.message->holdsOneof())) return true;
+      if (field.holdsOneof) return true;
     }
     return false;
   }

@@ -182,8 +182,12 @@ constexpr FieldFacts factsOfRow(const Field<pointer, Case>& row) {
   using Traits = StorageTraits<typename PointedTo<decltype(pointer)>::Type>;
   using Value = std::conditional_t<std::is_void_v<Case>, typename Traits::Value, Case>;
   const MessageFacts* message = nullptr;
-  if constexpr (AnyMessage<Value>) message = &Value::messageFacts();
-  return {row.number, row.name, message, Traits::isRepeated, !std::is_void_v<Case>};
+  bool holdsOneof = !std::is_void_v<Case>;
+  if constexpr (AnyMessage<Value>) {
+    message = &Value::messageFacts();
+    holdsOneof = holdsOneof || Value::messageFacts().holdsOneof();
+  }
+  return {row.number, row.name, message, Traits::isRepeated, holdsOneof};
 }
 
 }  // namespace orv::rules
