@@ -121,7 +121,8 @@ TEST(DelimitedStream, AppendsMessagesBehindTheirLengths) {
 TEST(DelimitedStream, GoesOnInAReaderThatWasMovedTo) {
   DelimitedReader first(readerOf(hex("02 08 01 02 08 02"), 1));
   EXPECT_EQ(first.read<SessionMessage>().value()->version(), 1U);
-  DelimitedReader second = std::move(first);
+  DelimitedReader second(readerOf("", 1));
+  second = std::move(first);
   EXPECT_EQ(second.read<SessionMessage>().value()->version(), 2U);
 }
 

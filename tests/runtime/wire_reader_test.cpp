@@ -18,6 +18,7 @@ TEST(WireReader, LeavesItsPositionWhereWhatItCannotReadBegins) {
   EXPECT_EQ(reader.readFixed32().error().cause, DecodeCause::truncated);
   EXPECT_EQ(reader.readFixed64().error().cause, DecodeCause::truncated);
   EXPECT_EQ(reader.remaining(), 1U);
+  EXPECT_EQ(WireReader().readTag().error().cause, DecodeCause::truncated);
 }
 
 TEST(WireReader, ReadsNumbersOfEveryLength) {

@@ -1,4 +1,4 @@
-"""What each subcommand writes, says on standard error and exits with: the transcript, and what takes more to try."""
+"""What each subcommand writes, says on standard error and exits with."""
 
 import os
 import re

@@ -24,7 +24,8 @@ def options(help_text):
 
 def completed(*words):
     """What completion offers for the last of the words."""
-    script = f'source "{COMPLETION}"; COMP_WORDS=("$@"); COMP_CWORD=$(($# - 1)); _orv; printf "%s\\n" "${{COMPREPLY[@]}}"'
+    script = f'source "{COMPLETION}"; COMP_WORDS=("$@"); COMP_CWORD=$(($# - 1)); _orv'
+    script += '; printf "%s\\n" "${COMPREPLY[@]}"'
     done = subprocess.run(["bash", "-c", script, "bash", *words], capture_output=True, timeout=60)
     expect(f"completion of {words}: standard error", done.stderr, b"")
     return set(done.stdout.decode().split())

@@ -1,10 +1,11 @@
--- Wireshark: dissects the messages of the invitation protocol, with Wireshark's own Protocol Buffers dissector and the
--- schema proto/orv.proto. A UDP datagram holds one envelope, a TCP stream envelopes behind their lengths as varints.
--- docs/wireshark.md says how to set it up.
+-- Wireshark: dissects the messages of the invitation protocol, with Wireshark's own Protocol Buffers dissector
+-- and the schema proto/orv.proto. A UDP datagram holds one envelope, a TCP stream envelopes behind their lengths
+-- as varints. docs/wireshark.md says how to set it up.
 
 local ENVELOPE = "orv.SessionMessage"
 
--- What an envelope's type says of its data. A connectionResponse is read as the content that holds the answer.
+-- What an envelope's type says of its data. A connectionResponse is read as the content that holds the
+-- answer.
 local KINDS = {
   [0] = { name = "unknown" },
   [1] = { name = "joinRequest", payload = "orv.JoinRequest" },
@@ -28,13 +29,15 @@ local orv = Proto("orv", "Invitation protocol")
 orv.fields.length = ProtoField.uint32("orv.length", "Length of the envelope")
 orv.fields.type = ProtoField.uint32("orv.type", "Type of the envelope", base.DEC, kind_names)
 orv.fields.payload = ProtoField.string("orv.payload", "Payload message")
-orv.experts.malformed = ProtoExpert.new("orv.malformed", "Not an envelope", expert.group.MALFORMED, expert.severity.ERROR)
+orv.experts.malformed =
+  ProtoExpert.new("orv.malformed", "Not an envelope", expert.group.MALFORMED, expert.severity.ERROR)
 orv.prefs.udp = Pref.range("UDP ports", "", "Ports whose datagrams hold one envelope each", 65535)
 orv.prefs.tcp = Pref.range("TCP ports", "", "Ports whose streams hold envelopes behind their lengths", 65535)
 
 local protobuf = Dissector.get("protobuf")
 
--- The varint at the offset and the offset behind it; nothing if the bytes end in it, or if it is longer than `longest`.
+-- The varint at the offset and the offset behind it; nothing if the bytes end in it, or if it is longer than
+-- `longest`.
 local function read_varint(tvb, offset, longest)
   local value, factor = 0, 1
   for at = offset, math.min(offset + longest, tvb:len()) - 1 do
@@ -148,8 +151,8 @@ function orv.dissector(tvb, pinfo, tree)
   end
   if #names > 0 then
     pinfo.cols.protocol = "ORV"
-    -- Behind a segment that completes an envelope the rest of it is dissected on its own, and what the column holds by
-    -- then stays.
+    -- Behind a segment that completes an envelope the rest of it is dissected on its own, and what the column
+    -- holds by then stays.
     local separator = pinfo.private["orv_seen"] and ", " or ""
     pinfo.cols.info = separator .. table.concat(names, ", ")
     pinfo.private["orv_seen"] = "yes"

@@ -23,6 +23,15 @@ TEST(Member, TellsAbsentFromEmpty) {
   EXPECT_EQ(toHex(*member.serialize()), "0A 01 61 12 01 74");
 }
 
+TEST(Member, LendsAndTakesItsUnknownFields) {
+  Member member = Member::parse(hex("0A 01 61 18 01")).value();
+  const UnknownStorage kept = member.unknownFields();
+  member.setUnknownFields({});
+  EXPECT_EQ(toHex(*member.serialize()), "0A 01 61");
+  member.setUnknownFields(kept);
+  EXPECT_EQ(toHex(*member.serialize()), "0A 01 61 18 01");
+}
+
 template <class Event>
 void expectPresenceOfMember() {
   Event event;
