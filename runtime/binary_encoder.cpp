@@ -26,7 +26,7 @@ char* writeVarint(std::uint64_t value, char* target) {
 
 }  // namespace
 
-void BinaryEncoder::trimString() { growing_->resize(oldSize_ + written()); }
+void BinaryEncoder::trimString() { growing_->resize(static_cast<std::size_t>(cursor_ - growing_->data())); }
 
 BinaryEncoder::Result BinaryEncoder::visitUnknownFields(const UnknownStorage& unknownFields) {
   const std::span<const std::byte> records = unknownFields.records();
@@ -73,16 +73,16 @@ BinaryEncoder::Result BinaryEncoder::endLongNested(std::size_t start, std::size_
   return {};
 }
 
-BinaryEncoder::Result BinaryEncoder::makeRoom(std::size_t size) {
-  if (room() >= size) return {};
+BinaryEncoder::Result BinaryEncoder::grow(std::size_t size) {
   const std::size_t needed = written() + size;
   if (size > largestEncoding || needed > largestEncoding) return std::unexpected(EncodeError::tooLarge);
   if (growing_ == nullptr) return std::unexpected(EncodeError::bufferTooSmall);
   constexpr std::size_t firstGrowth = 256;
   const std::size_t capacity = std::min(std::max({needed, 2 * written(), firstGrowth}), largestEncoding);
   const std::size_t kept = written();
-  growing_->resize_and_overwrite(oldSize_ + capacity, [](char*, std::size_t all) { return all; });
-  begin_ = growing_->data() + oldSize_;
+  const std::size_t before = static_cast<std::size_t>(begin_ - growing_->data());
+  growing_->resize_and_overwrite(before + capacity, [](char*, std::size_t all) { return all; });
+  begin_ = growing_->data() + before;
   cursor_ = begin_ + kept;
   limit_ = begin_ + capacity;
   return {};

@@ -39,11 +39,7 @@ class BinaryEncoder {
 
   // Appends to `output`, which holds the bytes once finish() was called, and must outlive the encoder.
   explicit BinaryEncoder(std::string& output)
-      : begin_(output.data() + output.size()),
-        cursor_(begin_),
-        limit_(begin_),
-        growing_(&output),
-        oldSize_(output.size()) {}
+      : begin_(output.data() + output.size()), cursor_(begin_), limit_(begin_), growing_(&output) {}
 
   // Writes from the start of `buffer`, which stays the caller's. With careful guesses an encoding fits where
   // it fits exactly; with bold ones, which are right more often, it may need a few bytes more while it is
@@ -68,7 +64,12 @@ class BinaryEncoder {
   // may be.
   void wipeOverrun() {
     constexpr std::size_t longestOverrun = InlineBytes::objectSize + 16;
-    if (room() != 0) std::memset(cursor_, 0, std::min(room(), longestOverrun));
+    if (room() >= longestOverrun) {
+      // At a fixed size it takes four stores, at another a loop as long as a small message's whole encoding.
+      std::memset(cursor_, 0, longestOverrun);
+    } else if (room() != 0) {
+      std::memset(cursor_, 0, room());
+    }
   }
 
   // The format's lengths, and those of the libraries that read it, are signed 32-bit numbers.
@@ -185,8 +186,9 @@ class BinaryEncoder {
 
   Result beginNested(std::uint32_t number, std::size_t lengthBytes) {
     if (number < shortNumbers && room() >= 1 + lengthBytes) [[likely]] {
-      *cursor_ = shortTag(number, WireType::lengthDelimited);
-      cursor_ += 1 + lengthBytes;
+      char* const target = cursor_;
+      *target = shortTag(number, WireType::lengthDelimited);
+      cursor_ = target + 1 + lengthBytes;
       return {};
     }
     return beginLongNested(number, lengthBytes);
@@ -211,15 +213,19 @@ class BinaryEncoder {
   Result writeLongNumber(std::uint64_t value, std::uint32_t number);
   Result beginLongNested(std::uint32_t number, std::size_t lengthBytes);
   Result endLongNested(std::size_t start, std::size_t& lengthBytes);
-  Result makeRoom(std::size_t size);
+  Result makeRoom(std::size_t size) {
+    if (room() >= size) [[likely]]
+      return {};
+    return grow(size);
+  }
+  Result grow(std::size_t size);
   void trimString();
 
-  char* begin_;
+  char* begin_;  // of the encoding: a string may hold something before it
   char* cursor_;
   char* limit_;
   Guesses guesses_ = Guesses::bold;
   std::string* growing_ = nullptr;  // none: a caller's buffer
-  std::size_t oldSize_ = 0;         // what the string held before
 };
 
 }  // namespace orv

@@ -106,20 +106,23 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
 
 template <class M>
 std::expected<std::size_t, EncodeError> Message<M>::serializeInto(std::span<std::byte> buffer) const {
-  BinaryEncoder bold(buffer, BinaryEncoder::Guesses::bold);
-  if (visitFields(bold)) {
-    bold.wipeOverrun();
-    return bold.finish();
-  }
-  // It may have been a guess that took too much room.
-  BinaryEncoder careful(buffer, BinaryEncoder::Guesses::careful);
-  const auto walked = visitFields(careful);
-  if (!walked) {
+  BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::bold);
+  if (!visitFields(encoder)) [[unlikely]]
+    return serializeCarefully(buffer);
+  encoder.wipeOverrun();
+  return encoder.finish();
+}
+
+// For where it may have been a bold guess that took too much room.
+template <class M>
+std::expected<std::size_t, EncodeError> Message<M>::serializeCarefully(std::span<std::byte> buffer) const {
+  BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::careful);
+  if (const auto walked = visitFields(encoder); !walked) {
     std::ranges::fill(buffer, std::byte{0});
     return std::unexpected(walked.error());
   }
-  careful.wipeOverrun();
-  return careful.finish();
+  encoder.wipeOverrun();
+  return encoder.finish();
 }
 
 template <class M>

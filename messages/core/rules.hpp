@@ -165,7 +165,8 @@ std::size_t likelySize(const Storage& storage) {
   } else if constexpr (StorageTraits<Storage>::isRepeated) {
     // A member with a typical handle and token takes two thirds of its size in memory, a typical handle as
     // well.
-    return storage.size() * sizeof(typename Storage::value_type) * 2 / 3;
+    constexpr std::size_t elementSize = sizeof(typename Storage::value_type) * 2 / 3;
+    return storage.size() * elementSize;
   } else {
     return headSize;
   }
@@ -258,14 +259,20 @@ DecodeResult<D> Message<M>::decodeField(D& decoder, const Field<pointer, Case>&)
 template <class M>
 template <class V>
 VisitResult<V> Message<M>::visitFields(V& visitor) const {
-  VisitResult<V> result;
-  const auto visitRow = [&](const auto& row) {
-    result = visitField(visitor, row);
-    return result.has_value();
-  };
-  const auto visitRows = [&](const auto&... rows) { return (visitRow(rows) && ...); };
-  if (!std::apply(visitRows, M::fields)) return result;
-  return unknownFields_.traverse(visitor);
+  return visitRowsFrom<0>(visitor);
+}
+
+template <class M>
+template <std::size_t index, class V>
+VisitResult<V> Message<M>::visitRowsFrom(V& visitor) const {
+  if constexpr (index == std::tuple_size_v<decltype(M::fields)>) {
+    return unknownFields_.traverse(visitor);
+  } else {
+    constexpr auto row = std::get<index>(M::fields);
+    if (auto result = visitField(visitor, row); !result) [[unlikely]]
+      return result;
+    return visitRowsFrom<index + 1>(visitor);
+  }
 }
 
 template <class M>
