@@ -17,11 +17,10 @@ char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size
 
 void InlineBytes::assign(std::string_view bytes) {
   if (isOnHeap()) {
-    Block block = heapBlock();
+    const Block block = heapBlock();
     if (bytes.size() <= block.capacity) {
       char_traits<char>::move(block.data, bytes.data(), bytes.size());
-      block.size = bytes.size();
-      holdBlock(block);
+      setBlockSize(bytes.size());
       return;
     }
   } else if (bytes.size() <= inlineCapacity) {
@@ -44,10 +43,8 @@ void InlineBytes::append(std::string_view bytes) {
     return;
   }
   if (isOnHeap() && size <= heapBlock().capacity) {
-    Block block = heapBlock();
-    char_traits<char>::move(block.data + old.size(), bytes.data(), bytes.size());
-    block.size = size;
-    holdBlock(block);
+    char_traits<char>::move(heapBlock().data + old.size(), bytes.data(), bytes.size());
+    setBlockSize(size);
     return;
   }
   const std::size_t capacity = std::max(size, 2 * old.size());
@@ -58,10 +55,15 @@ void InlineBytes::append(std::string_view bytes) {
   holdBlock(block);
 }
 
-void InlineBytes::replaceByOwnBlock() {
-  const std::string_view shared = view();
-  raw_[tagOffset] = 0;  // the block stays the other object's
-  assign(shared);
+void InlineBytes::copyBlock(std::string_view bytes) {
+  if (bytes.size() <= inlineCapacity) {
+    std::memcpy(raw_, bytes.data(), bytes.size());
+    raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
+    return;
+  }
+  const Block block{allocate(bytes.size()), bytes.size(), bytes.size()};
+  std::memcpy(block.data, bytes.data(), bytes.size());
+  holdBlock(block);
 }
 
 void InlineBytes::freeBlock() noexcept { ::operator delete(heapBlock().data); }
