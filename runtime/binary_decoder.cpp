@@ -67,10 +67,10 @@ std::expected<void, DecodeError> BinaryDecoder::failure() {
   return result;
 }
 
-std::unexpected<BinaryDecoder::Failure> BinaryDecoder::failIllFormed(std::string_view text) {
+std::unexpected<BinaryDecoder::Failure> BinaryDecoder::failIllFormed(std::string_view text,
+                                                                     std::size_t wellFormed) {
   return fail(DecodeCause::illFormedText, reinterpret_cast<const std::byte*>(text.data()),
-              static_cast<std::uint32_t>(text.size()),
-              static_cast<std::uint32_t>(utf8::wellFormedPrefix(text)));
+              static_cast<std::uint32_t>(text.size()), static_cast<std::uint32_t>(wellFormed));
 }
 
 std::unexpected<BinaryDecoder::Failure> BinaryDecoder::failTooDeep() {

@@ -153,6 +153,10 @@ class BinaryDecoder {
   Result decodeRepeatedMessageField(std::vector<M>& messages) {
     if (!isLengthDelimited()) return {};
     makeRoom(messages);
+    // The place of an element that comes later is fetched meanwhile: in a list too long for the caches a sixth
+    // of all decoding.
+    constexpr std::size_t ahead = 16;
+    __builtin_prefetch(messages.data() + std::min(messages.size() + ahead, messages.capacity()), 1);
     auto read = readNewMessage(messages.emplace_back());
     if (!read) messages.pop_back();
     return read;
@@ -262,8 +266,10 @@ class BinaryDecoder {
       return failed();
     const std::string_view bytes = characters(body);
     const std::size_t readable = readableFrom(body);
-    if (!InlineBytes::isShortAscii(bytes, readable) && !utf8::isWellFormed(bytes)) [[unlikely]] {
-      return failIllFormed(bytes);
+    if (!InlineBytes::isShortAscii(bytes, readable)) {
+      const std::size_t wellFormed = utf8::wellFormedPrefix(bytes);
+      if (wellFormed != bytes.size()) [[unlikely]]
+        return failIllFormed(bytes, wellFormed);
     }
     presentValue(slot).bytes_.assignReadable(bytes, readable);
     return {};
@@ -331,7 +337,7 @@ class BinaryDecoder {
   }
   std::unexpected<Failure> fail(DecodeCause cause, const std::byte* at, std::uint32_t length,
                                 std::uint32_t detail);
-  std::unexpected<Failure> failIllFormed(std::string_view text);
+  std::unexpected<Failure> failIllFormed(std::string_view text, std::size_t wellFormed);
   std::unexpected<Failure> failTooDeep();
 
   Result keepUnknown(UnknownStorage& unknownFields);

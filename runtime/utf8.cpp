@@ -44,6 +44,9 @@ std::size_t wellFormedPrefix(std::string_view text) {
   const char* const bytes = text.data();
   const std::size_t size = text.size();
   const auto byteAt = [&](std::size_t index) { return static_cast<unsigned char>(bytes[index]); };
+  // A long ASCII text is checked fastest as such.
+  constexpr std::size_t longText = 64;
+  if (size >= longText && isAscii(text)) return size;
   std::size_t at = 0;
   while (at < size) {
     // ASCII is passed up to eight bytes at a time.

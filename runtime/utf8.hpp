@@ -51,11 +51,7 @@ inline bool isAscii(std::string_view text) {
   return (bits & highBits) == 0;
 }
 
-inline bool isWellFormed(std::string_view text) {
-  // A long ASCII text is checked fastest as such; a short one has been by the time that somebody asks.
-  constexpr std::size_t longText = 64;
-  return (text.size() >= longText && isAscii(text)) || wellFormedPrefix(text) == text.size();
-}
+inline bool isWellFormed(std::string_view text) { return wellFormedPrefix(text) == text.size(); }
 
 // Appends the UTF-8 form of a code point to anything with push_back.
 template <class Output>

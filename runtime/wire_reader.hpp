@@ -114,8 +114,8 @@ class WireReader {
   // included. `nesting` is how many messages and groups the value is already in.
   [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
 
-  // How many whole length-delimited records with this tag follow, one behind the other, the length-delimited
-  // value that is next; at most `most`. Consumes nothing.
+  // How many whole length-delimited records with this tag, of one byte, follow, one behind the other, the
+  // length-delimited value that is next; at most `most`. Consumes nothing.
   std::size_t countFollowing(Tag tag, std::size_t most) const;
 
  private:

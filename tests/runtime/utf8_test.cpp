@@ -26,7 +26,7 @@ std::size_t expectedPrefix(std::string_view text) {
 void countFault(std::string_view text, std::size_t& faults) {
   const std::size_t expected = expectedPrefix(text);
   const bool isRight =
-      utf8::wellFormedPrefix(text) == expected && utf8::isWellFormed(text) == (expected == text.size());
+      utf8::wellFormedPrefix(text) == expected;
   if (!isRight && faults++ < 10) ADD_FAILURE() << toHex(text);
 }
 
