@@ -68,6 +68,17 @@ concept Decoder = requires(D& decoder, Text& text, std::optional<Text>& optional
   { decoder.handleConflictingOneOf() } -> std::same_as<DecodeResult<D>>;
 };
 
+// A decoder whose operations for any message take M.
+template <class D, class M>
+concept DecoderOf = Decoder<D> &&
+    requires(D& decoder, M& message, std::optional<M>& slot, std::vector<M>& list) {
+  {
+    decoder.nextFieldNumber(message)
+    } -> std::same_as<std::expected<std::optional<std::uint32_t>, typename D::Error>>;
+  { decoder.decodeSingularMessageField(slot) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeRepeatedMessageField(list) } -> std::same_as<DecodeResult<D>>;
+};
+
 // A decoder that can look at its input twice. It says so with `static constexpr bool canReread = true`, and
 // the rules then merge a repeated oneof member in place, where they copy the payload for other decoders: with
 // many repeats that is the difference between linear and quadratic time. It has

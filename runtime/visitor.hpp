@@ -48,4 +48,12 @@ concept Visitor = requires(V& visitor, const Text& text, const ByteBuffer& bytes
   { visitor.visitUnknownFields(unknownFields) } -> std::same_as<VisitResult<V>>;
 };
 
+// A visitor whose operations for any message take M.
+template <class V, class M>
+concept VisitorOf = Visitor<V> &&
+    requires(V& visitor, const M& message, const std::vector<M>& list, std::uint32_t number) {
+  { visitor.visitSingularMessageField(message, number) } -> std::same_as<VisitResult<V>>;
+  { visitor.visitRepeatedMessageField(list, number) } -> std::same_as<VisitResult<V>>;
+};
+
 }  // namespace orv

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cassert>
 #include <cstddef>
 #include <span>
 #include <string>
@@ -99,7 +100,9 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
   if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
   std::string bytes;
   bytes.resize_and_overwrite(size, [&](char* target, std::size_t room) {
-    return serializeInto(std::as_writable_bytes(std::span(target, room))).value_or(0);
+    const auto written = serializeInto(std::as_writable_bytes(std::span(target, room)));
+    assert(written == size);
+    return written.value_or(0);
   });
   return bytes;
 }

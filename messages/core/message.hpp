@@ -48,7 +48,7 @@ class Message {
 
   // Reads fields into this message until the decoder has no more: values are replaced, nested messages
   // merged, lists grown. The decoder's error is returned as it was made; what was read before it stays.
-  template <Decoder D>
+  template <DecoderOf<M> D>
   [[nodiscard]] DecodeResult<D> decodeMessage(D& decoder) {
     return decodeFields(decoder);
   }
@@ -56,7 +56,7 @@ class Message {
 
   // Hands the fields that are to be emitted to the visitor, in ascending order, the unknown fields last. The
   // visitor's first error ends the walk and is returned as it was made.
-  template <Visitor V>
+  template <VisitorOf<M> V>
   [[nodiscard]] VisitResult<V> traverse(V& visitor) const {
     return visitFields(visitor);
   }
@@ -112,10 +112,6 @@ class Message {
   // How many bytes serialize gives.
   std::size_t encodedSize() const;
 
-  // About how many: the elements of lists are judged by their size in memory, nested messages hardly count.
-  // Takes no time to speak of, however long the lists.
-  std::size_t likelyEncodedSize() const;
-
  protected:
   Message() = default;
   Message(const Message&) = default;
@@ -126,6 +122,7 @@ class Message {
 
  private:
   friend BinaryDecoder;  // reads nested messages
+  friend BinaryEncoder;  // guesses their sizes
 
   M& self() { return static_cast<M&>(*this); }
   const M& self() const { return static_cast<const M&>(*this); }
@@ -161,6 +158,10 @@ class Message {
   // Tables made from M's; a template, because M is not complete where this class is.
   template <class Complete>
   struct Constants;
+
+  // About how many bytes serialize gives: the elements of lists are judged by their size in memory, nested
+  // messages hardly count. Takes no time to speak of, however long the lists.
+  std::size_t likelyEncodedSize() const;
 
   bool hasEqualFields(const M& other) const;
   template <auto pointer, class Case>

@@ -19,6 +19,16 @@ std::string encoded(const M& message) {
   return toHex(message.serialize().value());
 }
 
+// A decoder that lacks an operation for any message is no decoder of messages, rather than an error in the rules.
+struct DecoderWithoutNumbers : ScriptedDecoder {
+  void nextFieldNumber();
+};
+static_assert(DecoderOf<ScriptedDecoder, Group> && !DecoderOf<DecoderWithoutNumbers, Group>);
+struct VisitorWithoutMessages : TracingVisitor {
+  void visitSingularMessageField();
+};
+static_assert(VisitorOf<TracingVisitor, Group> && !VisitorOf<VisitorWithoutMessages, Group>);
+
 TEST(CustomDecoder, IsAskedForEachFieldAndForTheHookAfterTheReading) {
   const Fields fields{{1, "a"}, {9, 1}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}}}, {4, Fields{{1, "s"}}},
                       {3}};
@@ -112,7 +122,7 @@ TEST(ConflictHook, IsAskedOncePerOccurrenceWhereACaseIsHeld) {
     EXPECT_EQ(group, Group::parse(input).value());
 
     const DecodeError refusal{.cause = DecodeCause::conflictingOneOf, .length = 7, .offset = 123456};
-    auto refusing = [&]() -> std::expected<void, DecodeError> { return std::unexpected(refusal); };
+    const auto refusing = [&]() -> std::expected<void, DecodeError> { return std::unexpected(refusal); };
     BinaryDecoder decoder(bytes, refusing);
     Group refused;
     const auto result = refused.decodeMessage(decoder);
