@@ -1,8 +1,10 @@
 // What holds for every message.
 #include <gtest/gtest.h>
 
+#include <concepts>
 #include <thread>
 
+#include "messages/all_messages.hpp"
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
@@ -14,6 +16,18 @@ std::string encoded(const AnyMessage& message) { return toHex(message.serialize(
 
 // Field 15 is defined nowhere.
 const std::string unknownRecord = hex("F8 00 81 00");
+
+// What every type offers to the standard library.
+static_assert([] {
+  bool holds = true;
+  AllMessages::forEach([&]<class M>() {
+    holds = holds && std::regular<M> && std::is_nothrow_move_constructible_v<M> &&
+            std::is_nothrow_move_assignable_v<M> && std::is_nothrow_default_constructible_v<M> &&
+            std::is_same_v<std::invoke_result_t<std::hash<M>, const M&>, std::size_t> &&
+            DecoderOf<BinaryDecoder, M> && VisitorOf<BinaryEncoder, M> && VisitorOf<TextRenderer, M>;
+  });
+  return holds;
+}());
 
 // Runs the body with two encodings of each type that are random, valid and independent of each other.
 template <class Body>

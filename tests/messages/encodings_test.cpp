@@ -155,14 +155,19 @@ TEST(Encodings, FillExactlyTheBufferTheyNeed) {
   for (const std::string& input : inputs) {
     const Group group = Group::parse(input).value();
     for (std::size_t size = 0; size <= input.size() + 50; ++size) {
-      std::vector<std::byte> buffer(size);  // its end is watched in sanitized builds
+      // Its end is watched in sanitized builds.
+      std::vector<std::byte> buffer(size, std::byte{0xEE});
       const auto written = group.serializeInto(buffer);
       if (size < input.size()) {
         EXPECT_EQ(written, std::unexpected(EncodeError::bufferTooSmall));
+        EXPECT_EQ(std::ranges::count(buffer, std::byte{0}), static_cast<std::ptrdiff_t>(size));
       } else {
         EXPECT_EQ(written, input.size());
         EXPECT_TRUE(
             std::ranges::equal(std::as_bytes(std::span(input)), std::span(buffer).first(input.size())));
+        // Nothing of other contents is left behind it.
+        for (const std::byte behind : std::span(buffer).subspan(input.size()))
+          EXPECT_TRUE(behind == std::byte{0} || behind == std::byte{0xEE});
       }
     }
   }

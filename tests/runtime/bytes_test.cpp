@@ -99,6 +99,17 @@ TEST(InlineBytes, GrowInFewAllocations) {
   EXPECT_EQ(bytes.size(), 100'000U);
 }
 
+TEST(InlineBytes, AreCopiedToTheirOwnSizeWhateverTheirBlockHolds) {
+  InlineBytes shrunk = make(1000);
+  const std::string shorter = contents(39);
+  shrunk.assign(shorter);
+  EXPECT_TRUE(shrunk.isOnHeap());
+  const HeapMeter meter;
+  const InlineBytes copy = shrunk;
+  EXPECT_EQ(copy.view(), shorter);
+  EXPECT_EQ(meter.allocations(), 0U);
+}
+
 TEST(ByteBuffer, ComparesLengthAndBytes) {
   const ByteBuffer buffer(std::string_view("\0\xFF", 2));
   EXPECT_EQ(buffer, ByteBuffer(buffer.bytes()));

@@ -1,0 +1,87 @@
+// A message that is not one of the protocol's, with what none of those has: a nested message that holds a
+// oneof, a list of such, and a number of two bytes.
+#include <gtest/gtest.h>
+
+#include "messages/core/built_in.hpp"
+#include "messages/group/group.hpp"
+#include "tests/testing/hex.hpp"
+
+namespace orv {
+namespace test {
+
+class Wrapper final : public Message<Wrapper> {
+ public:
+  static constexpr std::string_view protoMessageName = "test.Wrapper";
+
+  Wrapper() noexcept {}
+
+ private:
+  friend Message;
+  std::optional<Group> group_;
+  std::vector<Group> groups_;
+  Text name_;
+
+  static constexpr std::tuple fields{
+      field<&Wrapper::group_>(1, "group"),
+      field<&Wrapper::groups_>(2, "groups"),
+      field<&Wrapper::name_>(2047, "name"),
+  };
+};
+
+}  // namespace test
+
+template class Message<test::Wrapper>;
+
+namespace test {
+namespace {
+
+std::string encoded(const Wrapper& message) { return toHex(message.serialize().value()); }
+
+TEST(OwnMessage, IsReadWrittenComparedAndNamedByItsTable) {
+  const std::string bytes = hex("0A 02 22 00 12 00 12 02 0A 00 FA 7F 01 61 18 05");
+  const Wrapper message = Wrapper::parse(bytes).value();
+  EXPECT_EQ(encoded(message), toHex(bytes));
+  EXPECT_EQ(message.encodedSize(), bytes.size());
+  EXPECT_EQ(
+      message.debugDescription(),
+      "group {\n  memberLeft {\n  }\n}\ngroups {\n}\ngroups {\n  initialize {\n  }\n}\nname: \"a\"\n3: 5\n");
+  Wrapper other;
+  ASSERT_TRUE(other.reparse(bytes));
+  EXPECT_EQ(other, message);
+  EXPECT_EQ(other.hashValue(), message.hashValue());
+  EXPECT_EQ(Wrapper::parse(hex("0A 04 22 02 0A 09")).error().message(),
+            "test.Wrapper.group.memberLeft.groupUUID: length 9 runs 9 bytes past the end, at byte 5");
+}
+
+TEST(OwnMessage, AsksTheHookAboutAOneofInAMessageThatComesAgain) {
+  const struct {
+    std::string_view input;
+    int askedTimes;
+    std::string_view whenRefused;
+  } cases[] = {
+      {"0A 02 22 00 0A 02 0A 00", 1, "0A 02 22 00"},
+      {"0A 02 22 00 0A 00 0A 04 22 02 10 01", 1, "0A 02 22 00"},
+      {"0A 00 0A 02 0A 00", 0, "0A 02 0A 00"},
+      {"12 02 22 00 12 02 0A 00", 0, "12 02 22 00 12 02 0A 00"},  // each element has a oneof of its own
+  };
+  for (const auto& row : cases) {
+    SCOPED_TRACE(row.input);
+    const std::string input = hex(row.input);
+    int asked = 0;
+    auto counting = [&] { return (++asked, std::expected<void, DecodeError>()); };
+    BinaryDecoder accepting(std::as_bytes(std::span(input)), counting);
+    Wrapper accepted;
+    ASSERT_TRUE(accepted.decodeMessage(accepting));
+    EXPECT_EQ(asked, row.askedTimes);
+
+    auto refusing = [] { return std::expected<void, DecodeError>(std::unexpect); };
+    BinaryDecoder decoder(std::as_bytes(std::span(input)), refusing);
+    Wrapper refused;
+    EXPECT_EQ(refused.decodeMessage(decoder).has_value(), row.askedTimes == 0);
+    EXPECT_EQ(encoded(refused), toHex(hex(row.whenRefused)));
+  }
+}
+
+}  // namespace
+}  // namespace test
+}  // namespace orv
