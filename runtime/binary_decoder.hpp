@@ -3,57 +3,28 @@
 
 #include <algorithm>
 #include <array>
-#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
 #include <limits>
-#include <memory>
 #include <optional>
 #include <span>
 #include <string_view>
-#include <type_traits>
 #include <utility>
 #include <vector>
 
 #include "runtime/byte_buffer.hpp"
+#include "runtime/conflict_hook.hpp"
 #include "runtime/decode_error.hpp"
 #include "runtime/decoder.hpp"
 #include "runtime/message_facts.hpp"
+#include "runtime/presence.hpp"
 #include "runtime/text.hpp"
 #include "runtime/unknown_storage.hpp"
 #include "runtime/utf8.hpp"
 #include "runtime/wire_reader.hpp"
 
 namespace orv {
-
-// What a BinaryDecoder asks when a oneof member arrives while its group already holds a case. It refers to a
-// callable that returns std::expected<void, DecodeError>, throws nothing and outlives it. An error refuses
-// the member and ends the decoding; it reaches the caller as it was made.
-class ConflictHook {
- public:
-  // Accepts: the member read last wins.
-  constexpr ConflictHook() = default;
-
-  template <class Callable>
-  requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
-           std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
-      ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
-      : callable_(const_cast<void*>(static_cast<const void*>(std::addressof(
-            callable)))),  // NOLINT(cppcoreguidelines-pro-type-const-cast): given back its type
-        call_([](void* target) -> std::expected<void, DecodeError> {
-          return (*static_cast<Callable*>(target))();
-        }) {}
-
-  std::expected<void, DecodeError> operator()() const {
-    if (call_ == nullptr) return {};
-    return call_(callable_);
-  }
-
- private:
-  void* callable_ = nullptr;
-  std::expected<void, DecodeError> (*call_)(void*) = nullptr;
-};
 
 // Reads one message from bytes that lie in one stretch of memory and outlive the decoder:
 //
@@ -299,15 +270,6 @@ class BinaryDecoder {
       return fail(varint.error());
     store(*varint);
     return {};
-  }
-
-  template <class T>
-  static T& presentValue(T& value) {
-    return value;
-  }
-  template <class T>
-  static T& presentValue(std::optional<T>& value) {
-    return value.has_value() ? *value : value.emplace();
   }
 
   static std::string_view characters(std::span<const std::byte> bytes) {

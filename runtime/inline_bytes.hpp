@@ -9,6 +9,8 @@
 #include <type_traits>
 #include <utility>
 
+#include "runtime/words.hpp"
+
 namespace orv {
 
 // Owned bytes. Up to 39 of them live inside the object, which covers a 36-character identifier, a 16-byte
@@ -80,7 +82,6 @@ class InlineBytes {
   // Whether `bytes`, from whose start on `readable` bytes may be read, fit inside an object and are ASCII.
   // False for longer bytes and at the end of what may be read, whatever they are.
   static bool isShortAscii(std::string_view bytes, std::size_t readable) {
-    constexpr std::uint64_t highBits = 0x8080808080808080;
     if (bytes.size() > inlineCapacity || readable < objectSize) return false;
     const char* const mask = contentMask(bytes.size());
     return (anyWord([&](std::size_t at) { return wordAt(bytes.data() + at) & wordAt(mask + at); }) &
@@ -99,11 +100,6 @@ class InlineBytes {
   // objectSize bytes: `size` of them with all bits set, then zeros. With them, short contents are compared
   // and checked in words without a branch for their length.
   static const char* contentMask(std::size_t size) { return masks.data() + (objectSize - size); }
-  static std::uint64_t wordAt(const void* bytes) {
-    std::uint64_t word;
-    std::memcpy(&word, bytes, sizeof word);
-    return word;
-  }
 
   // Whether the bytes live outside the object. If not, all objectSize bytes from view().data() on may be
   // read.

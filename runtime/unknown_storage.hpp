@@ -38,6 +38,8 @@ class UnknownStorage {
   }
 
   // Takes a sequence of records, which must be well-formed: this is how a program sets unknown fields itself.
+  // Groups may be nested 100 deep here; in a message that is itself nested n deep, only 100-n of them are
+  // read again.
   [[nodiscard]] static std::expected<UnknownStorage, DecodeError> checked(std::span<const std::byte> records);
 
   bool isEmpty() const { return block_ == nullptr; }

@@ -4,8 +4,9 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstring>
 #include <string_view>
+
+#include "runtime/words.hpp"
 
 namespace orv::utf8 {
 
@@ -21,15 +22,6 @@ Step step(std::string_view text);
 
 // How many bytes at the start of `text` are well-formed.
 std::size_t wellFormedPrefix(std::string_view text);
-
-// Bytes of which this bit is set are not ASCII, in each byte of a word.
-inline constexpr std::uint64_t highBits = 0x8080808080808080;
-
-inline std::uint64_t wordAt(const char* bytes) {
-  std::uint64_t word;
-  std::memcpy(&word, bytes, sizeof word);
-  return word;
-}
 
 // Checks eight bytes at a time.
 inline bool isAscii(std::string_view text) {
@@ -52,26 +44,5 @@ inline bool isAscii(std::string_view text) {
 }
 
 inline bool isWellFormed(std::string_view text) { return wellFormedPrefix(text) == text.size(); }
-
-// Appends the UTF-8 form of a code point to anything with push_back.
-template <class Output>
-void append(char32_t codePoint, Output& output) {
-  const auto put = [&](char32_t byte) { output.push_back(static_cast<char>(byte)); };
-  if (codePoint < 0x80) {
-    put(codePoint);
-  } else if (codePoint < 0x800) {
-    put(0xC0 | (codePoint >> 6));
-    put(0x80 | (codePoint & 0x3F));
-  } else if (codePoint < 0x10000) {
-    put(0xE0 | (codePoint >> 12));
-    put(0x80 | ((codePoint >> 6) & 0x3F));
-    put(0x80 | (codePoint & 0x3F));
-  } else {
-    put(0xF0 | (codePoint >> 18));
-    put(0x80 | ((codePoint >> 12) & 0x3F));
-    put(0x80 | ((codePoint >> 6) & 0x3F));
-    put(0x80 | (codePoint & 0x3F));
-  }
-}
 
 }  // namespace orv::utf8

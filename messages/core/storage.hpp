@@ -5,6 +5,8 @@
 #include <utility>
 #include <variant>
 
+#include "runtime/presence.hpp"
+
 namespace orv {
 
 // What a getter gives for an absent field: one default value per type, made on first use and never freed.
@@ -18,12 +20,6 @@ const T& defaultInstance() {
 template <class T>
 const T& valueOrDefault(const std::optional<T>& field) {
   return field.has_value() ? *field : defaultInstance<T>();
-}
-
-// The value for change in place; an absent field becomes present with the default.
-template <class T>
-T& presentValue(std::optional<T>& field) {
-  return field.has_value() ? *field : field.emplace();
 }
 
 // The payload if the oneof group holds this case, else the default.

@@ -6,10 +6,10 @@
 #include <sstream>
 
 #include "runtime/canonical.hpp"
-#include "runtime/utf8.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/normal_form.hpp"
 #include "tests/testing/random.hpp"
+#include "tests/testing/utf8.hpp"
 
 namespace orv::test {
 namespace {
@@ -117,14 +117,14 @@ TEST(Text, PassesTheUnicodeConsortiumsCases) {
       std::getline(columnStream, codePoints, ';');
       std::istringstream stream(codePoints);
       for (std::uint32_t codePoint; stream >> std::hex >> codePoint;)
-        utf8::append(static_cast<char32_t>(codePoint), column);
+        appendUtf8(static_cast<char32_t>(codePoint), column);
     }
     const Text c1 = columns[0], c2 = columns[1], c3 = columns[2], c4 = columns[3], c5 = columns[4];
     EXPECT_TRUE(c1 == c2 && c2 == c3 && c4 == c5) << line;
     EXPECT_TRUE(hashOf(c1) == hashOf(c3) && hashOf(c2) == hashOf(c3) && hashOf(c4) == hashOf(c5)) << line;
     EXPECT_EQ(c3 == c5, columns[2] == columns[4]) << line;
     std::string decomposed;
-    for (const char32_t codePoint : canonicalDecomposition(columns[0])) utf8::append(codePoint, decomposed);
+    for (const char32_t codePoint : canonicalDecomposition(columns[0])) appendUtf8(codePoint, decomposed);
     EXPECT_EQ(decomposed, columns[2]) << line;
   }
   EXPECT_GT(lineCount, 10'000U);

@@ -4,6 +4,7 @@
 #include <utf8proc.h>
 
 #include "tests/testing/hex.hpp"
+#include "tests/testing/utf8.hpp"
 
 namespace orv::test {
 namespace {
@@ -25,8 +26,7 @@ std::size_t expectedPrefix(std::string_view text) {
 // Counts, since a check for each of the millions would take long.
 void countFault(std::string_view text, std::size_t& faults) {
   const std::size_t expected = expectedPrefix(text);
-  const bool isRight =
-      utf8::wellFormedPrefix(text) == expected;
+  const bool isRight = utf8::wellFormedPrefix(text) == expected;
   if (!isRight && faults++ < 10) ADD_FAILURE() << toHex(text);
 }
 
@@ -72,7 +72,7 @@ TEST(Utf8, IsWrittenAndReadBackForEveryCodePoint) {
   for (char32_t codePoint = 0; codePoint <= 0x10FFFF; ++codePoint) {
     if (codePoint >= 0xD800 && codePoint < 0xE000) continue;
     std::string text;
-    utf8::append(codePoint, text);
+    appendUtf8(codePoint, text);
     const utf8::Step step = utf8::step(text);
     if (!step.isWellFormed || step.codePoint != codePoint || step.length != text.size()) ++faults;
   }

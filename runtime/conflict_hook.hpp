@@ -1,0 +1,41 @@
+// Who decides when a second member of a oneof arrives.
+#pragma once
+
+#include <concepts>
+#include <expected>
+#include <memory>
+#include <type_traits>
+
+#include "runtime/decode_error.hpp"
+
+namespace orv {
+
+// What a BinaryDecoder asks when a oneof member arrives while its group already holds a case. It refers to a
+// callable that returns std::expected<void, DecodeError>, throws nothing and outlives it. An error refuses
+// the member and ends the decoding; it reaches the caller as it was made.
+class ConflictHook {
+ public:
+  // Accepts: the member read last wins.
+  constexpr ConflictHook() = default;
+
+  template <class Callable>
+  requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
+           std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
+      ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
+      : callable_(const_cast<void*>(static_cast<const void*>(std::addressof(
+            callable)))),  // NOLINT(cppcoreguidelines-pro-type-const-cast): given back its type
+        call_([](void* target) -> std::expected<void, DecodeError> {
+          return (*static_cast<Callable*>(target))();
+        }) {}
+
+  std::expected<void, DecodeError> operator()() const {
+    if (call_ == nullptr) return {};
+    return call_(callable_);
+  }
+
+ private:
+  void* callable_ = nullptr;
+  std::expected<void, DecodeError> (*call_)(void*) = nullptr;
+};
+
+}  // namespace orv
