@@ -80,7 +80,7 @@ BinaryEncoder::Result BinaryEncoder::grow(std::size_t size) {
   constexpr std::size_t firstGrowth = 256;
   const std::size_t capacity = std::min(std::max({needed, 2 * written(), firstGrowth}), largestEncoding);
   const std::size_t kept = written();
-  const std::size_t before = static_cast<std::size_t>(begin_ - growing_->data());
+  const auto before = static_cast<std::size_t>(begin_ - growing_->data());
   growing_->resize_and_overwrite(before + capacity, [](char*, std::size_t all) { return all; });
   begin_ = growing_->data() + before;
   cursor_ = begin_ + kept;

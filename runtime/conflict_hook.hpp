@@ -22,8 +22,8 @@ class ConflictHook {
   requires(!std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
            std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
       ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
-      : callable_(const_cast<void*>(static_cast<const void*>(std::addressof(
-            callable)))),  // NOLINT(cppcoreguidelines-pro-type-const-cast): given back its type
+      // NOLINTNEXTLINE(cppcoreguidelines-pro-type-const-cast): it is given back its type
+      : callable_(const_cast<std::remove_const_t<Callable>*>(std::addressof(callable))),
         call_([](void* target) -> std::expected<void, DecodeError> {
           return (*static_cast<Callable*>(target))();
         }) {}

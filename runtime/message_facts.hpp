@@ -1,6 +1,7 @@
 // What is known of a message type without a value of it.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <span>
 #include <string_view>
@@ -23,12 +24,7 @@ struct MessageFacts {
   std::span<const FieldFacts> fields;  // in ascending order of their numbers
 
   // Whether the message, or one nested in it, has a oneof.
-  constexpr bool holdsOneof() const {
-    for (const FieldFacts& field : fields) {
-      if (field.holdsOneof) return true;
-    }
-    return false;
-  }
+  constexpr bool holdsOneof() const { return std::ranges::any_of(fields, &FieldFacts::holdsOneof); }
 
   // None for a number that the message does not define.
   constexpr const FieldFacts* field(std::uint32_t number) const {

@@ -182,13 +182,13 @@ template <auto pointer, class Case>
 constexpr FieldFacts factsOfRow(const Field<pointer, Case>& row) {
   using Traits = StorageTraits<typename PointedTo<decltype(pointer)>::Type>;
   using Value = std::conditional_t<std::is_void_v<Case>, typename Traits::Value, Case>;
-  const MessageFacts* message = nullptr;
-  bool holdsOneof = !std::is_void_v<Case>;
+  constexpr bool isCase = !std::is_void_v<Case>;
   if constexpr (AnyMessage<Value>) {
-    message = &Value::messageFacts();
-    holdsOneof = holdsOneof || Value::messageFacts().holdsOneof();
+    const MessageFacts& message = Value::messageFacts();
+    return {row.number, row.name, &message, Traits::isRepeated, isCase || message.holdsOneof()};
+  } else {
+    return {row.number, row.name, nullptr, Traits::isRepeated, isCase};
   }
-  return {row.number, row.name, message, Traits::isRepeated, holdsOneof};
 }
 
 }  // namespace orv::rules

@@ -60,6 +60,8 @@ def widths():
         expect(f"dump on {columns} columns: status", status, 0)
         longest = max(len(line) for line in shown.splitlines())
         expect(f"dump on {columns} columns is no wider ({longest})", longest <= columns, True)
+        for value in ("carol", "dave's tablet 2", "token-77"):
+            expect(f"dump on {columns} columns shows the value", f'"{value}"' in shown, True)
         status, shown = on_terminal(["decode", "--help"], columns)
         text = [line for line in shown.split("Examples:")[0].splitlines() if not line.startswith("Usage")]
         longest = max(len(line) for line in text)

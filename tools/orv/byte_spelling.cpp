@@ -67,10 +67,13 @@ std::expected<void, SpellingFault> HexReader::finish() const {
 
 std::expected<void, SpellingFault> Base64Reader::take(std::string_view piece, std::string& bytes) {
   for (const char character : piece) {
-    if (!isSpace(character)) group_ += character;
+    if (!isSpace(character)) {
+      if (group_.empty()) groupStart_ = position_;
+      group_ += character;
+    }
     if (group_.size() == 4) {
       const auto decoded = json::decodeBase64(group_);
-      if (!decoded) return std::unexpected(SpellingFault{"no base64", position_.line(), position_.column()});
+      if (!decoded) return failInGroup();
       bytes += *decoded;
       group_.clear();
     }
@@ -81,9 +84,13 @@ std::expected<void, SpellingFault> Base64Reader::take(std::string_view piece, st
 
 std::expected<void, SpellingFault> Base64Reader::finish(std::string& bytes) const {
   const auto decoded = json::decodeBase64(group_);
-  if (!decoded) return std::unexpected(SpellingFault{"no base64", position_.line(), position_.column()});
+  if (!decoded) return failInGroup();
   bytes += *decoded;
   return {};
+}
+
+std::unexpected<SpellingFault> Base64Reader::failInGroup() const {
+  return std::unexpected(SpellingFault{"no base64 digits", groupStart_.line(), groupStart_.column()});
 }
 
 }  // namespace orv::tool

@@ -51,7 +51,10 @@ class Base64Reader {
   std::expected<void, SpellingFault> finish(std::string& bytes) const;
 
  private:
+  std::unexpected<SpellingFault> failInGroup() const;
+
   TextPosition position_;
+  TextPosition groupStart_;
   std::string group_;  // up to four digits
 };
 

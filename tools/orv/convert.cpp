@@ -12,9 +12,11 @@ namespace orv::tool {
 
 namespace {
 
-// What is not said is JSON when it begins as a document does, and the text format otherwise.
+// What is not said is JSON when it begins as a document does, and the text format otherwise. An array is no
+// message, but more likely meant for JSON than for an extension in the text format.
 Format guessFormat(InputFile& file) {
-  return file.firstVisibleCharacter() == '{' ? Format::json : Format::text;
+  const auto first = file.firstVisibleCharacter();
+  return first == '{' || first == '[' ? Format::json : Format::text;
 }
 
 // Reads one file to its end.

@@ -58,9 +58,16 @@ void DumpLayout::appendHeading(std::string& output, std::string_view text) const
 
 void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Note& note) const {
   const std::size_t size = bytes.header.size() + bytes.value.size();
-  for (std::size_t row = 0; row == 0 || row < size; row += bytesPerRow_) {
-    appendBytes(output, bytes, row);
+  const bool isValueBelow = !fitsBeside(note);
+  const std::size_t end = std::max(size, isValueBelow ? bytesPerRow_ + 1 : 1);
+  for (std::size_t row = 0; row < end; row += bytesPerRow_) {
+    if (row == 0 || row < size) {
+      appendBytes(output, bytes, row);
+    } else {
+      output.append(noteColumn(), ' ');
+    }
     if (row == 0) appendNote(output, note);
+    if (row == (isValueBelow ? bytesPerRow_ : 0)) appendValue(output, note, isValueBelow);
     while (output.ends_with(' ')) output.pop_back();
     output += '\n';
   }
@@ -89,25 +96,50 @@ void DumpLayout::appendBytes(std::string& output, const Bytes& bytes, std::size_
   output.append(3 * (bytesPerRow_ - (std::max(row, end) - row)) + 1, ' ');
 }
 
+std::size_t DumpLayout::indentation(const Note& note) { return 2 * note.depth; }
+
+std::size_t DumpLayout::pathWidth(const Note& note) const {
+  const std::size_t column = isAligned_ ? pathColumn - std::min(pathColumn, indentation(note)) : 0;
+  return std::max(columns(note.path), column) + 2;
+}
+
+std::size_t DumpLayout::kindWidth(const Note& note) const {
+  return std::max(columns(note.kind), isAligned_ ? kindColumn : 0) + 2;
+}
+
+std::size_t DumpLayout::roomBehind(std::size_t column) const {
+  return width_ == 0 ? std::string::npos : width_ - std::min(width_, column);
+}
+
+bool DumpLayout::fitsBeside(const Note& note) const {
+  const std::size_t start = noteColumn() + indentation(note) + pathWidth(note) + kindWidth(note);
+  return columns(note.value) <= roomBehind(start);
+}
+
 void DumpLayout::appendNote(std::string& output, const Note& note) const {
-  const std::size_t start = noteColumn();
-  std::size_t room = width_ == 0 ? std::string::npos : width_ - std::min(width_, start);
-  const auto append = [&](Palette::Colour colour, std::string_view text, std::size_t column) {
+  std::size_t column = noteColumn() + std::min(roomBehind(noteColumn()), indentation(note));
+  output.append(column - noteColumn(), ' ');
+  const auto append = [&](Palette::Colour colour, std::string_view text, std::size_t width) {
+    const std::size_t room = std::min(width, roomBehind(column));
     const std::string fitting = fitted(text, room);
-    const std::size_t taken = columns(fitting);
     palette_.append(output, colour, fitting);
-    const std::size_t padding =
-        std::min(room - taken, 2 + (isAligned_ && column > taken ? column - taken : 0));
-    output.append(padding, ' ');
-    if (width_ != 0) room -= taken + padding;
+    output.append(room - columns(fitting), ' ');
+    column += room;
   };
-  const std::size_t indentation = std::min(room, 2 * note.depth);
-  output.append(indentation, ' ');
-  if (width_ != 0) room -= indentation;
   append(note.colour == Palette::Colour::value ? Palette::Colour::name : note.colour, note.path,
-         pathColumn - std::min(pathColumn, 2 * note.depth));
-  append(Palette::Colour::kind, note.kind, kindColumn);
-  append(note.colour, note.value, 0);
+         pathWidth(note));
+  append(Palette::Colour::kind, note.kind, kindWidth(note));
+}
+
+void DumpLayout::appendValue(std::string& output, const Note& note, bool isBelow) const {
+  std::size_t start = noteColumn() + indentation(note);
+  if (isBelow) {
+    output.append(std::min(roomBehind(noteColumn()), indentation(note) + 2), ' ');
+    start += 2;
+  } else {
+    start += pathWidth(note) + kindWidth(note);
+  }
+  palette_.append(output, note.colour, fitted(note.value, roomBehind(start)));
 }
 
 void DumpLayout::appendError(std::string& output, std::string_view text) const {

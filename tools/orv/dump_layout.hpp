@@ -11,7 +11,8 @@
 
 namespace orv::tool {
 
-// Sets the rows of a dump: offset, bytes, and beside the bytes' first row what they are.
+// Sets the rows of a dump: offset, bytes, and beside the bytes' first row what they are. A value that would be
+// cut there stands beside the second.
 class DumpLayout {
  public:
   // A width of 0 is that of no terminal: rows are as long as they are.
@@ -41,8 +42,18 @@ class DumpLayout {
 
  private:
   void appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const;
+  // Path and kind.
   void appendNote(std::string& output, const Note& note) const;
+  void appendValue(std::string& output, const Note& note, bool isBelow) const;
+
+  // Places and widths in columns.
   std::size_t noteColumn() const;
+  static std::size_t indentation(const Note& note);
+  std::size_t pathWidth(const Note& note) const;
+  std::size_t kindWidth(const Note& note) const;
+  std::size_t roomBehind(std::size_t column) const;
+  // Whether the value has room on the row of path and kind.
+  bool fitsBeside(const Note& note) const;
 
   std::size_t width_;
   std::size_t bytesPerRow_;
