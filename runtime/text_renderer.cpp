@@ -2,6 +2,8 @@
 
 #include <google/protobuf/io/coded_stream.h>
 
+#include <algorithm>
+#include <array>
 #include <limits>
 
 namespace orv {
@@ -12,6 +14,44 @@ using google::protobuf::io::CodedInputStream;
 
 // What the official printer allows (its kUnknownFieldRecursionLimit).
 constexpr int unknownLevels = 10;
+
+// How bytes stand between quotation marks: printable ASCII as it is, the rest as C escapes, by name where C has
+// one, else in three octal digits.
+enum : char { asItIs = 0, inOctal = 1 };  // anything else is the escape's name
+constexpr std::size_t longestEscape = 4;
+
+constexpr auto escapes = [] {
+  std::array<char, 256> table{};
+  for (std::size_t byte = 0; byte < table.size(); ++byte) {
+    table[byte] = byte >= 0x20 && byte < 0x7F ? asItIs : inOctal;
+  }
+  table['\n'] = 'n';
+  table['\r'] = 'r';
+  table['\t'] = 't';
+  for (const char itself : {'"', '\'', '\\'}) table[static_cast<unsigned char>(itself)] = itself;
+  return table;
+}();
+
+// Answers where it ended. There is room for the longest escape of each byte.
+char* writeEscaped(std::string_view bytes, char* target) {
+  for (const char character : bytes) {
+    const auto byte = static_cast<unsigned char>(character);
+    const char escape = escapes[byte];
+    if (escape == asItIs) {
+      *target++ = character;
+      continue;
+    }
+    *target++ = '\\';
+    if (escape == inOctal) {
+      *target++ = static_cast<char>('0' + (byte >> 6));
+      *target++ = static_cast<char>('0' + ((byte >> 3) & 7));
+      *target++ = static_cast<char>('0' + (byte & 7));
+    } else {
+      *target++ = escape;
+    }
+  }
+  return target;
+}
 
 template <class Number>
 std::string hexadecimal(Number value) {
@@ -124,28 +164,16 @@ TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_vie
   return {};
 }
 
-// Printable ASCII as it is, the rest as C escapes: by name where C has one, else in three octal digits.
 void TextRenderer::appendQuoted(std::string_view bytes) {
+  // Piece by piece, so that the room for the longest escapes is never much more than the text takes.
+  constexpr std::size_t pieceSize = 4096;
   output_ += '"';
-  for (const char character : bytes) {
-    const auto byte = static_cast<unsigned char>(character);
-    switch (character) {
-      case '\n': output_ += "\\n"; break;
-      case '\r': output_ += "\\r"; break;
-      case '\t': output_ += "\\t"; break;
-      case '"': output_ += "\\\""; break;
-      case '\'': output_ += "\\'"; break;
-      case '\\': output_ += "\\\\"; break;
-      default:
-        if (byte >= 0x20 && byte < 0x7F) {
-          output_ += character;
-        } else {
-          output_ += '\\';
-          output_ += static_cast<char>('0' + (byte >> 6));
-          output_ += static_cast<char>('0' + ((byte >> 3) & 7));
-          output_ += static_cast<char>('0' + (byte & 7));
-        }
-    }
+  for (; !bytes.empty(); bytes.remove_prefix(std::min(bytes.size(), pieceSize))) {
+    const std::string_view piece = bytes.substr(0, pieceSize);
+    const std::size_t before = output_.size();
+    output_.resize_and_overwrite(before + longestEscape * piece.size(), [&](char* output, std::size_t) {
+      return static_cast<std::size_t>(writeEscaped(piece, output + before) - output);
+    });
   }
   output_ += '"';
 }

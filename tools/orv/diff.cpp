@@ -22,11 +22,11 @@ struct Side {
   static Outcome<Side> open(const std::string& path, const Options& options) {
     auto file = InputFile::open(path);
     if (!file) return std::unexpected(std::move(file.error()));
-    Side side{std::make_unique<InputFile>(std::move(*file)), nullptr, nullptr};
+    auto input = std::make_unique<InputFile>(std::move(*file));
     const Format format = options.from.value_or(Format::binary);
-    side.frames = FrameReader::make(*side.file, {format, options.isDelimited, options.maximumSize});
-    side.messages = std::make_unique<MessageInput>(*side.frames, format, options);
-    return side;
+    auto frames = FrameReader::make(*input, {format, options.isDelimited, options.maximumSize});
+    auto messages = std::make_unique<MessageInput>(*frames, format, options);
+    return Side{std::move(input), std::move(frames), std::move(messages)};
   }
 
   std::unique_ptr<InputFile> file;

@@ -32,7 +32,8 @@ std::string describeBytes(std::span<const std::byte> bytes) {
 }
 
 std::string describeUnknown(const TracedRecord& record) {
-  std::string text = record.isDefined ? "another wire type than the field's, kept as unknown: " : "unknown: ";
+  const std::string text =
+      record.isDefined ? "another wire type than the field's, kept as unknown: " : "unknown: ";
   switch (record.tag.wireType()) {
     case WireType::lengthDelimited: return text + describeBytes(record.value);
     case WireType::startGroup: return text + byteCount(record.value.size());

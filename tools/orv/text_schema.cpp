@@ -19,7 +19,7 @@ namespace pb = google::protobuf;
 class NoErrors final : public pb::io::ErrorCollector {
  public:
   void AddError(int, pb::io::ColumnNumber, const std::string&) override {
-    assert(!"the shipped schema is well-formed");
+    assert(false && "the shipped schema is well-formed");
   }
 };
 
@@ -60,9 +60,9 @@ TextSchema& TextSchema::shipped() {
 }
 
 TextSchema& TextSchema::withOpenData(const MessageType& payload) {
-  static auto& schemas = *new std::map<const MessageType*, TextSchema*>();
-  TextSchema*& schema = schemas[&payload];
-  if (schema == nullptr) schema = new TextSchema(fileWithOpenData(payload));
+  static auto& schemas = *new std::map<const MessageType*, std::unique_ptr<TextSchema>>();
+  std::unique_ptr<TextSchema>& schema = schemas[&payload];
+  if (schema == nullptr) schema.reset(new TextSchema(fileWithOpenData(payload)));
   return *schema;
 }
 
