@@ -40,8 +40,8 @@ void keep(const T& object) {
 // first.
 inline constexpr std::size_t bufferSlack = 64;
 
-// A buffer that lives as long as the program. It starts with a page: where the heap happens to put a short one
-// across two, encoding into it takes up to three times as long.
+// A buffer that lives as long as the program. It starts with a page: where the heap happens to put a short
+// one across two, encoding into it takes up to three times as long.
 inline std::span<char> callersBuffer(std::size_t size) {
   constexpr std::size_t page = 4096;
   return {static_cast<char*>(std::aligned_alloc(page, (size + page - 1) / page * page)), size};

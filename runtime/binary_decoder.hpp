@@ -17,6 +17,7 @@
 #include "runtime/conflict_hook.hpp"
 #include "runtime/decode_error.hpp"
 #include "runtime/decoder.hpp"
+#include "runtime/inline_bytes.hpp"
 #include "runtime/message_facts.hpp"
 #include "runtime/presence.hpp"
 #include "runtime/text.hpp"
@@ -38,10 +39,10 @@ namespace orv {
 // Each nested message is read by a decoder of its own, which knows the one that reads the enclosing message.
 class BinaryDecoder {
  public:
-  // What the single operations fail with: nothing but the fact, where a DecodeError passed up through every
-  // level of nesting cost a tenth of all decoding. failure() then says what was wrong. It is copied by hand
-  // because g++ 12 packs small results that copy trivially into registers by way of memory, in pieces that
-  // the processor cannot forward: with that, decoding takes twice as long.
+  // What the single operations fail with: an empty sign. A DecodeError passed up through every level of
+  // nesting made all decoding a tenth slower; failure() puts it together. The sign is copied by hand because
+  // g++ 12 packs small results that copy trivially into registers by way of memory, in pieces that the
+  // processor cannot forward: with that, decoding takes twice as long.
   struct Failure {
     Failure() = default;
     Failure(const Failure&) noexcept {}
@@ -124,8 +125,8 @@ class BinaryDecoder {
   Result decodeRepeatedMessageField(std::vector<M>& messages) {
     if (!isLengthDelimited()) return {};
     makeRoom(messages);
-    // The place of an element that comes later is fetched meanwhile: in a list too long for the caches a sixth
-    // of all decoding.
+    // The place of an element that comes later is fetched meanwhile: in a list too long for the caches a
+    // sixth of all decoding.
     constexpr std::size_t ahead = 16;
     __builtin_prefetch(messages.data() + std::min(messages.size() + ahead, messages.capacity()), 1);
     auto read = readNewMessage(messages.emplace_back());
@@ -147,13 +148,15 @@ class BinaryDecoder {
   }
 
   // Reads the field into a message that is then dropped: a copy of the one that is there if a oneof in it
-  // decides whether the hook is asked.
+  // decides whether a hook is asked.
   template <class M>
   Result checkMessageField(const M& held) {
-    if (mode_ != Mode::careful || !isAtLengthDelimitedField()) return {};
+    if (!isChecking() || !isAtLengthDelimitedField()) return {};
     const WireReader here = reader_;
     M scratch;
-    if constexpr (M::messageFacts().holdsOneof()) scratch = held;
+    if constexpr (M::messageFacts().holdsOneof()) {
+      if (outermost().hook_.isSet()) scratch = held;
+    }
     auto read = readMessage(scratch, Mode::checking);
     reader_ = here;
     return read;
@@ -161,7 +164,7 @@ class BinaryDecoder {
 
   template <class M>
   Result mergeMessageField(M& message) {
-    return readMessage(message, mode_ == Mode::careful ? Mode::confirmed : mode_);
+    return readMessage(message, isChecking() ? Mode::confirmed : mode_);
   }
 
   // For the replacing of a message, which takes its first occurrence of each field as if there had been none.
@@ -179,7 +182,7 @@ class BinaryDecoder {
  private:
   // What becomes of a message whose reading fails.
   enum class Mode : std::uint8_t {
-    careful,  // it keeps what was read, so a nested message is checked before it is merged into one that is there
+    careful,    // it keeps what was read, so a nested message is checked before it is merged into one there
     checking,   // it is dropped, so nothing need be checked
     confirmed,  // it cannot fail: all of it was read once before, and the hook was asked then
   };
@@ -192,6 +195,12 @@ class BinaryDecoder {
         outer_(&outer),
         nesting_(static_cast<std::uint8_t>(outer.nesting_ + 1)),
         mode_(mode) {}
+
+  // Whether a message is checked before it is merged. Inside one that is dropped there is no need, but for a
+  // hook, which is asked about what can be read alone.
+  bool isChecking() {
+    return mode_ == Mode::careful || (mode_ == Mode::checking && outermost().hook_.isSet());
+  }
 
   bool isLengthDelimited() const { return tag_.wireType() == WireType::lengthDelimited; }
 

@@ -69,6 +69,10 @@ BinaryEncoder::Result BinaryEncoder::endLongNested(std::size_t start, std::size_
   char* const lengthAt = body - lengthBytes;
   if (needed != lengthBytes) std::memmove(lengthAt + needed, body, length);
   cursor_ = writeVarint(length, lengthAt) + length;
+  if (needed < lengthBytes) {
+    // What was left behind the message did not move with it.
+    std::memset(cursor_, 0, std::min(room(), longestOverrun + lengthBytes - needed));
+  }
   lengthBytes = needed;
   return {};
 }

@@ -63,7 +63,6 @@ class BinaryEncoder {
   // Clears what fixed-size steps left behind the encoding in a caller's buffer: parts of other contents, it
   // may be.
   void wipeOverrun() {
-    constexpr std::size_t longestOverrun = InlineBytes::objectSize + 16;
     if (room() >= longestOverrun) {
       // At a fixed size it takes four stores, at another a loop as long as a small message's whole encoding.
       std::memset(cursor_, 0, longestOverrun);
@@ -123,6 +122,8 @@ class BinaryEncoder {
   Result visitUnknownFields(const UnknownStorage& unknownFields);
 
  private:
+  // What is left behind the encoding ends at most so far behind it.
+  static constexpr std::size_t longestOverrun = InlineBytes::objectSize;
   // Tags of the field numbers 1 to 15 and varints below 128 take one byte.
   static constexpr std::uint32_t shortNumbers = 16;
   static constexpr std::uint64_t shortVarints = 0x80;

@@ -84,36 +84,36 @@ class DelimitedReader::Source {
 
 std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::Source::next() {
   if (error_.has_value()) return std::unexpected(*error_);
-  // One for each message: it counts what it reads in an int.
-  io::CodedInputStream input(&buffered_);
   messageOffset_ = nextOffset_;
 
+  // One for the length and one for the message: it counts what it reads in an int.
+  std::optional<io::CodedInputStream> input(std::in_place, &buffered_);
   constexpr int longestLength = 5;
   std::uint64_t length = 0;
-  for (int index = 0;; ++index) {
-    std::uint8_t byte = 0;
-    if (index == longestLength) return fail(StreamError::Cause::malformedLength);
-    if (!input.ReadRaw(&byte, 1)) {
-      if (index == 0 && !stream_.hasFailed()) return std::nullopt;
+  int lengthSize = 0;
+  for (std::uint8_t byte = 0x80; byte >= 0x80; ++lengthSize) {
+    if (lengthSize == longestLength) return fail(StreamError::Cause::malformedLength);
+    if (!input->ReadRaw(&byte, 1)) {
+      if (lengthSize == 0 && !stream_.hasFailed()) return std::nullopt;
       return fail(StreamError::Cause::truncated);
     }
-    length |= std::uint64_t{byte & 0x7FU} << (7 * index);
-    if (byte < 0x80) break;
+    length |= std::uint64_t{byte & 0x7FU} << (7 * lengthSize);
   }
   if (length > std::numeric_limits<std::int32_t>::max()) return fail(StreamError::Cause::malformedLength);
   if (length > maximumSize_) return fail(StreamError::Cause::tooLarge, length);
 
   // What is announced is made room for as it arrives.
+  input.emplace(&buffered_);
   message_.clear();
   while (message_.size() < length) {
     constexpr std::size_t firstPiece = std::size_t{64} << 10;
     const std::size_t had = message_.size();
     const std::size_t piece = std::min<std::size_t>(length - had, std::max(firstPiece, had));
     message_.resize(had + piece);
-    if (!input.ReadRaw(message_.data() + had, static_cast<int>(piece)))
+    if (!input->ReadRaw(message_.data() + had, static_cast<int>(piece)))
       return fail(StreamError::Cause::truncated);
   }
-  messageOffset_ += static_cast<std::uint64_t>(input.CurrentPosition()) - length;
+  messageOffset_ += static_cast<std::uint64_t>(lengthSize);
   nextOffset_ = messageOffset_ + length;
   return std::span<const std::byte>(message_);
 }

@@ -10,6 +10,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <utility>
 
 #include "runtime/decode_error.hpp"
 #include "runtime/encode_error.hpp"
@@ -18,7 +19,7 @@ namespace orv {
 
 // Fills the front of a buffer from a file, a socket or the like. Answers how many bytes it put there, 0 at
 // the end of the stream, and a negative number when reading failed. It may give fewer bytes than there is
-// room for.
+// room for, and throws nothing.
 using ReadFunction = std::move_only_function<std::ptrdiff_t(std::span<std::byte>)>;
 
 // Why no message could be read from a stream.
@@ -48,8 +49,8 @@ struct StreamError {
 };
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
-// are announced. A malformed message is
-// passed over; after any other error the stream ends with that error, again and again.
+// are announced. A malformed message is passed over; after any other error the stream ends with that error,
+// again and again.
 class DelimitedReader {
  public:
   static constexpr std::size_t defaultMaximumSize = std::size_t{64} << 20;

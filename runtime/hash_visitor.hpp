@@ -2,6 +2,8 @@
 #pragma once
 
 #include <cstdint>
+#include <expected>
+#include <string_view>
 #include <vector>
 
 #include "runtime/byte_buffer.hpp"

@@ -68,6 +68,7 @@ class InlineBytes {
   }
   std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
 
+  // Compares all words: what is behind the contents, which may never have been written, is masked away.
   friend bool operator==(const InlineBytes& left, const InlineBytes& right) {
     if (left.isOnHeap() || right.isOnHeap()) [[unlikely]]
       return left.view() == right.view();

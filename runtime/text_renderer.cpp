@@ -15,8 +15,8 @@ using google::protobuf::io::CodedInputStream;
 // What the official printer allows (its kUnknownFieldRecursionLimit).
 constexpr int unknownLevels = 10;
 
-// How bytes stand between quotation marks: printable ASCII as it is, the rest as C escapes, by name where C has
-// one, else in three octal digits.
+// How bytes stand between quotation marks: printable ASCII as it is, the rest as C escapes, by name where C
+// has one, else in three octal digits.
 enum : char { asItIs = 0, inOctal = 1 };  // anything else is the escape's name
 constexpr std::size_t longestEscape = 4;
 

@@ -3,7 +3,7 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <span>
+#include <expected>
 #include <string>
 #include <string_view>
 #include <vector>

@@ -41,9 +41,8 @@ struct WireFault {
 template <class T>
 using WireResult = std::expected<T, WireFault>;
 
-// A position in a stretch of bytes, which must outlive the reader. After a failed
-// read the position is where the piece begins that could not be read; after a failed skip it may be anywhere
-// behind.
+// A position in a stretch of bytes, which must outlive the reader. After a failed read the position is where
+// the piece begins that could not be read; after a failed skip it may be anywhere behind.
 class WireReader {
  public:
   WireReader() = default;

@@ -1,3 +1,2 @@
-// The background service of the feature for inviting nearby devices into a shared session. It holds the
-// message model that its peers exchange and does no work of its own.
+// The background service: it links the message model that its peers exchange and does no work of its own.
 int main() { return 0; }

@@ -7,6 +7,8 @@
 #include <array>
 #include <cassert>
 #include <cstddef>
+#include <cstdint>
+#include <expected>
 #include <span>
 #include <string>
 

@@ -7,6 +7,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <type_traits>
 #include <utility>
 
 #include "messages/core/field.hpp"
@@ -16,6 +17,7 @@
 #include "runtime/decoder.hpp"
 #include "runtime/encoded_size.hpp"
 #include "runtime/hash_visitor.hpp"
+#include "runtime/hasher.hpp"
 #include "runtime/message_facts.hpp"
 #include "runtime/name_map.hpp"
 #include "runtime/text_renderer.hpp"

@@ -6,6 +6,8 @@
 #include <array>
 #include <concepts>
 #include <cstddef>
+#include <cstdint>
+#include <expected>
 #include <optional>
 #include <tuple>
 #include <type_traits>

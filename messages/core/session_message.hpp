@@ -1,8 +1,12 @@
 // The envelope of the invitation protocol.
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <optional>
+#include <string_view>
+#include <tuple>
+#include <utility>
 
 #include "messages/core/enumeration.hpp"
 #include "messages/core/message.hpp"

@@ -12,7 +12,8 @@ from tool import SKIPPED, delimited, expect, in_scratch_directory, record
 TREE = os.path.realpath(os.path.join(os.path.dirname(__file__), "../.."))
 PORT = 4711
 
-# Envelopes, and what the dissector is to say of each: kind, payload message, something that is in the payload.
+# Envelopes, and what the dissector is to say of each: kind, payload message, something that is in the
+# payload.
 ENVELOPES = [
     (
         bytes.fromhex("08 01 10 03") + record(3, record(1, b"id-1") + record(2, b"carol")),

@@ -2,9 +2,11 @@
 #pragma once
 
 #include <cstddef>
+#include <expected>
 #include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 #include <variant>
 
 #include "tools/orv/byte_spelling.hpp"

@@ -11,8 +11,8 @@
 
 namespace orv::tool {
 
-// Sets the rows of a dump: offset, bytes, and beside the bytes' first row what they are. A value that would be
-// cut there stands beside the second.
+// Sets the rows of a dump: offset, bytes, and beside the bytes' first row what they are. A value that would
+// be cut there stands beside the second.
 class DumpLayout {
  public:
   // A width of 0 is that of no terminal: rows are as long as they are.

@@ -62,7 +62,7 @@ TextSchema& TextSchema::shipped() {
 TextSchema& TextSchema::withOpenData(const MessageType& payload) {
   static auto& schemas = *new std::map<const MessageType*, std::unique_ptr<TextSchema>>();
   std::unique_ptr<TextSchema>& schema = schemas[&payload];
-  if (schema == nullptr) schema.reset(new TextSchema(fileWithOpenData(payload)));
+  if (schema == nullptr) schema = std::make_unique<TextSchema>(fileWithOpenData(payload));
   return *schema;
 }
 

@@ -20,14 +20,14 @@ class TextSchema {
   static TextSchema& shipped();
   static TextSchema& withOpenData(const MessageType& payload);
 
+  // `file` is well-formed.
+  explicit TextSchema(const google::protobuf::FileDescriptorProto& file);
   TextSchema(const TextSchema&) = delete;
   TextSchema& operator=(const TextSchema&) = delete;
 
   std::unique_ptr<google::protobuf::Message> newMessage(std::string_view fullName);
 
  private:
-  explicit TextSchema(const google::protobuf::FileDescriptorProto& file);
-
   google::protobuf::DescriptorPool pool_;
   google::protobuf::DynamicMessageFactory factory_{&pool_};
 };

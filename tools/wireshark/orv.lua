@@ -1,6 +1,6 @@
--- Wireshark: dissects the messages of the invitation protocol, with Wireshark's own Protocol Buffers dissector
--- and the schema proto/orv.proto. A UDP datagram holds one envelope, a TCP stream envelopes behind their lengths
--- as varints. docs/wireshark.md says how to set it up.
+-- Wireshark: dissects the messages of the invitation protocol, with Wireshark's own Protocol Buffers
+-- dissector and the schema proto/orv.proto. A UDP datagram holds one envelope, a TCP stream envelopes behind
+-- their lengths as varints. docs/wireshark.md says how to set it up.
 
 local ENVELOPE = "orv.SessionMessage"
 

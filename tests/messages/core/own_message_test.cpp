@@ -4,6 +4,7 @@
 
 #include "messages/core/built_in.hpp"
 #include "messages/group/group.hpp"
+#include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 
 namespace orv {
@@ -51,6 +52,29 @@ TEST(OwnMessage, IsReadWrittenComparedAndNamedByItsTable) {
   EXPECT_EQ(other.hashValue(), message.hashValue());
   EXPECT_EQ(Wrapper::parse(hex("0A 04 22 02 0A 09")).error().message(),
             "test.Wrapper.group.memberLeft.groupUUID: length 9 runs 9 bytes past the end, at byte 5");
+}
+
+TEST(OwnMessage, ReadsAPayloadInAMessageThatComesAgainBeforeTheHookIsAsked) {
+  const std::string input = hex("0A 02 22 00 0A 04 22 02 0A 09");
+  int asked = 0;
+  auto counting = [&] { return (++asked, std::expected<void, DecodeError>()); };
+  BinaryDecoder decoder(std::as_bytes(std::span(input)), counting);
+  Wrapper message;
+  EXPECT_EQ(message.decodeMessage(decoder).error().cause, DecodeCause::lengthOverrun);
+  EXPECT_EQ(asked, 0);
+  EXPECT_EQ(encoded(message), "0A 02 22 00");
+}
+
+TEST(OwnMessage, MergesAMessageThatComesAgainInLinearTime) {
+  // A thousand members, and then the message that holds them fifty thousand times more.
+  std::string members;
+  for (int count = 0; count < 1000; ++count) members += record(2, record(1, std::string(50, 'h')));
+  std::string input = record(1, record(1, members));
+  for (int count = 0; count < 50'000; ++count) input += hex("0A 02 0A 00");
+  const HeapMeter meter;
+  const Wrapper message = Wrapper::parse(input).value();
+  EXPECT_LT(meter.totalBytes(), 2 * input.size());
+  EXPECT_EQ(message.encodedSize(), record(1, record(1, members)).size());
 }
 
 TEST(OwnMessage, AsksTheHookAboutAOneofInAMessageThatComesAgain) {

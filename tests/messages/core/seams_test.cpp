@@ -19,7 +19,8 @@ std::string encoded(const M& message) {
   return toHex(message.serialize().value());
 }
 
-// A decoder that lacks an operation for any message is no decoder of messages, rather than an error in the rules.
+// A decoder that lacks an operation for any message is no decoder of messages, rather than an error in the
+// rules.
 struct DecoderWithoutNumbers : ScriptedDecoder {
   void nextFieldNumber();
 };
