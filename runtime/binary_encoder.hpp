@@ -156,8 +156,8 @@ class BinaryEncoder {
         if (contents.size() >= shortVarints) *target++ = static_cast<char>((contents.size() & 0x7F) | 0x80);
         *target++ =
             static_cast<char>(contents.size() >= shortVarints ? contents.size() >> 7 : contents.size());
-        std::memcpy(target, contents.data(), contents.size());
         cursor_ = target + contents.size();
+        std::memcpy(target, contents.data(), contents.size());
         return {};
       }
     }
