@@ -45,7 +45,7 @@ def reached_table(results):
         if mean is None:
             continue
         worst, workload = max(run.worst(row, OURS) for run in results.runs)
-        cells = [row.title, ratio(mean), f"{ratio(worst)} ({workload})"]
+        cells = [row.title, f"{mean:.3f}", f"{worst:.3f} ({workload})"]
         if row.mean is None:
             cells += ["–", "–", "–", "–"]
         else:
@@ -153,8 +153,9 @@ def machine(build):
     flags = re.search(r"^CMAKE_CXX_FLAGS_RELEASE:\w+=(.*)$", cache, re.MULTILINE)[1]
     version = subprocess.run([compiler, "--version"], capture_output=True, text=True, check=True).stdout
     model = re.search(r"^model name\s*: (.*)$", pathlib.Path("/proc/cpuinfo").read_text(), re.MULTILINE)
+    linked = "statically" if re.search(r"^ORV_BENCH_STATIC:BOOL=ON$", cache, re.MULTILINE) else "shared"
     return (f"{model[1] if model else 'unknown processor'}, {os.cpu_count()} cores; "
-            f"{version.splitlines()[0]}, `{flags}`, everything linked statically.")
+            f"{version.splitlines()[0]}, `{flags}`, the official runtime linked {linked}.")
 
 
 def report(results, build):

@@ -296,7 +296,7 @@ class BinaryDecoder {
   void makeRoom(std::vector<T>& list) const {
     if (list.size() < list.capacity()) [[likely]]
       return;
-    constexpr std::size_t firstFew = 16;
+    constexpr std::size_t firstFew = 8;
     const std::size_t most = list.empty() ? firstFew - 1 : std::numeric_limits<std::size_t>::max();
     const std::size_t run = 1 + reader_.countFollowing(tag_, most);
     list.reserve(list.size() + std::max(run, list.size()));
