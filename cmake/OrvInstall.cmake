@@ -42,7 +42,7 @@ if(ORV_BUILD_TESTS)
   add_test(NAME Build.AnInstalledLibraryServesItsUsers
     COMMAND ${CMAKE_COMMAND} -DBUILD=${PROJECT_BINARY_DIR} -DCONSUMER=${PROJECT_SOURCE_DIR}/examples/custom
       "-DPRIVATE_HEADERS=${orvPrivateHeaders}"
-      -DCOMPILER=${CMAKE_CXX_COMPILER} "-DFLAGS=${CMAKE_CXX_FLAGS}"
+      -DGENERATOR=${CMAKE_GENERATOR} -DCOMPILER=${CMAKE_CXX_COMPILER} "-DFLAGS=${CMAKE_CXX_FLAGS}"
       -P ${PROJECT_SOURCE_DIR}/cmake/test_installation.cmake)
   set_tests_properties(Build.AnInstalledLibraryServesItsUsers PROPERTIES TIMEOUT 600)
 endif()

@@ -19,7 +19,7 @@ foreach(private IN LISTS PRIVATE_HEADERS)
     message(FATAL_ERROR "${private} was installed")
   endif()
 endforeach()
-run(${CMAKE_COMMAND} -S ${CONSUMER} -B ${place}/consumer -DCMAKE_PREFIX_PATH=${place}/installed
+run(${CMAKE_COMMAND} -G ${GENERATOR} -S ${CONSUMER} -B ${place}/consumer -DCMAKE_PREFIX_PATH=${place}/installed
   -DCMAKE_CXX_COMPILER=${COMPILER} -DCMAKE_CXX_FLAGS=${FLAGS})
 run(${CMAKE_COMMAND} --build ${place}/consumer)
 run(${CMAKE_CTEST_COMMAND} --test-dir ${place}/consumer --output-on-failure --no-tests=error)
