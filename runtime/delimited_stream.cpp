@@ -102,9 +102,10 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   if (length > std::numeric_limits<std::int32_t>::max()) return fail(StreamError::Cause::malformedLength);
   if (length > maximumSize_) return fail(StreamError::Cause::tooLarge, length);
 
-  // What is announced is made room for as it arrives.
-  input.emplace(&buffered_);
   message_.clear();
+  // It reads ahead as soon as it is made, and nothing need follow an empty message.
+  if (length != 0) input.emplace(&buffered_);
+  // What is announced is made room for as it arrives.
   while (message_.size() < length) {
     constexpr std::size_t firstPiece = std::size_t{64} << 10;
     const std::size_t had = message_.size();

@@ -103,14 +103,19 @@ TEST(DelimitedStream, TakesMemoryForWhatArrivesNotForWhatIsAnnounced) {
 }
 
 TEST(DelimitedStream, ReadsNoFurtherThanTheReadFunctionGave) {
-  // A peer that waits for an answer sends nothing behind its message.
-  int calls = 0;
-  DelimitedReader reader([&](std::span<std::byte> room) -> std::ptrdiff_t {
-    if (++calls > 1) ADD_FAILURE() << "would wait for ever";
-    std::ranges::copy(std::as_bytes(std::span(std::string_view("\x02\x08\x01"))), room.begin());
-    return 3;
-  });
-  EXPECT_EQ(reader.read<SessionMessage>().value()->version(), 1U);
+  // A peer that waits for an answer sends nothing behind its message, and nothing at all behind an empty one.
+  for (const std::string& stream : {hex("02 08 01"), hex("00")}) {
+    int calls = 0;
+    DelimitedReader reader([&](std::span<std::byte> room) -> std::ptrdiff_t {
+      if (++calls > 1) {
+        ADD_FAILURE() << "would wait for ever";
+        return 0;
+      }
+      std::ranges::copy(std::as_bytes(std::span(stream)), room.begin());
+      return static_cast<std::ptrdiff_t>(stream.size());
+    });
+    EXPECT_EQ(reader.read<SessionMessage>().value()->encodedSize(), stream.size() - 1);
+  }
 }
 
 TEST(DelimitedStream, AppendsMessagesBehindTheirLengths) {
