@@ -17,23 +17,6 @@ namespace orv::tool {
 
 namespace {
 
-// One of the two files.
-struct Side {
-  static Outcome<Side> open(const std::string& path, const Options& options) {
-    auto file = InputFile::open(path);
-    if (!file) return std::unexpected(std::move(file.error()));
-    auto input = std::make_unique<InputFile>(std::move(*file));
-    const Format format = options.from.value_or(Format::binary);
-    auto frames = FrameReader::make(*input, {format, options.isDelimited, options.maximumSize});
-    auto messages = std::make_unique<MessageInput>(*frames, format, options);
-    return Side{std::move(input), std::move(frames), std::move(messages)};
-  }
-
-  std::unique_ptr<InputFile> file;
-  std::unique_ptr<FrameReader> frames;
-  std::unique_ptr<MessageInput> messages;
-};
-
 class Comparison {
  public:
   Comparison(const Options& options, OutputFile& output)
@@ -107,9 +90,9 @@ class Comparison {
 };
 
 Outcome<void> compareFiles(const Options& options, Comparison& comparison, Progress& progress) {
-  auto before = Side::open(options.files[0], options);
+  auto before = MessageFile::open(options.files[0], options);
   if (!before) return std::unexpected(std::move(before.error()));
-  auto after = Side::open(options.files[1], options);
+  auto after = MessageFile::open(options.files[1], options);
   if (!after) return std::unexpected(std::move(after.error()));
   while (!comparison.isDecided()) {
     const auto hasLeft = before->messages->next();

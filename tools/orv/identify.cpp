@@ -44,11 +44,9 @@ std::string describe(std::vector<Candidate> candidates) {
 
 Outcome<void> identifyFile(const std::string& path, const Options& options, OutputFile& output,
                            Progress& progress) {
-  auto input = InputFile::open(path);
-  if (!input) return std::unexpected(std::move(input.error()));
-  const Format format = options.from.value_or(Format::binary);
-  const auto frames = FrameReader::make(*input, {format, options.isDelimited, options.maximumSize});
-  MessageInput messages(*frames, format, options);
+  const auto file = MessageFile::open(path, options);
+  if (!file) return std::unexpected(file.error());
+  MessageInput& messages = *file->messages;
   for (bool isFirst = true;; isFirst = false) {
     auto hasNext = messages.next();
     if (!hasNext) return std::unexpected(std::move(hasNext.error()));

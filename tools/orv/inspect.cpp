@@ -35,11 +35,9 @@ Outcome<void> showEnd(const Failure& failure, const DumpLayout& layout, OutputFi
 
 Outcome<void> inspectFile(const std::string& path, const Options& options, const DumpLayout& layout,
                           OutputFile& output, Progress& progress) {
-  auto input = InputFile::open(path);
-  if (!input) return std::unexpected(std::move(input.error()));
-  const Format format = options.from.value_or(Format::binary);
-  const auto frames = FrameReader::make(*input, {format, options.isDelimited, options.maximumSize});
-  MessageInput messages(*frames, format, options);
+  const auto file = MessageFile::open(path, options);
+  if (!file) return std::unexpected(file.error());
+  MessageInput& messages = *file->messages;
   for (bool isFirst = true;; isFirst = false) {
     auto hasNext = messages.next();
     if (!hasNext) return showEnd(hasNext.error(), layout, output);
@@ -48,7 +46,7 @@ Outcome<void> inspectFile(const std::string& path, const Options& options, const
     layout.appendHeading(line, heading(options, path, messages));
     if (auto written = output.write(line); !written) return written;
     // The offsets of a message that came as text are those of its encoding.
-    const std::uint64_t offset = isBytes(format) ? messages.frame().offset : 0;
+    const std::uint64_t offset = isBytes(file->format) ? messages.frame().offset : 0;
     Dump dump(output, layout, std::as_bytes(std::span(messages.encoding())), offset);
     const auto shown = dump.show(*options.type, options.payloads);
     if (!shown) return std::unexpected(shown.error());

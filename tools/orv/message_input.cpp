@@ -72,4 +72,14 @@ Failure MessageInput::failureOf(const DecodeError& error) const {
   return reader_.malformedBytes(frame_, error.offset, (path.empty() ? "" : path + ": ") + error.reason());
 }
 
+Outcome<MessageFile> MessageFile::open(const std::string& path, const Options& options) {
+  auto file = InputFile::open(path);
+  if (!file) return std::unexpected(std::move(file.error()));
+  auto input = std::make_unique<InputFile>(std::move(*file));
+  const Format format = options.from.value_or(Format::binary);
+  auto frames = FrameReader::make(*input, {format, options.isDelimited, options.maximumSize});
+  auto messages = std::make_unique<MessageInput>(*frames, format, options);
+  return MessageFile{format, std::move(input), std::move(frames), std::move(messages)};
+}
+
 }  // namespace orv::tool

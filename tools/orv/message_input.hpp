@@ -1,12 +1,14 @@
 // Messages out of frames of any format.
 #pragma once
 
+#include <memory>
 #include <string>
 #include <string_view>
 
 #include "tools/orv/failure.hpp"
 #include "tools/orv/format.hpp"
 #include "tools/orv/frame_reader.hpp"
+#include "tools/orv/input_file.hpp"
 #include "tools/orv/message_value.hpp"
 #include "tools/orv/options.hpp"
 
@@ -48,6 +50,17 @@ class MessageInput {
   Frame frame_{};
   std::string encoded_;  // of a message that came as text
   std::string_view encoding_;
+};
+
+// A file that was opened for its messages, in the format that the options say, binary unless they do.
+struct MessageFile {
+  // The options must outlive it.
+  static Outcome<MessageFile> open(const std::string& path, const Options& options);
+
+  Format format;
+  std::unique_ptr<InputFile> file;
+  std::unique_ptr<FrameReader> frames;
+  std::unique_ptr<MessageInput> messages;
 };
 
 }  // namespace orv::tool
