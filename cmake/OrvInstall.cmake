@@ -1,31 +1,27 @@
-# Installing the library: headers under include/orv, and find_package(orv) giving orv::messages. Where
+# Installing the library: headers as <orv/…>, and find_package(orv) giving orv::messages. Where
 # orv::json was built, find_package(orv COMPONENTS json) gives it too.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
 set(orvPackageDirectory ${CMAKE_INSTALL_LIBDIR}/cmake/orv)
 
-# These are for the library's own sources.
-set(orvPrivateHeaders messages/core/built_in.hpp messages/core/replacing.hpp runtime/canonical.hpp)
-
-# A library, under the name that it has in the project, with the headers of these folders.
+# A library, under the name that it has in the project, with the headers of its include folders.
 function(orv_install target exportSet)
   string(REPLACE "orv_" "" exportName ${target})
   set_target_properties(${target} PROPERTIES EXPORT_NAME ${exportName})
   install(TARGETS ${target} EXPORT ${exportSet} COMPONENT library
     ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR}
-    INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/orv)
+    INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
   install(EXPORT ${exportSet} NAMESPACE orv:: DESTINATION ${orvPackageDirectory} COMPONENT library)
   foreach(folder IN LISTS ARGN)
-    set(excluded ${orvPrivateHeaders})
-    list(TRANSFORM excluded REPLACE ".*/(.*)" "PATTERN;\\1;EXCLUDE")
-    install(DIRECTORY ${PROJECT_SOURCE_DIR}/${folder} COMPONENT library
-      DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/orv
-      FILES_MATCHING PATTERN "*.hpp" ${excluded})
+    install(DIRECTORY ${PROJECT_SOURCE_DIR}/${folder}/orv COMPONENT library
+      DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}
+      FILES_MATCHING PATTERN "*.hpp")
   endforeach()
 endfunction()
 
-orv_install(orv_messages orvMessagesTargets runtime messages)
+orv_install(orv_messages orvMessagesTargets
+  runtime messages/core messages/connection messages/join messages/group messages)
 if(TARGET orv_json)
   orv_install(orv_json orvJsonTargets json)
 endif()
@@ -41,7 +37,6 @@ install(FILES ${PROJECT_BINARY_DIR}/orvConfig.cmake ${PROJECT_BINARY_DIR}/orvCon
 if(ORV_BUILD_TESTS)
   add_test(NAME Build.AnInstalledLibraryServesItsUsers
     COMMAND ${CMAKE_COMMAND} -DBUILD=${PROJECT_BINARY_DIR} -DCONSUMER=${PROJECT_SOURCE_DIR}/examples/custom
-      "-DPRIVATE_HEADERS=${orvPrivateHeaders}"
       -DGENERATOR=${CMAKE_GENERATOR} -DCOMPILER=${CMAKE_CXX_COMPILER} "-DFLAGS=${CMAKE_CXX_FLAGS}"
       -P ${PROJECT_SOURCE_DIR}/cmake/test_installation.cmake)
   set_tests_properties(Build.AnInstalledLibraryServesItsUsers PROPERTIES TIMEOUT 600)

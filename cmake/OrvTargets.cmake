@@ -10,9 +10,6 @@ set(CMAKE_POSITION_INDEPENDENT_CODE ON)
 if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
   set(CMAKE_BUILD_TYPE RelWithDebInfo)
 endif()
-# The optimisation that the figures in docs/performance.md are measured at.
-string(REPLACE "-O3" "-O2" CMAKE_CXX_FLAGS_RELEASE "${CMAKE_CXX_FLAGS_RELEASE}")
-
 find_package(PkgConfig REQUIRED)
 pkg_check_modules(PROTOBUF_LITE REQUIRED IMPORTED_TARGET protobuf-lite)
 pkg_check_modules(UTF8PROC REQUIRED IMPORTED_TARGET libutf8proc)
@@ -25,4 +22,23 @@ function(orv_warnings target)
   if(PROJECT_IS_TOP_LEVEL)
     target_compile_options(${target} PRIVATE -Werror)
   endif()
+endfunction()
+
+# A layer of the library: the folder `name` beside the calling CMakeLists.txt (or that folder itself), whose
+# headers are the `orv` folder in it. It sees its own headers and those of the layers that it uses, no others,
+# so that an include that turns an arrow does not compile.
+function(orv_layer name)
+  cmake_parse_arguments(PARSE_ARGV 1 layer "" "" "USES;SOURCES")
+  set(folder ${CMAKE_CURRENT_SOURCE_DIR})
+  if(IS_DIRECTORY ${folder}/${name})
+    string(APPEND folder /${name})
+  endif()
+  add_library(orv_${name} OBJECT ${layer_SOURCES})
+  set_target_properties(orv_${name} PROPERTIES ORV_FOLDER ${folder})
+  orv_warnings(orv_${name})
+  target_compile_options(orv_${name} PRIVATE -fno-exceptions -fno-rtti)
+  target_compile_features(orv_${name} PUBLIC cxx_std_23)
+  target_include_directories(orv_${name} PUBLIC ${folder})
+  list(TRANSFORM layer_USES PREPEND orv_)
+  target_link_libraries(orv_${name} PUBLIC ${layer_USES})
 endfunction()

@@ -2,7 +2,7 @@
 #include <cstdint>
 #include <cstdlib>
 
-#include "runtime/text.hpp"
+#include <orv/text.hpp>
 #include "tests/testing/normal_form.hpp"
 
 namespace {

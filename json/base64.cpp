@@ -1,4 +1,4 @@
-#include "json/base64.hpp"
+#include <orv/json/base64.hpp>
 
 #include <array>
 #include <cstddef>

@@ -1,4 +1,4 @@
-#include "json/document.hpp"
+#include <orv/json/document.hpp>
 
 #include <array>
 #include <cassert>
@@ -6,7 +6,7 @@
 #include <limits>
 #include <utility>
 
-#include "json/document_builder.hpp"
+#include "document_builder.hpp"
 
 namespace orv::json {
 

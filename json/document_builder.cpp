@@ -1,9 +1,9 @@
-#include "json/document_builder.hpp"
+#include "document_builder.hpp"
 
 #include <algorithm>
 #include <utility>
 
-#include "json/document.hpp"
+#include <orv/json/document.hpp>
 
 namespace orv::json {
 

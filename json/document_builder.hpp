@@ -10,7 +10,7 @@
 #include <unordered_set>
 #include <vector>
 
-#include "json/error.hpp"
+#include <orv/json/error.hpp>
 
 namespace orv::json {
 

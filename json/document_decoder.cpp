@@ -1,10 +1,10 @@
-#include "json/document_decoder.hpp"
+#include <orv/json/document_decoder.hpp>
 
 #include <charconv>
 #include <limits>
 
-#include "json/base64.hpp"
-#include "json/nearest_name.hpp"
+#include <orv/json/base64.hpp>
+#include <orv/json/nearest_name.hpp>
 
 namespace orv::json {
 

@@ -1,4 +1,4 @@
-#include "json/error.hpp"
+#include <orv/json/error.hpp>
 
 #include <algorithm>
 

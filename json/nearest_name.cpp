@@ -1,4 +1,4 @@
-#include "json/nearest_name.hpp"
+#include <orv/json/nearest_name.hpp>
 
 #include <algorithm>
 #include <cstddef>

@@ -1,10 +1,10 @@
-#include "json/renderer.hpp"
+#include <orv/json/renderer.hpp>
 
 #include <array>
 
-#include "json/base64.hpp"
-#include "runtime/utf8.hpp"
-#include "runtime/wire_reader.hpp"
+#include <orv/json/base64.hpp>
+#include <orv/utf8.hpp>
+#include <orv/wire_reader.hpp>
 
 namespace orv::json {
 

@@ -1,4 +1,4 @@
-#include "runtime/binary_decoder.hpp"
+#include <orv/binary_decoder.hpp>
 
 namespace orv {
 

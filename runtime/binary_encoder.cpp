@@ -1,4 +1,4 @@
-#include "runtime/binary_encoder.hpp"
+#include <orv/binary_encoder.hpp>
 
 #include <google/protobuf/io/coded_stream.h>
 

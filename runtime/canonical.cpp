@@ -1,4 +1,4 @@
-#include "runtime/canonical.hpp"
+#include "canonical.hpp"
 
 #include <utf8proc.h>
 
@@ -8,7 +8,7 @@
 #include <numeric>
 #include <span>
 
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 
 namespace orv {
 

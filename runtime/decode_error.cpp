@@ -1,4 +1,4 @@
-#include "runtime/decode_error.hpp"
+#include <orv/decode_error.hpp>
 
 #include <algorithm>
 
@@ -31,9 +31,9 @@ std::string_view describe(DecodeCause cause) { return sentences[static_cast<std:
 std::string FieldPath::text() const {
   if (isEmpty()) return {};
   std::string text(outermost_->fullName);
-  const MessageFacts* message = outermost_;
+  const MessageDescriptor* message = outermost_;
   for (std::size_t at = 0; at < size_ && numbers_[at] != 0; ++at) {
-    const FieldFacts* const field = message != nullptr ? message->field(numbers_[at]) : nullptr;
+    const FieldDescriptor* const field = message != nullptr ? message->field(numbers_[at]) : nullptr;
     text += '.';
     text += field != nullptr ? field->name : std::to_string(numbers_[at]);
     message = field != nullptr ? field->message : nullptr;

@@ -1,4 +1,4 @@
-#include "runtime/delimited_stream.hpp"
+#include <orv/delimited_stream.hpp>
 
 #include <google/protobuf/io/coded_stream.h>
 #include <google/protobuf/io/zero_copy_stream_impl_lite.h>

@@ -1,4 +1,4 @@
-#include "runtime/hasher.hpp"
+#include <orv/hasher.hpp>
 
 #define XXH_INLINE_ALL
 #include <xxhash.h>

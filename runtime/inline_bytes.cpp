@@ -1,4 +1,4 @@
-#include "runtime/inline_bytes.hpp"
+#include <orv/internal/inline_bytes.hpp>
 
 #include <algorithm>
 #include <new>

@@ -1,11 +1,11 @@
-#include "runtime/text.hpp"
+#include <orv/text.hpp>
 
 #include <algorithm>
 #include <string>
 #include <vector>
 
-#include "runtime/canonical.hpp"
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
+#include "canonical.hpp"
 
 namespace orv {
 

@@ -1,4 +1,4 @@
-#include "runtime/text_renderer.hpp"
+#include <orv/text_renderer.hpp>
 
 #include <google/protobuf/io/coded_stream.h>
 

@@ -1,4 +1,4 @@
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 
 #include <bit>
 

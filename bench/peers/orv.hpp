@@ -8,8 +8,8 @@
 #include <string_view>
 #include <tuple>
 
+#include <orv/all_messages.hpp>
 #include "bench/workloads/workloads.hpp"
-#include "messages/all_messages.hpp"
 
 namespace bench {
 

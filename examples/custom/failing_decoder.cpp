@@ -8,8 +8,8 @@
 #include <utility>
 #include <vector>
 
-#include "messages/group/group.hpp"
-#include "runtime/decoder.hpp"
+#include <orv/decoder.hpp>
+#include <orv/group.hpp>
 #include "word_decoder.hpp"
 
 namespace {

@@ -2,7 +2,7 @@
 #include <cstdio>
 #include <string_view>
 
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
 
 int main() {
   // Changing a field in place makes it present, so a nested message is simply written to.

@@ -6,7 +6,7 @@
 #include <expected>
 #include <string>
 
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
 
 namespace {
 

@@ -7,9 +7,9 @@
 #include <utility>
 #include <vector>
 
-#include "messages/group/group.hpp"
-#include "runtime/name_map.hpp"
-#include "runtime/visitor.hpp"
+#include <orv/group.hpp>
+#include <orv/name_map.hpp>
+#include <orv/visitor.hpp>
 
 namespace {
 

@@ -11,8 +11,8 @@
 #include <utility>
 #include <vector>
 
-#include "runtime/byte_buffer.hpp"
-#include "runtime/text.hpp"
+#include <orv/byte_buffer.hpp>
+#include <orv/text.hpp>
 
 namespace words {
 

@@ -5,7 +5,7 @@
 
 #include <string_view>
 
-#include "runtime/delimited_stream.hpp"
+#include <orv/delimited_stream.hpp>
 
 namespace invitation {
 

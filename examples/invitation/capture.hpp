@@ -5,9 +5,9 @@
 #include <string>
 #include <utility>
 
+#include <orv/session_message.hpp>
 #include "examples/invitation/outcome.hpp"
 #include "examples/invitation/socket.hpp"
-#include "messages/core/session_message.hpp"
 
 namespace invitation {
 

@@ -7,12 +7,12 @@
 #include <utility>
 #include <variant>
 
+#include <orv/delimited_stream.hpp>
 #include "examples/invitation/capture.hpp"
 #include "examples/invitation/narrator.hpp"
 #include "examples/invitation/outcome.hpp"
 #include "examples/invitation/payload.hpp"
 #include "examples/invitation/socket.hpp"
-#include "runtime/delimited_stream.hpp"
 
 namespace invitation {
 

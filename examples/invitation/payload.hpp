@@ -7,13 +7,13 @@
 #include <utility>
 #include <variant>
 
+#include <orv/connection_request.hpp>
+#include <orv/connection_response.hpp>
+#include <orv/group.hpp>
+#include <orv/join_request.hpp>
+#include <orv/join_response.hpp>
+#include <orv/session_message.hpp>
 #include "examples/invitation/outcome.hpp"
-#include "messages/connection/connection_request.hpp"
-#include "messages/connection/connection_response.hpp"
-#include "messages/core/session_message.hpp"
-#include "messages/group/group.hpp"
-#include "messages/join/join_request.hpp"
-#include "messages/join/join_response.hpp"
 
 namespace invitation {
 

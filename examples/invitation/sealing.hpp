@@ -8,8 +8,8 @@
 #include <string>
 #include <string_view>
 
+#include <orv/byte_buffer.hpp>
 #include "examples/invitation/outcome.hpp"
-#include "runtime/byte_buffer.hpp"
 
 namespace invitation {
 

@@ -5,11 +5,11 @@
 #include <string_view>
 #include <vector>
 
-#include "messages/connection/connection_request.hpp"
-#include "messages/connection/connection_response.hpp"
-#include "messages/group/group.hpp"
-#include "messages/join/join_request.hpp"
-#include "messages/join/join_response.hpp"
+#include <orv/connection_request.hpp>
+#include <orv/connection_response.hpp>
+#include <orv/group.hpp>
+#include <orv/join_request.hpp>
+#include <orv/join_response.hpp>
 
 namespace invitation::story {
 

@@ -1,6 +1,6 @@
-#include "messages/connection/connection_request.hpp"
+#include <orv/connection_request.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

@@ -1,6 +1,6 @@
-#include "messages/connection/connection_response.hpp"
+#include <orv/connection_response.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

@@ -1,6 +1,6 @@
-#include "messages/core/session_message.hpp"
+#include <orv/session_message.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

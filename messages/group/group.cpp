@@ -1,6 +1,6 @@
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

@@ -1,6 +1,6 @@
-#include "messages/group/member.hpp"
+#include <orv/member.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

@@ -1,6 +1,6 @@
-#include "messages/join/join_request.hpp"
+#include <orv/join_request.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

@@ -1,6 +1,6 @@
-#include "messages/join/join_response.hpp"
+#include <orv/join_response.hpp>
 
-#include "messages/core/built_in.hpp"
+#include <orv/instantiate.hpp>
 
 namespace orv {
 

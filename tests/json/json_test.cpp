@@ -1,11 +1,11 @@
 // What is read, what is refused and how it is said, and what is written.
-#include "json/json.hpp"
+#include <orv/json.hpp>
 
 #include <gtest/gtest.h>
 
 #include <string>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 #include "tests/testing/hex.hpp"
 
 namespace orv::test {

@@ -5,8 +5,8 @@
 #include <nlohmann/json.hpp>
 #include <string>
 
-#include "json/json.hpp"
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
+#include <orv/json.hpp>
 #include "tests/testing/official.hpp"
 #include "tests/testing/random.hpp"
 

@@ -4,7 +4,7 @@
 #include <concepts>
 #include <thread>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"

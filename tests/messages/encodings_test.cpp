@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/wire_cases.hpp"

@@ -1,7 +1,7 @@
 // Input that costs much where something is done in more than linear time or memory.
 #include <gtest/gtest.h>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 

@@ -7,7 +7,7 @@
 #include <fstream>
 #include <set>
 
-#include "messages/core/session_message.hpp"
+#include <orv/session_message.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
 

@@ -1,9 +1,9 @@
-#include "runtime/binary_encoder.hpp"
+#include <orv/binary_encoder.hpp>
 
 #include <gtest/gtest.h>
 #include <sys/mman.h>
 
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
 #include "tests/testing/hex.hpp"
 
 namespace orv::test {

@@ -1,7 +1,7 @@
 #include <gtest/gtest.h>
 
-#include "runtime/byte_buffer.hpp"
-#include "runtime/inline_bytes.hpp"
+#include <orv/byte_buffer.hpp>
+#include <orv/internal/inline_bytes.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 

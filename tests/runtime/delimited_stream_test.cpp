@@ -1,8 +1,8 @@
-#include "runtime/delimited_stream.hpp"
+#include <orv/delimited_stream.hpp>
 
 #include <gtest/gtest.h>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 

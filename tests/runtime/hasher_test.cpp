@@ -1,4 +1,4 @@
-#include "runtime/hasher.hpp"
+#include <orv/hasher.hpp>
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "runtime/text.hpp"
+#include <orv/text.hpp>
 
 #include <gtest/gtest.h>
 

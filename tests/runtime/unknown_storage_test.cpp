@@ -1,4 +1,4 @@
-#include "runtime/unknown_storage.hpp"
+#include <orv/unknown_storage.hpp>
 
 #include <gtest/gtest.h>
 

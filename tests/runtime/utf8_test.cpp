@@ -1,4 +1,4 @@
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 
 #include <gtest/gtest.h>
 #include <utf8proc.h>

@@ -1,4 +1,4 @@
-#include "runtime/wire_reader.hpp"
+#include <orv/wire_reader.hpp>
 
 #include <gtest/gtest.h>
 

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 
 namespace orv::test {
 

@@ -11,10 +11,10 @@
 #include <string_view>
 #include <vector>
 
-#include "runtime/decode_error.hpp"
-#include "runtime/encode_error.hpp"
-#include "runtime/name_map.hpp"
-#include "runtime/unknown_storage.hpp"
+#include <orv/decode_error.hpp>
+#include <orv/encode_error.hpp>
+#include <orv/name_map.hpp>
+#include <orv/unknown_storage.hpp>
 #include "tests/testing/scripted_decoder.hpp"
 
 namespace orv::test {

@@ -12,9 +12,9 @@
 #include <variant>
 #include <vector>
 
-#include "runtime/byte_buffer.hpp"
-#include "runtime/decoder.hpp"
-#include "runtime/text.hpp"
+#include <orv/byte_buffer.hpp>
+#include <orv/decoder.hpp>
+#include <orv/text.hpp>
 
 namespace orv::test {
 

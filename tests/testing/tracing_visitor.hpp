@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "runtime/visitor.hpp"
+#include <orv/visitor.hpp>
 #include "tests/testing/hex.hpp"
 
 namespace orv::test {

@@ -5,7 +5,7 @@
 #include <span>
 #include <string_view>
 
-#include "runtime/decode_error.hpp"
+#include <orv/decode_error.hpp>
 
 namespace orv::test {
 

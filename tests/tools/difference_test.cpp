@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
 #include "tests/testing/random.hpp"

@@ -1,6 +1,6 @@
 #include "tools/orv/byte_spelling.hpp"
 
-#include "json/base64.hpp"
+#include <orv/json/base64.hpp>
 
 namespace orv::tool {
 

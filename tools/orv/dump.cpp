@@ -4,7 +4,7 @@
 #include <array>
 #include <string>
 
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 #include "tools/orv/value_text.hpp"
 
 namespace orv::tool {

@@ -7,7 +7,7 @@
 #include <cstddef>
 #include <cstring>
 
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 
 namespace orv::tool {
 

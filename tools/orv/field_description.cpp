@@ -6,10 +6,10 @@
 #include <span>
 #include <utility>
 
-#include "runtime/byte_buffer.hpp"
-#include "runtime/name_map.hpp"
-#include "runtime/text.hpp"
-#include "runtime/visitor.hpp"
+#include <orv/byte_buffer.hpp>
+#include <orv/name_map.hpp>
+#include <orv/text.hpp>
+#include <orv/visitor.hpp>
 
 namespace orv::tool {
 

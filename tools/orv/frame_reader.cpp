@@ -3,7 +3,7 @@
 #include <array>
 #include <utility>
 
-#include "runtime/delimited_stream.hpp"
+#include <orv/delimited_stream.hpp>
 #include "tools/orv/byte_source.hpp"
 #include "tools/orv/text_stream.hpp"
 #include "tools/orv/value_text.hpp"

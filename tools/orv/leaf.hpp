@@ -9,12 +9,12 @@
 #include <variant>
 #include <vector>
 
-#include "messages/core/enumeration.hpp"
-#include "runtime/byte_buffer.hpp"
-#include "runtime/name_map.hpp"
-#include "runtime/text.hpp"
-#include "runtime/unknown_storage.hpp"
-#include "runtime/visitor.hpp"
+#include <orv/byte_buffer.hpp>
+#include <orv/enumeration.hpp>
+#include <orv/name_map.hpp>
+#include <orv/text.hpp>
+#include <orv/unknown_storage.hpp>
+#include <orv/visitor.hpp>
 
 namespace orv::tool {
 

@@ -6,7 +6,7 @@
 #include <span>
 #include <vector>
 
-#include "runtime/decode_error.hpp"
+#include <orv/decode_error.hpp>
 #include "tools/orv/message_type.hpp"
 
 namespace orv::tool {

@@ -3,7 +3,7 @@
 #include <span>
 #include <utility>
 
-#include "json/document.hpp"
+#include <orv/json/document.hpp>
 #include "tools/orv/text_form.hpp"
 
 namespace orv::tool {

@@ -2,8 +2,8 @@
 
 #include <utility>
 
-#include "json/base64.hpp"
-#include "runtime/delimited_stream.hpp"
+#include <orv/delimited_stream.hpp>
+#include <orv/json/base64.hpp>
 #include "tools/orv/text_stream.hpp"
 #include "tools/orv/value_text.hpp"
 

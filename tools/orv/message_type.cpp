@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <vector>
 
-#include "json/nearest_name.hpp"
+#include <orv/json/nearest_name.hpp>
 
 namespace orv::tool {
 

@@ -8,7 +8,7 @@
 #include <string>
 #include <string_view>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 
 namespace orv::tool {
 

@@ -8,10 +8,10 @@
 #include <string>
 #include <vector>
 
-#include "json/document.hpp"
-#include "json/renderer.hpp"
-#include "runtime/decode_error.hpp"
-#include "runtime/encode_error.hpp"
+#include <orv/decode_error.hpp>
+#include <orv/encode_error.hpp>
+#include <orv/json/document.hpp>
+#include <orv/json/renderer.hpp>
 #include "tools/orv/leaf.hpp"
 #include "tools/orv/message_type.hpp"
 #include "tools/orv/payload.hpp"

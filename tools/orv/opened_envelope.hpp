@@ -9,7 +9,7 @@
 #include <tuple>
 #include <utility>
 
-#include "messages/core/session_message.hpp"
+#include <orv/session_message.hpp>
 
 namespace orv::tool {
 

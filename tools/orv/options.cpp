@@ -10,7 +10,7 @@
 #include <memory>
 #include <string_view>
 
-#include "json/nearest_name.hpp"
+#include <orv/json/nearest_name.hpp>
 #include "tools/orv/command_line.hpp"
 #include "tools/orv/command_texts.hpp"
 #include "tools/orv/help.hpp"

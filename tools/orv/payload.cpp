@@ -3,8 +3,8 @@
 #include <charconv>
 #include <optional>
 
-#include "json/nearest_name.hpp"
-#include "runtime/wire_reader.hpp"
+#include <orv/json/nearest_name.hpp>
+#include <orv/wire_reader.hpp>
 
 namespace orv::tool {
 

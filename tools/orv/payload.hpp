@@ -9,7 +9,7 @@
 #include <string>
 #include <string_view>
 
-#include "messages/core/session_message.hpp"
+#include <orv/session_message.hpp>
 #include "tools/orv/message_type.hpp"
 
 namespace orv::tool {

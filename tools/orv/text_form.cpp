@@ -11,7 +11,7 @@
 #include <tuple>
 #include <utility>
 
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 #include "tools/orv/text_schema.hpp"
 
 namespace orv::tool {

@@ -2,7 +2,7 @@
 
 #include <cassert>
 
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 #include "tools/orv/tracing_decoder.hpp"
 
 namespace orv::tool {
@@ -99,7 +99,7 @@ std::expected<std::span<const std::byte>, TracingDecoder::Error> TracingDecoder:
 }
 
 void TracingDecoder::setPath(bool isRepeated) {
-  const FieldFacts* const field = message_->field(tag_.fieldNumber());
+  const FieldDescriptor* const field = message_->field(tag_.fieldNumber());
   path_ = prefix_;
   path_ += field != nullptr ? std::string(field->name) : std::to_string(tag_.fieldNumber());
   if (isRepeated) path_ += '[' + std::to_string(occurrences_[tag_.fieldNumber()]++) + ']';

@@ -7,8 +7,8 @@
 #include <span>
 #include <string_view>
 
-#include "runtime/decode_error.hpp"
-#include "runtime/wire_reader.hpp"
+#include <orv/decode_error.hpp>
+#include <orv/wire_reader.hpp>
 #include "tools/orv/message_type.hpp"
 
 namespace orv::tool {

@@ -11,10 +11,10 @@
 #include <string_view>
 #include <vector>
 
-#include "runtime/byte_buffer.hpp"
-#include "runtime/message_facts.hpp"
-#include "runtime/name_map.hpp"
-#include "runtime/text.hpp"
+#include <orv/byte_buffer.hpp>
+#include <orv/descriptor.hpp>
+#include <orv/name_map.hpp>
+#include <orv/text.hpp>
 #include "tools/orv/trace.hpp"
 
 namespace orv::tool {
@@ -33,7 +33,7 @@ class TracingDecoder {
 
   template <class M>
   std::expected<std::optional<std::uint32_t>, Error> nextFieldNumber(M&) {
-    message_ = &M::messageFacts();
+    message_ = &M::descriptor();
     return nextNumber();
   }
 
@@ -91,7 +91,7 @@ class TracingDecoder {
   WireReader reader_;
   TraceSink& sink_;
   int nesting_ = 0;
-  const MessageFacts* message_ = nullptr;
+  const MessageDescriptor* message_ = nullptr;
   const std::byte* recordStart_ = nullptr;
   const std::byte* valueStart_ =
       nullptr;  // of the field whose number was given last; nobody took it if it is next

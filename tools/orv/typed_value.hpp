@@ -7,7 +7,7 @@
 #include <utility>
 #include <vector>
 
-#include "json/json.hpp"
+#include <orv/json.hpp>
 #include "tools/orv/message_value.hpp"
 
 namespace orv::tool {

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "runtime/utf8.hpp"
+#include <orv/utf8.hpp>
 
 namespace orv::tool {
 

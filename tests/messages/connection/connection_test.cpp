@@ -1,7 +1,7 @@
 #include <gtest/gtest.h>
 
-#include "messages/connection/connection_request.hpp"
-#include "messages/connection/connection_response.hpp"
+#include <orv/connection_request.hpp>
+#include <orv/connection_response.hpp>
 #include "tests/testing/hex.hpp"
 
 namespace orv::test {

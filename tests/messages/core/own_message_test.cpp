@@ -2,8 +2,8 @@
 // oneof, a list of such, and a number of two bytes.
 #include <gtest/gtest.h>
 
-#include "messages/core/built_in.hpp"
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
+#include <orv/instantiate.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 

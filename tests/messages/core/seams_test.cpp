@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include "messages/all_messages.hpp"
+#include <orv/all_messages.hpp>
 #include "tests/testing/hex.hpp"
 #include "tests/testing/scripted_decoder.hpp"
 #include "tests/testing/tracing_visitor.hpp"

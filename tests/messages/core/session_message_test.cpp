@@ -1,4 +1,4 @@
-#include "messages/core/session_message.hpp"
+#include <orv/session_message.hpp>
 
 #include <gtest/gtest.h>
 

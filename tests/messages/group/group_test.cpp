@@ -1,4 +1,4 @@
-#include "messages/group/group.hpp"
+#include <orv/group.hpp>
 
 #include <gtest/gtest.h>
 

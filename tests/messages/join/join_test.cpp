@@ -1,7 +1,7 @@
 #include <gtest/gtest.h>
 
-#include "messages/join/join_request.hpp"
-#include "messages/join/join_response.hpp"
+#include <orv/join_request.hpp>
+#include <orv/join_response.hpp>
 #include "tests/testing/hex.hpp"
 
 namespace orv::test {

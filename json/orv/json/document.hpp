@@ -1,0 +1,73 @@
+// A parsed JSON document, without a word of the library that holds it.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <expected>
+#include <memory>
+#include <optional>
+#include <string_view>
+
+#include <orv/json/error.hpp>
+
+namespace orv::json {
+
+// A view of one value of a document, valid as long as the document.
+class Value {
+ public:
+  enum class Kind : std::uint8_t { null, boolean, number, text, list, object };
+
+  struct Member;
+
+  Kind kind() const;
+  // "a number", "null" and so on, for messages.
+  std::string_view kindName() const;
+
+  // What the kind allows: each asserts it.
+  bool boolean() const;
+  std::string_view text() const;
+  // None for a number with a fraction or beyond 64 bits; 5, 5.0 and 50e-1 are the same integer.
+  std::optional<std::int64_t> integer() const;
+
+  // How many items a list or members an object has, and which they are, in the document's order.
+  std::size_t size() const;
+  Value item(std::size_t index) const;
+  Member member(std::size_t index) const;
+  // None if the object has no such member. Looks at one after the other.
+  std::optional<Value> find(std::string_view name) const;
+
+ private:
+  friend class Document;
+  explicit Value(const void* node) : node_(node) {}
+
+  const void* node_;
+};
+
+struct Value::Member {
+  std::string_view name;
+  Value value;
+};
+
+// Owns the values.
+class Document {
+ public:
+  // Values nested more deeply are refused.
+  static constexpr std::size_t maximumNesting = 100;
+
+  // Takes a text that is one JSON value, whose objects have no two members of one name.
+  [[nodiscard]] static std::expected<Document, Error> parse(std::string_view text);
+
+  Document(Document&&) noexcept;
+  Document& operator=(Document&&) noexcept;
+  ~Document();
+
+  Value root() const;
+
+ private:
+  struct Contents;
+  explicit Document(std::unique_ptr<Contents> contents);
+
+  std::unique_ptr<Contents> contents_;
+};
+
+}  // namespace orv::json

@@ -1,0 +1,105 @@
+// A host's answer to a request to connect.
+#pragma once
+
+#include <optional>
+#include <string_view>
+#include <tuple>
+#include <utility>
+#include <variant>
+
+#include <orv/message.hpp>
+
+namespace orv {
+
+// The host's answer to a ConnectionRequest. It has no fields and gives its parts their names: the answer is a
+// Content, which is encoded as a message of its own.
+class ConnectionResponse final : public Message<ConnectionResponse> {
+ public:
+  // The answer itself: whom it is for, and the decision.
+  class Content final : public Message<Content> {
+   public:
+    // The payload of a denial, which has no fields.
+    class DeniedContent final : public Message<DeniedContent> {
+     public:
+      static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content.DeniedContent";
+
+      DeniedContent() noexcept {}
+
+     private:
+      friend Message;  // the rules read the table
+      static constexpr std::tuple<> fields{};
+    };
+
+    // The payload of an approval.
+    class ApprovalContent final : public Message<ApprovalContent> {
+     public:
+      static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content.ApprovalContent";
+
+      ApprovalContent() noexcept {}
+
+      // Bytes that the device needs to take part; what they hold is between the peers.
+      const ByteBuffer& invitationData() const { return invitationData_; }
+      ByteBuffer& mutableInvitationData() { return invitationData_; }
+      void setInvitationData(ByteBuffer value) { invitationData_ = std::move(value); }
+
+     private:
+      friend Message;  // the rules read the table
+      ByteBuffer invitationData_;
+
+      static constexpr std::tuple fields{
+          field<&ApprovalContent::invitationData_>(1, "invitationData"),
+      };
+    };
+
+    using OneOf_Operation = std::variant<DeniedContent, ApprovalContent>;
+
+    static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content";
+
+    Content() noexcept {}
+
+    const Text& identifier() const { return identifier_; }
+    Text& mutableIdentifier() { return identifier_; }
+    void setIdentifier(Text value) { identifier_ = std::move(value); }
+
+    const Text& handle() const { return handle_; }
+    Text& mutableHandle() { return handle_; }
+    void setHandle(Text value) { handle_ = std::move(value); }
+
+    // The decision as a whole: none, or one case with its payload.
+    const std::optional<OneOf_Operation>& operation() const { return operation_; }
+    std::optional<OneOf_Operation>& mutableOperation() { return operation_; }
+    void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
+
+    // A case reads as a default payload unless it is the one held; writing it replaces what was held.
+    const DeniedContent& denied() const { return caseOrDefault<DeniedContent>(operation_); }
+    DeniedContent& mutableDenied() { return presentCase<DeniedContent>(operation_); }
+    void setDenied(DeniedContent value) { operation_ = std::move(value); }
+
+    const ApprovalContent& approved() const { return caseOrDefault<ApprovalContent>(operation_); }
+    ApprovalContent& mutableApproved() { return presentCase<ApprovalContent>(operation_); }
+    void setApproved(ApprovalContent value) { operation_ = std::move(value); }
+
+   private:
+    friend Message;  // the rules read the table
+    Text identifier_;
+    Text handle_;
+    std::optional<OneOf_Operation> operation_;
+
+    static constexpr std::tuple fields{
+        field<&Content::identifier_>(1, "identifier"),
+        field<&Content::handle_>(2, "handle"),
+        field<&Content::operation_, DeniedContent>(3, "denied"),
+        field<&Content::operation_, ApprovalContent>(4, "approved"),
+    };
+  };
+
+  static constexpr std::string_view protoMessageName = "orv.ConnectionResponse";
+
+  ConnectionResponse() noexcept {}
+
+ private:
+  friend Message;  // the rules read the table
+  static constexpr std::tuple<> fields{};
+};
+
+}  // namespace orv

@@ -1,0 +1,42 @@
+// How accessors read and change fields that may be absent.
+#pragma once
+
+#include <optional>
+#include <utility>
+#include <variant>
+
+#include <orv/internal/presence.hpp>
+
+namespace orv {
+
+// What a getter gives for an absent field: one default value per type, made on first use and never freed.
+template <class T>
+const T& defaultInstance() {
+  static const T& instance = *new T();
+  return instance;
+}
+
+// Lives as long as the field is unchanged, or forever.
+template <class T>
+const T& valueOrDefault(const std::optional<T>& field) {
+  return field.has_value() ? *field : defaultInstance<T>();
+}
+
+// The payload if the oneof group holds this case, else the default.
+template <class Case, class... Cases>
+const Case& caseOrDefault(const std::optional<std::variant<Cases...>>& group) {
+  const Case* const held = group.has_value() ? std::get_if<Case>(&*group) : nullptr;
+  return held != nullptr ? *held : defaultInstance<Case>();
+}
+
+// The payload for change in place; a group that holds another case, or none, is switched to a default payload
+// of this.
+template <class Case, class... Cases>
+Case& presentCase(std::optional<std::variant<Cases...>>& group) {
+  if (group.has_value()) {
+    if (Case* const held = std::get_if<Case>(&*group)) return *held;
+  }
+  return std::get<Case>(group.emplace(std::in_place_type<Case>));
+}
+
+}  // namespace orv

@@ -1,0 +1,169 @@
+// The events of a session's group.
+#pragma once
+
+#include <optional>
+#include <string_view>
+#include <tuple>
+#include <utility>
+#include <variant>
+#include <vector>
+
+#include <orv/member.hpp>
+#include <orv/message.hpp>
+
+namespace orv {
+
+// One event of a group's membership. Every event names the group by its UUID, whose bytes are not looked
+// into.
+class Group final : public Message<Group> {
+ public:
+  // The membership as a whole.
+  class Initialization final : public Message<Initialization> {
+   public:
+    static constexpr std::string_view protoMessageName = "orv.Group.Initialization";
+
+    Initialization() noexcept {}
+
+    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
+    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
+
+    // In the order given; duplicates are kept.
+    const std::vector<Member>& members() const { return members_; }
+    std::vector<Member>& mutableMembers() { return members_; }
+    void setMembers(std::vector<Member> value) { members_ = std::move(value); }
+
+   private:
+    friend Message;  // the rules read the table
+    ByteBuffer groupUuid_;
+    std::vector<Member> members_;
+
+    static constexpr std::tuple fields{
+        field<&Initialization::groupUuid_>(1, "groupUUID"),
+        field<&Initialization::members_>(2, "members"),
+    };
+  };
+
+  // A member was added to the group.
+  class MemberAdded final : public Message<MemberAdded> {
+   public:
+    static constexpr std::string_view protoMessageName = "orv.Group.MemberAdded";
+
+    MemberAdded() noexcept {}
+
+    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
+    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
+
+    const Member& member() const { return valueOrDefault(member_); }
+    Member& mutableMember() { return presentValue(member_); }
+    void setMember(Member value) { member_ = std::move(value); }
+    bool hasMember() const { return member_.has_value(); }
+    void clearMember() { member_.reset(); }
+
+   private:
+    friend Message;  // the rules read the table
+    ByteBuffer groupUuid_;
+    std::optional<Member> member_;
+
+    static constexpr std::tuple fields{
+        field<&MemberAdded::groupUuid_>(1, "groupUUID"),
+        field<&MemberAdded::member_>(2, "member"),
+    };
+  };
+
+  // A member was removed from the group.
+  class MemberRemoved final : public Message<MemberRemoved> {
+   public:
+    static constexpr std::string_view protoMessageName = "orv.Group.MemberRemoved";
+
+    MemberRemoved() noexcept {}
+
+    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
+    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
+
+    const Member& member() const { return valueOrDefault(member_); }
+    Member& mutableMember() { return presentValue(member_); }
+    void setMember(Member value) { member_ = std::move(value); }
+    bool hasMember() const { return member_.has_value(); }
+    void clearMember() { member_.reset(); }
+
+   private:
+    friend Message;  // the rules read the table
+    ByteBuffer groupUuid_;
+    std::optional<Member> member_;
+
+    static constexpr std::tuple fields{
+        field<&MemberRemoved::groupUuid_>(1, "groupUUID"),
+        field<&MemberRemoved::member_>(2, "member"),
+    };
+  };
+
+  // A member left the group of its own accord. The event does not name the member.
+  class MemberLeft final : public Message<MemberLeft> {
+   public:
+    static constexpr std::string_view protoMessageName = "orv.Group.MemberLeft";
+
+    MemberLeft() noexcept {}
+
+    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
+    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
+
+    bool usesToken() const { return usesToken_; }
+    bool& mutableUsesToken() { return usesToken_; }
+    void setUsesToken(bool value) { usesToken_ = value; }
+
+   private:
+    friend Message;  // the rules read the table
+    ByteBuffer groupUuid_;
+    bool usesToken_ = false;
+
+    static constexpr std::tuple fields{
+        field<&MemberLeft::groupUuid_>(1, "groupUUID"),
+        field<&MemberLeft::usesToken_>(2, "usesToken"),
+    };
+  };
+
+  using OneOf_Event = std::variant<Initialization, MemberAdded, MemberRemoved, MemberLeft>;
+
+  static constexpr std::string_view protoMessageName = "orv.Group";
+
+  Group() noexcept {}
+
+  // The event as a whole: none, or one case with its payload.
+  const std::optional<OneOf_Event>& event() const { return event_; }
+  std::optional<OneOf_Event>& mutableEvent() { return event_; }
+  void setEvent(std::optional<OneOf_Event> value) { event_ = std::move(value); }
+
+  // A case reads as a default payload unless it is the one held; writing it replaces what was held.
+  const Initialization& initialize() const { return caseOrDefault<Initialization>(event_); }
+  Initialization& mutableInitialize() { return presentCase<Initialization>(event_); }
+  void setInitialize(Initialization value) { event_ = std::move(value); }
+
+  const MemberAdded& memberAdded() const { return caseOrDefault<MemberAdded>(event_); }
+  MemberAdded& mutableMemberAdded() { return presentCase<MemberAdded>(event_); }
+  void setMemberAdded(MemberAdded value) { event_ = std::move(value); }
+
+  const MemberRemoved& memberRemoved() const { return caseOrDefault<MemberRemoved>(event_); }
+  MemberRemoved& mutableMemberRemoved() { return presentCase<MemberRemoved>(event_); }
+  void setMemberRemoved(MemberRemoved value) { event_ = std::move(value); }
+
+  const MemberLeft& memberLeft() const { return caseOrDefault<MemberLeft>(event_); }
+  MemberLeft& mutableMemberLeft() { return presentCase<MemberLeft>(event_); }
+  void setMemberLeft(MemberLeft value) { event_ = std::move(value); }
+
+ private:
+  friend Message;  // the rules read the table
+  std::optional<OneOf_Event> event_;
+
+  static constexpr std::tuple fields{
+      field<&Group::event_, Initialization>(1, "initialize"),
+      field<&Group::event_, MemberAdded>(2, "memberAdded"),
+      field<&Group::event_, MemberRemoved>(3, "memberRemoved"),
+      field<&Group::event_, MemberLeft>(4, "memberLeft"),
+  };
+};
+
+}  // namespace orv

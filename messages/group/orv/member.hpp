@@ -1,0 +1,43 @@
+// A member of a session's group.
+#pragma once
+
+#include <optional>
+#include <string_view>
+#include <tuple>
+#include <utility>
+
+#include <orv/message.hpp>
+
+namespace orv {
+
+// Someone who belongs to a group.
+class Member final : public Message<Member> {
+ public:
+  static constexpr std::string_view protoMessageName = "orv.Member";
+
+  Member() noexcept {}
+
+  // How the member is addressed.
+  const Text& handle() const { return handle_; }
+  Text& mutableHandle() { return handle_; }
+  void setHandle(Text value) { handle_ = std::move(value); }
+
+  // The token that the member joined with, if any. Changing it in place makes it present.
+  const Text& tokenID() const { return valueOrDefault(tokenID_); }
+  Text& mutableTokenID() { return presentValue(tokenID_); }
+  void setTokenID(Text value) { tokenID_ = std::move(value); }
+  bool hasTokenID() const { return tokenID_.has_value(); }
+  void clearTokenID() { tokenID_.reset(); }
+
+ private:
+  friend Message;  // the rules read the table
+  Text handle_;
+  std::optional<Text> tokenID_;
+
+  static constexpr std::tuple fields{
+      field<&Member::handle_>(1, "handle"),
+      field<&Member::tokenID_>(2, "tokenID"),
+  };
+};
+
+}  // namespace orv

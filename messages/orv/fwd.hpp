@@ -1,0 +1,25 @@
+// Declarations of what the library's headers define.
+#pragma once
+
+namespace orv {
+
+class Text;
+class ByteBuffer;
+class UnknownStorage;
+class Hasher;
+class NameMap;
+
+class BinaryDecoder;
+class BinaryEncoder;
+class DelimitedReader;
+
+class VessaSessionMessageType;
+class SessionMessage;
+class ConnectionRequest;
+class ConnectionResponse;
+class JoinRequest;
+class JoinResponse;
+class Member;
+class Group;
+
+}  // namespace orv

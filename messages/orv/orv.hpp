@@ -1,0 +1,7 @@
+// Everything of the library but its components, which have headers of their own (<orv/json.hpp>).
+#pragma once
+
+#include <orv/all_messages.hpp>
+#include <orv/binary_decoder.hpp>
+#include <orv/binary_encoder.hpp>
+#include <orv/delimited_stream.hpp>

@@ -1,0 +1,45 @@
+// Who decides when a second member of a oneof arrives.
+#pragma once
+
+#include <concepts>
+#include <expected>
+#include <memory>
+#include <type_traits>
+
+#include <orv/decode_error.hpp>
+
+namespace orv {
+
+// What a BinaryDecoder asks when a oneof member arrives while its group already holds a case. It is asked,
+// too, when the record of the case that is held has another wire type and changes nothing. It refers to a
+// callable object that returns std::expected<void, DecodeError>, throws nothing and outlives it. An error
+// refuses the member and ends the decoding; it reaches the caller as it was made.
+class ConflictHook {
+ public:
+  // Accepts: the member read last wins.
+  constexpr ConflictHook() = default;
+
+  template <class Callable>
+  requires(std::is_object_v<Callable> && !std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
+           std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
+      ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
+      // NOLINTNEXTLINE(cppcoreguidelines-pro-type-const-cast): it is given back its type
+      : callable_(const_cast<std::remove_const_t<Callable>*>(std::addressof(callable))),
+        call_([](void* target) -> std::expected<void, DecodeError> {
+          return (*static_cast<Callable*>(target))();
+        }) {}
+
+  // Whether there is anybody to ask.
+  bool isSet() const { return call_ != nullptr; }
+
+  std::expected<void, DecodeError> operator()() const {
+    if (call_ == nullptr) return {};
+    return call_(callable_);
+  }
+
+ private:
+  void* callable_ = nullptr;
+  std::expected<void, DecodeError> (*call_)(void*) = nullptr;
+};
+
+}  // namespace orv

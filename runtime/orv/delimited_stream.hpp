@@ -1,0 +1,102 @@
+// Streams of messages, each behind its length as a varint.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <expected>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <utility>
+
+#include <orv/decode_error.hpp>
+#include <orv/encode_error.hpp>
+
+namespace orv {
+
+// Fills the front of a buffer from a file, a socket or the like. Answers how many bytes it put there, 0 at
+// the end of the stream, and a negative number when reading failed. It may give fewer bytes than there is
+// room for, and throws nothing.
+using ReadFunction = std::move_only_function<std::ptrdiff_t(std::span<std::byte>)>;
+
+// Why no message could be read from a stream.
+struct StreamError {
+  enum class Cause : std::uint8_t {
+    readFailed,        // the read function said so
+    truncated,         // the stream ends inside a length or a message
+    malformedLength,   // a length of 2^31 or more, or spelled in more than five bytes
+    tooLarge,          // a length above the reader's limit
+    malformedMessage,  // decodeError says why
+  };
+
+  Cause cause;
+  // Where in the stream the piece begins that could not be read.
+  std::uint64_t offset = 0;
+  // For tooLarge: the length that the stream announces.
+  std::uint64_t length = 0;
+  // For malformedMessage; its own offset counts from the message's first byte.
+  std::optional<DecodeError> decodeError{};
+
+  // What is wrong, without path and offset: "the stream ends inside a message".
+  std::string reason() const;
+  // All of it: "the stream ends inside a message, at byte 12".
+  std::string message() const;
+
+  friend bool operator==(const StreamError&, const StreamError&) = default;
+};
+
+// Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
+// are announced. A malformed message is passed over; after any other error the stream ends with that error,
+// again and again.
+class DelimitedReader {
+ public:
+  static constexpr std::size_t defaultMaximumSize = std::size_t{64} << 20;
+
+  explicit DelimitedReader(ReadFunction read, std::size_t maximumSizeInBytes = defaultMaximumSize);
+  DelimitedReader(DelimitedReader&&) noexcept;
+  DelimitedReader& operator=(DelimitedReader&&) noexcept;
+  ~DelimitedReader();
+
+  // The next message's bytes, which are valid until the next call; none where the stream ends between two
+  // messages.
+  [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
+
+  // As next, decoded.
+  template <class M>
+  [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
+    const auto bytes = next();
+    if (!bytes) return std::unexpected(bytes.error());
+    if (!bytes->has_value()) return std::nullopt;
+    auto message = M::parse(**bytes);
+    if (!message) return std::unexpected(malformedMessage(message.error()));
+    return std::move(*message);
+  }
+
+  // Where in the stream the message that was read last begins, behind its length.
+  std::uint64_t messageOffset() const;
+
+ private:
+  class Source;
+
+  StreamError malformedMessage(const DecodeError& error) const;
+
+  std::unique_ptr<Source> source_;
+};
+
+// Appends a length and as many bytes.
+void appendDelimited(std::string_view bytes, std::string& output);
+
+// Appends a message behind its length.
+template <class M>
+requires requires(const M& message) { message.serialize(); }
+[[nodiscard]] std::expected<void, EncodeError> appendDelimited(const M& message, std::string& output) {
+  const auto bytes = message.serialize();
+  if (!bytes) return std::unexpected(bytes.error());
+  appendDelimited(std::string_view(*bytes), output);
+  return {};
+}
+
+}  // namespace orv

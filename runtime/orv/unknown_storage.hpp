@@ -1,0 +1,106 @@
+// The fields that were read but that a message does not define.
+#pragma once
+
+#include <cstddef>
+#include <expected>
+#include <iterator>
+#include <span>
+#include <utility>
+
+#include <orv/decode_error.hpp>
+#include <orv/wire_reader.hpp>
+
+namespace orv {
+
+// One kept field. The spans are valid as long as the store that they come from is unchanged.
+struct UnknownField {
+  Tag tag;
+  std::span<const std::byte> record;  // as it came: tag, length and overlong spellings included
+  std::span<const std::byte> value;   // what follows the tag
+};
+
+// Kept records, byte for byte as they came, in the order of their arrival. Owns one heap block, and none
+// while it is empty; an empty store is one pointer wide.
+class UnknownStorage {
+ public:
+  constexpr UnknownStorage() noexcept = default;
+  UnknownStorage(const UnknownStorage& other) {
+    if (!other.isEmpty()) append(other.records());
+  }
+  UnknownStorage(UnknownStorage&& other) noexcept : block_(other.block_) { other.block_ = nullptr; }
+  UnknownStorage& operator=(UnknownStorage other) noexcept {
+    std::swap(block_, other.block_);
+    return *this;
+  }
+  constexpr ~UnknownStorage() {
+    if (block_ != nullptr) freeBlock();
+  }
+
+  // Takes a sequence of records, which must be well-formed: this is how a program sets unknown fields itself.
+  // Groups may be nested 100 deep here; in a message that is itself nested n deep, only 100-n of them are
+  // read again.
+  [[nodiscard]] static std::expected<UnknownStorage, DecodeError> checked(std::span<const std::byte> records);
+
+  bool isEmpty() const { return block_ == nullptr; }
+  std::span<const std::byte> records() const {
+    return isEmpty() ? std::span<const std::byte>() : std::span<const std::byte>(bytes(), block_->size);
+  }
+
+  // Walks the fields one by one: for (const UnknownField& field : store).
+  class Iterator;
+  Iterator begin() const;
+  std::default_sentinel_t end() const { return {}; }
+
+  // Hands the kept records to the visitor, if there are any.
+  template <class Visitor>
+  std::expected<void, typename Visitor::Error> traverse(Visitor& visitor) const {
+    if (isEmpty()) [[likely]]
+      return {};
+    return visitor.visitUnknownFields(*this);
+  }
+
+  friend bool operator==(const UnknownStorage& left, const UnknownStorage& right) {
+    if (left.isEmpty() || right.isEmpty()) return left.block_ == right.block_;
+    return left.hasSameRecords(right);
+  }
+
+  // For decoders: adds records, which must be well-formed.
+  void append(std::span<const std::byte> records);
+
+ private:
+  // Stands at the start of the heap block; the records follow it.
+  struct Block {
+    std::size_t size;
+    std::size_t capacity;
+  };
+
+  std::byte* bytes() const { return reinterpret_cast<std::byte*>(block_ + 1); }
+  bool hasSameRecords(const UnknownStorage& other) const;
+  void freeBlock() noexcept;
+
+  Block* block_ = nullptr;
+};
+
+class UnknownStorage::Iterator {
+ public:
+  using difference_type = std::ptrdiff_t;
+  using value_type = UnknownField;
+
+  Iterator() = default;
+  explicit Iterator(std::span<const std::byte> records) : reader_(records) { ++*this; }
+
+  const UnknownField& operator*() const { return field_; }
+  const UnknownField* operator->() const { return &field_; }
+  Iterator& operator++();
+  void operator++(int) { ++*this; }
+  friend bool operator==(const Iterator& iterator, std::default_sentinel_t) { return iterator.isAtEnd_; }
+
+ private:
+  WireReader reader_;
+  UnknownField field_{};
+  bool isAtEnd_ = false;
+};
+
+inline UnknownStorage::Iterator UnknownStorage::begin() const { return Iterator(records()); }
+
+}  // namespace orv

@@ -1,0 +1,133 @@
+// Reads the pieces of the binary format, strictly, from bytes that lie in one stretch of memory.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <expected>
+#include <span>
+
+#include <orv/decode_error.hpp>
+
+namespace orv {
+
+// Nesting of messages and groups that is still read.
+inline constexpr int maximumNesting = 100;
+
+enum class WireType : std::uint8_t {
+  varint = 0,
+  fixed64 = 1,
+  lengthDelimited = 2,
+  startGroup = 3,
+  endGroup = 4,
+  fixed32 = 5,
+};
+
+// A field number, 1 to 2^29-1, and a wire type, which may be one of the reserved 6 and 7.
+struct Tag {
+  std::uint32_t value;
+
+  constexpr std::uint32_t fieldNumber() const { return value >> 3; }
+  constexpr WireType wireType() const { return static_cast<WireType>(value & 7); }
+};
+
+// What a reader stumbled over. The pointer is into its input.
+struct WireFault {
+  DecodeCause cause;
+  const std::byte* at;
+  std::uint32_t length = 0;  // for lengthOverrun: the length, and by how many bytes it overruns
+  std::uint32_t detail = 0;
+};
+
+template <class T>
+using WireResult = std::expected<T, WireFault>;
+
+// A position in a stretch of bytes, which must outlive the reader. After a failed read the position is where
+// the piece begins that could not be read; after a failed skip it may be anywhere behind.
+class WireReader {
+ public:
+  WireReader() = default;
+  explicit WireReader(std::span<const std::byte> bytes)
+      : cursor_(bytes.data()), limit_(bytes.data() + bytes.size()) {}
+
+  bool isAtEnd() const { return cursor_ == limit_; }
+  const std::byte* position() const { return cursor_; }
+  std::size_t remaining() const { return static_cast<std::size_t>(limit_ - cursor_); }
+
+  // A tag of up to five bytes whose number is not 0.
+  [[nodiscard]] WireResult<Tag> readTag() {
+    if (const Tag tag = readShortTag(); tag.value != 0) [[likely]]
+      return tag;
+    return readLongTag();
+  }
+
+  // A varint of up to ten bytes. Bits above 2^64 in the tenth are dropped.
+  [[nodiscard]] WireResult<std::uint64_t> readVarint() {
+    if (cursor_ != limit_ && *cursor_ < std::byte{0x80}) [[likely]]
+      return std::to_integer<std::uint64_t>(*cursor_++);
+    return readLongVarint();
+  }
+
+  // A length below 2^31 in up to five bytes, and as many bytes, all of them there.
+  [[nodiscard]] WireResult<std::span<const std::byte>> readLengthDelimited() {
+    std::span<const std::byte> body;
+    if (readShortLengthDelimited(body)) [[likely]]
+      return body;
+    return readLongLengthDelimited();
+  }
+
+  // The common case of each, for readers in a hurry: a tag of one byte, a length of one or two bytes and all
+  // of its bytes there. Otherwise nothing is read, and the tag is 0.
+  Tag readShortTag() {
+    if (cursor_ == limit_) [[unlikely]]
+      return Tag{0};
+    const auto first = std::to_integer<std::uint32_t>(*cursor_);
+    if (first < 8 || first >= 0x80) [[unlikely]]
+      return Tag{0};
+    ++cursor_;
+    return Tag{first};
+  }
+  bool readShortLengthDelimited(std::span<const std::byte>& body) {
+    if (remaining() < 2) [[unlikely]]
+      return false;
+    auto length = std::to_integer<std::size_t>(cursor_[0]);
+    const std::byte* start = cursor_ + 1;
+    if (length >= 0x80) {
+      const auto second = std::to_integer<std::size_t>(cursor_[1]);
+      if (second >= 0x80) [[unlikely]]
+        return false;
+      length = (length & 0x7F) | second << 7;
+      ++start;
+    }
+    if (length > static_cast<std::size_t>(limit_ - start)) [[unlikely]]
+      return false;
+    body = std::span(start, length);
+    cursor_ = start + length;
+    return true;
+  }
+
+  // A little-endian number.
+  [[nodiscard]] WireResult<std::uint32_t> readFixed32();
+  [[nodiscard]] WireResult<std::uint64_t> readFixed64();
+
+  // Passes over the value behind the tag that was read at `tagStart`, a group with all that it holds
+  // included. `nesting` is how many messages and groups the value is already in.
+  [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
+
+  // How many whole length-delimited records with this tag, of one byte, follow, one behind the other, the
+  // length-delimited value that is next; at most `most`. Consumes nothing.
+  std::size_t countFollowing(Tag tag, std::size_t most) const;
+
+ private:
+  WireResult<Tag> readLongTag();
+  WireResult<std::uint64_t> readLongVarint();
+  WireResult<std::span<const std::byte>> readLongLengthDelimited();
+  WireResult<void> skipBytes(std::size_t count);
+  template <class Number>
+  WireResult<Number> readFixed();
+  WireResult<void> skipGroup(Tag start, const std::byte* tagStart, int nesting);
+
+  const std::byte* cursor_ = nullptr;
+  const std::byte* limit_ = nullptr;
+};
+
+}  // namespace orv
