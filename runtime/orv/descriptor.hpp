@@ -6,16 +6,32 @@
 #include <span>
 #include <string_view>
 
+#include <orv/name_map.hpp>
+
 namespace orv {
+
+// How a field is kept.
+enum class FieldKind : std::uint8_t {
+  implicitPresence,  // a plain value, left out when it is the default
+  explicitPresence,  // absent, or a value
+  singularMessage,   // absent, or a message
+  repeated,          // a list
+  oneofMember,       // one case of a oneof
+};
+
+// What a field's values are: each of its elements, for a list.
+enum class ValueType : std::uint8_t { string, bytes, boolean, uint32, enumeration, message };
 
 struct MessageDescriptor;
 
 struct FieldDescriptor {
   std::uint32_t number;
   std::string_view name;
-  const MessageDescriptor* message;  // the type of a nested message; none for other fields
-  bool isRepeated;
-  bool holdsOneof;  // is a member of a oneof, or its message has one
+  FieldKind kind;
+  ValueType type;
+  std::uint8_t oneof;                // of a oneof member: which of the message's oneofs, counted from 0
+  const MessageDescriptor* message;  // the type of a message; none for other values
+  NameMap cases;                     // the named cases of an enumeration; empty for other values
 };
 
 // One constant per message type; all that it refers to lasts as long as the program.
@@ -24,14 +40,17 @@ struct MessageDescriptor {
   std::span<const FieldDescriptor> fields;  // in ascending order of their numbers
 
   // Whether the message, or one nested in it, has a oneof.
-  constexpr bool holdsOneof() const { return std::ranges::any_of(fields, &FieldDescriptor::holdsOneof); }
+  constexpr bool holdsOneof() const {
+    return std::ranges::any_of(fields, [](const FieldDescriptor& field) {
+      return field.kind == FieldKind::oneofMember ||
+             (field.message != nullptr && field.message->holdsOneof());
+    });
+  }
 
   // None for a number that the message does not define.
   constexpr const FieldDescriptor* field(std::uint32_t number) const {
-    for (const FieldDescriptor& candidate : fields) {
-      if (candidate.number == number) return &candidate;
-    }
-    return nullptr;
+    const auto found = std::ranges::find(fields, number, &FieldDescriptor::number);
+    return found != fields.end() ? &*found : nullptr;
   }
 };
 

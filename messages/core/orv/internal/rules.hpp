@@ -180,17 +180,35 @@ inline constexpr bool isFirstCase = false;
 template <class Case, class... Others>
 inline constexpr bool isFirstCase<Case, std::optional<std::variant<Case, Others...>>> = true;
 
+template <class Value>
+constexpr ValueType valueTypeOf() {
+  if constexpr (std::same_as<Value, Text>) return ValueType::string;
+  if constexpr (std::same_as<Value, ByteBuffer>) return ValueType::bytes;
+  if constexpr (std::same_as<Value, bool>) return ValueType::boolean;
+  if constexpr (std::same_as<Value, std::uint32_t>) return ValueType::uint32;
+  if constexpr (AnyEnumeration<Value>) return ValueType::enumeration;
+  return ValueType::message;
+}
+
+template <class Storage, class Case>
+constexpr FieldKind kindOf() {
+  if constexpr (!std::is_void_v<Case>) return FieldKind::oneofMember;
+  if constexpr (StorageTraits<Storage>::isRepeated) return FieldKind::repeated;
+  if constexpr (AnyMessage<typename StorageTraits<Storage>::Value>) return FieldKind::singularMessage;
+  if constexpr (std::same_as<typename StorageTraits<Storage>::Value, Storage>)
+    return FieldKind::implicitPresence;
+  return FieldKind::explicitPresence;
+}
+
 template <auto pointer, class Case>
-constexpr FieldDescriptor descriptorOfRow(const Field<pointer, Case>& row) {
-  using Traits = StorageTraits<typename PointedTo<decltype(pointer)>::Type>;
-  using Value = std::conditional_t<std::is_void_v<Case>, typename Traits::Value, Case>;
-  constexpr bool isCase = !std::is_void_v<Case>;
-  if constexpr (AnyMessage<Value>) {
-    const MessageDescriptor& message = Value::descriptor();
-    return {row.number, row.name, &message, Traits::isRepeated, isCase || message.holdsOneof()};
-  } else {
-    return {row.number, row.name, nullptr, Traits::isRepeated, isCase};
-  }
+constexpr FieldDescriptor descriptorOfRow(const Field<pointer, Case>& row, std::uint8_t oneof) {
+  using Storage = typename PointedTo<decltype(pointer)>::Type;
+  using Value = std::conditional_t<std::is_void_v<Case>, typename StorageTraits<Storage>::Value, Case>;
+  FieldDescriptor field{row.number, row.name, kindOf<Storage, Case>(), valueTypeOf<Value>(), oneof,
+                        nullptr,    {}};
+  if constexpr (AnyMessage<Value>) field.message = &Value::descriptor();
+  if constexpr (AnyEnumeration<Value>) field.cases = Value::_protobuf_nameMap();
+  return field;
 }
 
 }  // namespace orv::rules
@@ -210,6 +228,23 @@ constexpr const MessageDescriptor& Message<M>::descriptor() {
 template <class M>
 template <class Complete>
 struct Message<M>::Constants {
+  // How many oneofs begin before the one that the row belongs to: each begins with its first case.
+  template <class C, auto pointer, class Case>
+  static constexpr std::uint8_t oneofIndex(const Field<pointer, Case>&) {
+    std::uint8_t begun = 0;
+    std::uint8_t index = 0;
+    const auto look = [&]<auto other, class OtherCase>(const Field<other, OtherCase>&) {
+      if constexpr (!std::is_void_v<OtherCase>) {
+        if (rules::isFirstCase<OtherCase, typename rules::PointedTo<decltype(other)>::Type>) ++begun;
+        if constexpr (std::is_same_v<std::integral_constant<decltype(pointer), pointer>,
+                                     std::integral_constant<decltype(other), other>>)
+          index = static_cast<std::uint8_t>(begun - 1);
+      }
+    };
+    std::apply([&](const auto&... rows) { (look(rows), ...); }, C::fields);
+    return index;
+  }
+
   static constexpr auto names = std::apply(
       [](const auto&... rows) {
         return std::array<NameMap::Entry, sizeof...(rows)>{NameMap::Entry{rows.number, rows.name}...};
@@ -217,7 +252,8 @@ struct Message<M>::Constants {
       Complete::fields);
   static constexpr auto fields = std::apply(
       [](const auto&... rows) {
-        return std::array<FieldDescriptor, sizeof...(rows)>{rules::descriptorOfRow(rows)...};
+        return std::array<FieldDescriptor, sizeof...(rows)>{
+            rules::descriptorOfRow(rows, oneofIndex<Complete>(rows))...};
       },
       Complete::fields);
   static constexpr MessageDescriptor descriptor{Complete::protoMessageName, fields};
