@@ -4,7 +4,7 @@
 #include <new>
 #include <string>
 
-namespace orv {
+namespace orv::internal {
 
 namespace {
 
@@ -68,4 +68,4 @@ void InlineBytes::copyBlock(std::string_view bytes) {
 
 void InlineBytes::freeBlock() noexcept { ::operator delete(heapBlock().data); }
 
-}  // namespace orv
+}  // namespace orv::internal

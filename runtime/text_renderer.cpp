@@ -62,11 +62,6 @@ std::string hexadecimal(Number value) {
 
 }  // namespace
 
-std::string TextRenderer::fieldName(std::uint32_t number) const {
-  const auto name = names_.name(number);
-  return name ? std::string(*name) : std::to_string(number);
-}
-
 // Unknown fields, read as the official printer reads them. What is kept is well-formed; bytes that only may
 // be a message are one in the library's own opinion, which is laxer than this one's: it is what makes the
 // text the same.

@@ -7,6 +7,12 @@
 namespace orv {
 
 std::expected<UnknownStorage, DecodeError> UnknownStorage::checked(std::span<const std::byte> records) {
+  UnknownStorage storage;
+  if (auto appended = storage.append(records); !appended) return std::unexpected(appended.error());
+  return storage;
+}
+
+std::expected<void, DecodeError> UnknownStorage::append(std::span<const std::byte> records) {
   WireReader reader(records);
   const auto error = [&](const WireFault& fault) {
     return std::unexpected(DecodeError{.cause = fault.cause,
@@ -20,17 +26,16 @@ std::expected<UnknownStorage, DecodeError> UnknownStorage::checked(std::span<con
     if (!tag) return error(tag.error());
     if (const auto skipped = reader.skipValue(*tag, tagStart, 0); !skipped) return error(skipped.error());
   }
-  UnknownStorage storage;
-  storage.append(records);
-  return storage;
+  appendRecords(records);
+  return {};
 }
 
-void UnknownStorage::append(std::span<const std::byte> records) {
+void UnknownStorage::appendRecords(std::span<const std::byte> records) {
   if (records.empty()) return;
   const std::size_t oldSize = this->records().size();
   const std::size_t size = oldSize + records.size();
-  if (!isEmpty() && size <= block_->capacity) {
-    std::memcpy(bytes() + oldSize, records.data(), records.size());
+  if (block_ != nullptr && size <= block_->capacity) {
+    std::memmove(bytes() + oldSize, records.data(), records.size());
     block_->size = size;
     return;
   }
@@ -39,9 +44,9 @@ void UnknownStorage::append(std::span<const std::byte> records) {
   auto* const larger = static_cast<Block*>(::operator new(sizeof(Block) + capacity));
   *larger = {size, capacity};
   auto* const target = reinterpret_cast<std::byte*>(larger + 1);
-  if (!isEmpty()) std::memcpy(target, bytes(), oldSize);
+  if (oldSize != 0) std::memcpy(target, bytes(), oldSize);
   std::memcpy(target + oldSize, records.data(), records.size());
-  freeBlock();
+  if (block_ != nullptr) freeBlock();
   block_ = larger;
 }
 

@@ -1,6 +1,7 @@
 #include <orv/utf8.hpp>
 
 #include <bit>
+#include <cstring>
 
 namespace orv::utf8 {
 
@@ -40,31 +41,59 @@ Step step(std::string_view text) {
   return {codePoint, length, true};
 }
 
+namespace {
+
+// The length of the letter at the start of these four bytes, the first in the lowest place: 2 to 4, or 0 if it
+// is ASCII or ill-formed. Each length is a pattern of its lead and continuation bytes (table 3-6), and a few
+// bits of lead and second byte that tell overlong forms, surrogates and what is above U+10FFFF (table 3-7).
+std::size_t letterLength(std::uint32_t bytes) {
+  if ((bytes & 0xC0F0) == 0x80E0 && (bytes & 0xC00000) == 0x800000) {
+    const std::uint32_t deciding = bytes & 0x200F;
+    return deciding != 0x0000 && deciding != 0x200D ? 3 : 0;
+  }
+  if ((bytes & 0xC0E0) == 0x80C0) return (bytes & 0x1E) != 0 ? 2 : 0;
+  if ((bytes & 0xC0C0C0F8) == 0x808080F0) {
+    const std::uint32_t deciding = bytes & 0x3007;
+    const bool isAboveLowest = deciding != 0;
+    const bool isBelowHighest = (bytes & 0x7) < 4 || deciding == 0x0004;
+    return isAboveLowest && isBelowHighest ? 4 : 0;
+  }
+  return 0;
+}
+
+std::uint32_t fourBytesAt(const char* bytes) {
+  std::uint32_t word;
+  std::memcpy(&word, bytes, sizeof word);
+  return std::endian::native == std::endian::little ? word : std::byteswap(word);
+}
+
+}  // namespace
+
 std::size_t wellFormedPrefix(std::string_view text) {
   const char* const bytes = text.data();
   const std::size_t size = text.size();
-  const auto byteAt = [&](std::size_t index) { return static_cast<unsigned char>(bytes[index]); };
-  // A long ASCII text is checked fastest as such.
-  constexpr std::size_t longText = 64;
-  if (size >= longText && isAscii(text)) return size;
   std::size_t at = 0;
   while (at < size) {
-    // ASCII is passed up to eight bytes at a time.
-    if (size - at >= 8) {
-      const std::uint64_t bits = wordAt(bytes + at) & highBits;
+    // ASCII is passed up to sixteen bytes at a time.
+    while (size - at >= 16) {
+      const std::uint64_t both = internal::wordAt(bytes + at) | internal::wordAt(bytes + at + 8);
+      if ((both & internal::highBits) != 0) break;
+      at += 16;
+    }
+    while (size - at >= 8) {
+      const std::uint64_t bits = internal::wordAt(bytes + at) & internal::highBits;
       const int ascii =
           std::endian::native == std::endian::little ? std::countr_zero(bits) : std::countl_zero(bits);
       at += static_cast<std::size_t>(ascii) / 8;
-      if (bits == 0) continue;
-    } else if (byteAt(at) < 0x80) {
-      ++at;
-      continue;
+      if (bits != 0) break;
     }
-    // The letters of most alphabets have two bytes; a call for each takes twice as long.
-    if (byteAt(at) >= 0xC2 && byteAt(at) <= 0xDF && size - at >= 2 && (byteAt(at + 1) & 0xC0) == 0x80) {
-      at += 2;
-      continue;
+    const std::size_t start = at;
+    while (size - at >= 4) {
+      const std::size_t length = letterLength(fourBytesAt(bytes + at));
+      if (length == 0) break;
+      at += length;
     }
+    if (at != start || at == size) continue;
     const Step next = step(text.substr(at));
     if (!next.isWellFormed) return at;
     at += next.length;

@@ -47,7 +47,7 @@ WireResult<std::uint64_t> WireReader::readLongVarint() {
   return fault(DecodeCause::malformedVarint, cursor_);
 }
 
-WireResult<std::span<const std::byte>> WireReader::readLongLengthDelimited() {
+WireResult<std::span<const std::byte>> WireReader::readLengthDelimited() {
   constexpr int longestLength = 5;
   constexpr std::uint64_t lengthLimit = std::uint64_t{1} << 31;
   const std::byte* at = cursor_;
@@ -109,11 +109,11 @@ WireResult<void> WireReader::skipValue(Tag tag, const std::byte* tagStart, int n
 
 WireResult<void> WireReader::skipGroup(Tag start, const std::byte* tagStart, int nesting) {
   // The numbers of the groups that are open, the innermost last. A loop, so that nesting costs no stack.
-  std::array<std::uint32_t, maximumNesting> open;
+  std::array<std::uint32_t, internal::maximumNesting> open;
   int depth = 0;
   for (Tag tag = start;;) {
     if (tag.wireType() == WireType::startGroup) {
-      if (nesting + depth >= maximumNesting) return fault(DecodeCause::nestingTooDeep, tagStart);
+      if (nesting + depth >= internal::maximumNesting) return fault(DecodeCause::nestingTooDeep, tagStart);
       open[static_cast<std::size_t>(depth++)] = tag.fieldNumber();
     } else if (tag.wireType() == WireType::endGroup) {
       if (open[static_cast<std::size_t>(--depth)] != tag.fieldNumber()) {
@@ -132,17 +132,16 @@ WireResult<void> WireReader::skipGroup(Tag start, const std::byte* tagStart, int
 }
 
 std::size_t WireReader::countFollowing(Tag tag, std::size_t most) const {
-  // What lies this far ahead is fetched while the records before it are counted. Each record's length has to
-  // be there before the next record is found, so that in a list too long for the caches the counting would
-  // wait for memory at nearly every record: with 100,000 members a sixth of all decoding.
+  // What lies this far ahead is fetched while the records before it are counted: each record's length has to
+  // be there before the next record is found (docs/decisions/long-lists.md).
   constexpr std::size_t ahead = 2048;
   WireReader probe(*this);
   std::size_t count = 0;
   if (!probe.readLengthDelimited()) return count;
-  for (std::span<const std::byte> body; count < most; ++count) {
+  for (; count < most; ++count) {
     __builtin_prefetch(probe.cursor_ + std::min(ahead, probe.remaining()));
-    if (probe.readShortTag().value != tag.value) break;
-    if (!probe.readShortLengthDelimited(body) && !probe.readLengthDelimited()) break;
+    const auto next = probe.readTag();
+    if (!next || next->value != tag.value || !probe.readLengthDelimited()) break;
   }
   return count;
 }

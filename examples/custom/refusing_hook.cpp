@@ -6,6 +6,7 @@
 #include <expected>
 #include <string>
 
+#include <orv/binary_decoder.hpp>
 #include <orv/group.hpp>
 
 namespace {

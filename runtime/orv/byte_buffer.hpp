@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstddef>
+#include <functional>
 #include <span>
 #include <string_view>
 
@@ -9,6 +10,11 @@
 #include <orv/internal/inline_bytes.hpp>
 
 namespace orv {
+
+namespace internal {
+class FieldReader;
+class FieldWriter;
+}  // namespace internal
 
 // An immutable sequence of bytes with value semantics: it changes only by being assigned another. Two buffers
 // are equal when they have the same length and the same bytes. A buffer of up to 39 bytes allocates nothing.
@@ -22,8 +28,7 @@ class ByteBuffer {
   // The characters' bytes as they stand.
   explicit ByteBuffer(std::string_view characters) { bytes_.assign(characters); }
 
-  std::size_t sizeInBytes() const { return bytes_.size(); }
-  std::size_t size() const { return sizeInBytes(); }
+  std::size_t size() const { return bytes_.size(); }
   bool isEmpty() const { return size() == 0; }
   // Valid until the buffer is assigned to or goes, as are the characters.
   std::span<const std::byte> bytes() const { return std::as_bytes(std::span(characters())); }
@@ -41,10 +46,13 @@ class ByteBuffer {
   void hash(Hasher& into) const { into.combine(characters()); }
 
  private:
-  friend class BinaryDecoder;
-  friend class BinaryEncoder;
+  friend internal::FieldReader;
+  friend internal::FieldWriter;
 
-  InlineBytes bytes_;
+  internal::InlineBytes bytes_;
 };
 
 }  // namespace orv
+
+template <>
+struct std::hash<orv::ByteBuffer> : orv::internal::StandardHash<orv::ByteBuffer> {};

@@ -8,14 +8,14 @@
 #include <vector>
 
 #include <orv/byte_buffer.hpp>
+#include <orv/internal/seam.hpp>
 #include <orv/text.hpp>
-#include <orv/unknown_storage.hpp>
 
 namespace orv {
 
 // What every read of a decoder answers: nothing, or the decoder's own error.
 template <class D>
-using DecodeResult = std::expected<void, typename D::Error>;
+using DecodeResult = internal::ResultOf<D>;
 
 // A source of fields, for a message's decodeMessage. BinaryDecoder is one; anyone can write another, with an
 // error type of its own, which reaches decodeMessage's caller as it was made. A decoder has
@@ -50,12 +50,20 @@ using DecodeResult = std::expected<void, typename D::Error>;
 //   DecodeResult handleConflictingOneOf();
 //
 // where DecodeResult is std::expected<void, Error>. What reads a field need not take it: a field of the wrong
-// wire type is left for the unknown fields.
+// wire type is left for the unknown fields. AnyValueDecoder is a base for decoders that treat many of these
+// alike.
+//
+// A decoder may read a oneof member itself, where it can do better than to copy the payload that is held,
+// merge into the copy, ask handleConflictingOneOf and store it. The outcome is to be the same.
+//
+//   template <class Case, class... Cases>
+//   DecodeResult decodeCase(std::optional<std::variant<Cases...>>& group);
 template <class D>
 concept Decoder = requires(D& decoder, Text& text, std::optional<Text>& optionalText,
                            std::vector<Text>& texts, ByteBuffer& bytes,
                            std::optional<ByteBuffer>& optionalBytes, bool& flag,
-                           std::optional<bool>& optionalFlag, std::optional<std::uint32_t>& optionalNumber) {
+                           std::optional<bool>& optionalFlag, std::optional<std::uint32_t>& optionalNumber,
+                           std::optional<internal::SomeEnumeration>& optionalCase) {
   typename D::Error;
   { decoder.decodeSingularStringField(text) } -> std::same_as<DecodeResult<D>>;
   { decoder.decodeSingularStringField(optionalText) } -> std::same_as<DecodeResult<D>>;
@@ -64,6 +72,7 @@ concept Decoder = requires(D& decoder, Text& text, std::optional<Text>& optional
   { decoder.decodeSingularBoolField(flag) } -> std::same_as<DecodeResult<D>>;
   { decoder.decodeSingularBoolField(optionalFlag) } -> std::same_as<DecodeResult<D>>;
   { decoder.decodeSingularUInt32Field(optionalNumber) } -> std::same_as<DecodeResult<D>>;
+  { decoder.decodeSingularEnumField(optionalCase) } -> std::same_as<DecodeResult<D>>;
   { decoder.decodeRepeatedStringField(texts) } -> std::same_as<DecodeResult<D>>;
   { decoder.handleConflictingOneOf() } -> std::same_as<DecodeResult<D>>;
 };
@@ -72,32 +81,9 @@ concept Decoder = requires(D& decoder, Text& text, std::optional<Text>& optional
 template <class D, class M>
 concept DecoderOf = Decoder<D> &&
     requires(D& decoder, M& message, std::optional<M>& slot, std::vector<M>& list) {
-  {
-    decoder.nextFieldNumber(message)
-    } -> std::same_as<std::expected<std::optional<std::uint32_t>, typename D::Error>>;
+  { decoder.nextFieldNumber(message) } -> std::same_as<internal::NextNumberOf<D>>;
   { decoder.decodeSingularMessageField(slot) } -> std::same_as<DecodeResult<D>>;
   { decoder.decodeRepeatedMessageField(list) } -> std::same_as<DecodeResult<D>>;
 };
-
-// A decoder that can look at its input twice. It says so with `static constexpr bool canReread = true`, and
-// the rules then merge a repeated oneof member in place, where they copy the payload for other decoders: with
-// many repeats that is the difference between linear and quadratic time. It has
-//
-//   // Whether the field whose number was given last can be read as a message at all.
-//   bool isAtLengthDelimitedField() const;
-//
-//   // Reads the field into a default message. When it fails, part of it may be there: the caller drops it.
-//   template <class M>
-//   DecodeResult readNewMessage(M& message);
-//
-//   // Whether the field could be merged into this message, which is not touched. Takes nothing.
-//   template <class M>
-//   DecodeResult checkMessageField(const M& held);
-//
-//   // Merges a field that was checked, which cannot fail any more.
-//   template <class M>
-//   DecodeResult mergeMessageField(M& message);
-template <class D>
-concept RereadingDecoder = Decoder<D> && D::canReread;
 
 }  // namespace orv

@@ -1,10 +1,8 @@
 // Collects what a value is made of into one number.
 #pragma once
 
-#include <concepts>
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <string_view>
 
 namespace orv {
@@ -27,17 +25,18 @@ class Hasher {
   std::uint64_t state_ = 0;
 };
 
-}  // namespace orv
+namespace internal {
 
-// Texts, byte buffers, enumerations and messages as keys of unordered containers.
+// The std::hash of a type that feeds itself into a hasher.
 template <class T>
-requires requires(const T& value, orv::Hasher& hasher) {
-  { value.hash(hasher) } -> std::same_as<void>;
-}
-struct std::hash<T> {
+struct StandardHash {
   std::size_t operator()(const T& value) const {
-    orv::Hasher hasher;
+    Hasher hasher;
     value.hash(hasher);
-    return hasher.finish();
+    return static_cast<std::size_t>(hasher.finish());
   }
 };
+
+}  // namespace internal
+
+}  // namespace orv

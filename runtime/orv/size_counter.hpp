@@ -1,29 +1,18 @@
 // Counts the bytes of a message's binary encoding without writing it.
 #pragma once
 
-#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
 #include <vector>
 
 #include <orv/byte_buffer.hpp>
+#include <orv/internal/varint.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
 namespace orv {
-
-// How many bytes a varint takes: one for each seven bits up to the highest that is set. 9/64 is a seventh
-// rounded up, and exact for up to 64 bits.
-constexpr std::size_t varintSize(std::uint64_t value) {
-  return (9 * static_cast<std::size_t>(std::bit_width(value | 1)) + 64) / 64;
-}
-
-// The varint of an enumeration's raw value: its low 32 bits, sign-extended.
-constexpr std::uint64_t travellingValue(std::int64_t rawValue) {
-  return static_cast<std::uint64_t>(std::int64_t{static_cast<std::int32_t>(rawValue)});
-}
 
 // A visitor that adds up what BinaryEncoder would write.
 class SizeCounter {
@@ -41,11 +30,11 @@ class SizeCounter {
   }
   Result visitSingularBoolField(bool, std::uint32_t number) { return add(number, 1); }
   Result visitSingularUInt32Field(std::uint32_t value, std::uint32_t number) {
-    return add(number, varintSize(value));
+    return add(number, internal::varintSize(value));
   }
   template <class Enumeration>
   Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
-    return add(number, varintSize(travellingValue(value.rawValue())));
+    return add(number, internal::varintSize(internal::travellingValue(value.rawValue())));
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
@@ -69,11 +58,11 @@ class SizeCounter {
 
  private:
   Result add(std::uint32_t number, std::uint64_t size) {
-    size_ += varintSize(std::uint64_t{number} << 3) + size;
+    size_ += internal::varintSize(std::uint64_t{number} << 3) + size;
     return {};
   }
   Result addLengthDelimited(std::uint32_t number, std::uint64_t length) {
-    return add(number, varintSize(length) + length);
+    return add(number, internal::varintSize(length) + length);
   }
 
   std::uint64_t size_ = 0;

@@ -3,6 +3,7 @@
 
 #include <cstddef>
 #include <expected>
+#include <functional>
 #include <string>
 #include <string_view>
 
@@ -10,6 +11,11 @@
 #include <orv/internal/inline_bytes.hpp>
 
 namespace orv {
+
+namespace internal {
+class FieldReader;
+class FieldWriter;
+}  // namespace internal
 
 // Why a text could not be made: where the first ill-formed byte stands.
 struct IllFormedText {
@@ -50,12 +56,15 @@ class Text {
   void hash(Hasher& into) const;
 
  private:
-  friend class BinaryDecoder;
-  friend class BinaryEncoder;
+  friend internal::FieldReader;
+  friend internal::FieldWriter;
 
   static bool isCanonicallyEqual(std::string_view left, std::string_view right);
 
-  InlineBytes bytes_;
+  internal::InlineBytes bytes_;
 };
 
 }  // namespace orv
+
+template <>
+struct std::hash<orv::Text> : orv::internal::StandardHash<orv::Text> {};

@@ -8,9 +8,14 @@
 #include <utility>
 
 #include <orv/decode_error.hpp>
+#include <orv/internal/seam.hpp>
 #include <orv/wire_reader.hpp>
 
 namespace orv {
+
+namespace internal {
+class FieldReader;
+}
 
 // One kept field. The spans are valid as long as the store that they come from is unchanged.
 struct UnknownField {
@@ -19,17 +24,22 @@ struct UnknownField {
   std::span<const std::byte> value;   // what follows the tag
 };
 
-// Kept records, byte for byte as they came, in the order of their arrival. Owns one heap block, and none
-// while it is empty; an empty store is one pointer wide.
+// Kept records, byte for byte as they came, in the order of their arrival; they are well-formed always. Owns
+// one heap block, and none before there was something to keep; it is one pointer wide.
 class UnknownStorage {
  public:
   constexpr UnknownStorage() noexcept = default;
   UnknownStorage(const UnknownStorage& other) {
-    if (!other.isEmpty()) append(other.records());
+    if (!other.isEmpty()) appendRecords(other.records());
   }
   UnknownStorage(UnknownStorage&& other) noexcept : block_(other.block_) { other.block_ = nullptr; }
-  UnknownStorage& operator=(UnknownStorage other) noexcept {
-    std::swap(block_, other.block_);
+  UnknownStorage& operator=(const UnknownStorage& other) {
+    if (this != &other) *this = UnknownStorage(other);
+    return *this;
+  }
+  UnknownStorage& operator=(UnknownStorage&& other) noexcept {
+    UnknownStorage taken(std::move(other));
+    std::swap(block_, taken.block_);
     return *this;
   }
   constexpr ~UnknownStorage() {
@@ -41,9 +51,17 @@ class UnknownStorage {
   // read again.
   [[nodiscard]] static std::expected<UnknownStorage, DecodeError> checked(std::span<const std::byte> records);
 
-  bool isEmpty() const { return block_ == nullptr; }
+  // Adds records behind those that are there; nothing, unless all are well-formed.
+  [[nodiscard]] std::expected<void, DecodeError> append(std::span<const std::byte> records);
+
+  bool isEmpty() const { return block_ == nullptr || block_->size == 0; }
   std::span<const std::byte> records() const {
-    return isEmpty() ? std::span<const std::byte>() : std::span<const std::byte>(bytes(), block_->size);
+    return block_ == nullptr ? std::span<const std::byte>()
+                             : std::span<const std::byte>(bytes(), block_->size);
+  }
+  // Empties the store, whose memory is used again.
+  void clear() {
+    if (block_ != nullptr) block_->size = 0;
   }
 
   // Walks the fields one by one: for (const UnknownField& field : store).
@@ -52,28 +70,29 @@ class UnknownStorage {
   std::default_sentinel_t end() const { return {}; }
 
   // Hands the kept records to the visitor, if there are any.
-  template <class Visitor>
-  std::expected<void, typename Visitor::Error> traverse(Visitor& visitor) const {
+  template <class V>
+  [[gnu::always_inline]] internal::ResultOf<V> traverse(V& visitor) const {
     if (isEmpty()) [[likely]]
       return {};
     return visitor.visitUnknownFields(*this);
   }
 
   friend bool operator==(const UnknownStorage& left, const UnknownStorage& right) {
-    if (left.isEmpty() || right.isEmpty()) return left.block_ == right.block_;
+    if (left.isEmpty() || right.isEmpty()) return left.isEmpty() && right.isEmpty();
     return left.hasSameRecords(right);
   }
 
-  // For decoders: adds records, which must be well-formed.
-  void append(std::span<const std::byte> records);
-
  private:
+  friend internal::FieldReader;
+
   // Stands at the start of the heap block; the records follow it.
   struct Block {
     std::size_t size;
     std::size_t capacity;
   };
 
+  // Adds records that are known to be well-formed.
+  void appendRecords(std::span<const std::byte> records);
   std::byte* bytes() const { return reinterpret_cast<std::byte*>(block_ + 1); }
   bool hasSameRecords(const UnknownStorage& other) const;
   void freeBlock() noexcept;

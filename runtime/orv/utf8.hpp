@@ -33,14 +33,15 @@ inline bool isAscii(std::string_view text) {
     return bits < 0x80;
   }
   // The last word overlaps the one before it, so no byte is left over.
-  std::uint64_t bits = wordAt(bytes + size - 8);
+  std::uint64_t bits = internal::wordAt(bytes + size - 8);
   std::size_t at = 0;
   for (; at + 32 <= size; at += 32) {
-    bits |= wordAt(bytes + at) | wordAt(bytes + at + 8) | wordAt(bytes + at + 16) | wordAt(bytes + at + 24);
-    if ((bits & highBits) != 0) return false;
+    bits |= internal::wordAt(bytes + at) | internal::wordAt(bytes + at + 8) |
+            internal::wordAt(bytes + at + 16) | internal::wordAt(bytes + at + 24);
+    if ((bits & internal::highBits) != 0) return false;
   }
-  for (; at + 8 <= size; at += 8) bits |= wordAt(bytes + at);
-  return (bits & highBits) == 0;
+  for (; at + 8 <= size; at += 8) bits |= internal::wordAt(bytes + at);
+  return (bits & internal::highBits) == 0;
 }
 
 inline bool isWellFormed(std::string_view text) { return wellFormedPrefix(text) == text.size(); }

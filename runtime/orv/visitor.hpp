@@ -2,11 +2,12 @@
 #pragma once
 
 #include <concepts>
+#include <cstddef>
 #include <cstdint>
-#include <expected>
 #include <vector>
 
 #include <orv/byte_buffer.hpp>
+#include <orv/internal/seam.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 
@@ -14,7 +15,7 @@ namespace orv {
 
 // What every visit answers: nothing, or the visitor's own error, which ends the walk.
 template <class V>
-using VisitResult = std::expected<void, typename V::Error>;
+using VisitResult = internal::ResultOf<V>;
 
 // The error of visitors that cannot fail: nobody makes one.
 enum class NeverFails : std::uint8_t {};
@@ -34,16 +35,26 @@ enum class NeverFails : std::uint8_t {};
 //   template <class M> VisitResult visitRepeatedMessageField(const std::vector<M>&, std::uint32_t number)
 //   VisitResult visitUnknownFields(const UnknownStorage&)
 //
-// Only fields that are to be emitted are visited: a list is never empty, nor is the store of unknown fields.
+// where VisitResult is std::expected<void, Error>. Only fields that are to be emitted are visited: a list is
+// never empty, nor is the store of unknown fields. AnyValueVisitor is a base for visitors that treat many of
+// these alike.
+//
+// A visitor may have one or both of these, which traverse calls first and last, for nested messages too.
+// `fieldCount` is how many fields follow, a list counted as one, the unknown fields not counted.
+//
+//   template <class M> VisitResult beginMessage(const M&, std::size_t fieldCount)
+//   template <class M> VisitResult endMessage(const M&)
 template <class V>
 concept Visitor = requires(V& visitor, const Text& text, const ByteBuffer& bytes,
                            const std::vector<Text>& texts, std::uint32_t number, bool flag,
+                           const internal::SomeEnumeration& enumeration,
                            const UnknownStorage& unknownFields) {
   typename V::Error;
   { visitor.visitSingularStringField(text, number) } -> std::same_as<VisitResult<V>>;
   { visitor.visitSingularBytesField(bytes, number) } -> std::same_as<VisitResult<V>>;
   { visitor.visitSingularBoolField(flag, number) } -> std::same_as<VisitResult<V>>;
   { visitor.visitSingularUInt32Field(number, number) } -> std::same_as<VisitResult<V>>;
+  { visitor.visitSingularEnumField(enumeration, number) } -> std::same_as<VisitResult<V>>;
   { visitor.visitRepeatedStringField(texts, number) } -> std::same_as<VisitResult<V>>;
   { visitor.visitUnknownFields(unknownFields) } -> std::same_as<VisitResult<V>>;
 };

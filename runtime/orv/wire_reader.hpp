@@ -10,8 +10,12 @@
 
 namespace orv {
 
+namespace internal {
+
 // Nesting of messages and groups that is still read.
 inline constexpr int maximumNesting = 100;
+
+}  // namespace internal
 
 enum class WireType : std::uint8_t {
   varint = 0,
@@ -55,8 +59,13 @@ class WireReader {
 
   // A tag of up to five bytes whose number is not 0.
   [[nodiscard]] WireResult<Tag> readTag() {
-    if (const Tag tag = readShortTag(); tag.value != 0) [[likely]]
-      return tag;
+    if (cursor_ != limit_) {
+      const auto first = std::to_integer<std::uint32_t>(*cursor_);
+      if (first >= 8 && first < 0x80) [[likely]] {
+        ++cursor_;
+        return Tag{first};
+      }
+    }
     return readLongTag();
   }
 
@@ -68,42 +77,7 @@ class WireReader {
   }
 
   // A length below 2^31 in up to five bytes, and as many bytes, all of them there.
-  [[nodiscard]] WireResult<std::span<const std::byte>> readLengthDelimited() {
-    std::span<const std::byte> body;
-    if (readShortLengthDelimited(body)) [[likely]]
-      return body;
-    return readLongLengthDelimited();
-  }
-
-  // The common case of each, for readers in a hurry: a tag of one byte, a length of one or two bytes and all
-  // of its bytes there. Otherwise nothing is read, and the tag is 0.
-  Tag readShortTag() {
-    if (cursor_ == limit_) [[unlikely]]
-      return Tag{0};
-    const auto first = std::to_integer<std::uint32_t>(*cursor_);
-    if (first < 8 || first >= 0x80) [[unlikely]]
-      return Tag{0};
-    ++cursor_;
-    return Tag{first};
-  }
-  bool readShortLengthDelimited(std::span<const std::byte>& body) {
-    if (remaining() < 2) [[unlikely]]
-      return false;
-    auto length = std::to_integer<std::size_t>(cursor_[0]);
-    const std::byte* start = cursor_ + 1;
-    if (length >= 0x80) {
-      const auto second = std::to_integer<std::size_t>(cursor_[1]);
-      if (second >= 0x80) [[unlikely]]
-        return false;
-      length = (length & 0x7F) | second << 7;
-      ++start;
-    }
-    if (length > static_cast<std::size_t>(limit_ - start)) [[unlikely]]
-      return false;
-    body = std::span(start, length);
-    cursor_ = start + length;
-    return true;
-  }
+  [[nodiscard]] WireResult<std::span<const std::byte>> readLengthDelimited();
 
   // A little-endian number.
   [[nodiscard]] WireResult<std::uint32_t> readFixed32();
@@ -120,7 +94,6 @@ class WireReader {
  private:
   WireResult<Tag> readLongTag();
   WireResult<std::uint64_t> readLongVarint();
-  WireResult<std::span<const std::byte>> readLongLengthDelimited();
   WireResult<void> skipBytes(std::size_t count);
   template <class Number>
   WireResult<Number> readFixed();

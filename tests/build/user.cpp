@@ -1,7 +1,6 @@
 // A program of a user of the library: it sees the public headers alone, without exceptions and type
 // information, and brings a decoder and a visitor of its own.
-#include <orv/all_messages.hpp>
-#include <orv/delimited_stream.hpp>
+#include <orv/orv.hpp>
 #include "tests/testing/scripted_decoder.hpp"
 #include "tests/testing/tracing_visitor.hpp"
 

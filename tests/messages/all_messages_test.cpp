@@ -4,7 +4,8 @@
 #include <concepts>
 #include <thread>
 
-#include <orv/all_messages.hpp>
+#include <orv/orv.hpp>
+#include <orv/text_renderer.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"

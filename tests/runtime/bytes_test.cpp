@@ -17,15 +17,15 @@ std::string contents(std::size_t size) {
   return bytes;
 }
 
-InlineBytes make(std::size_t size) {
-  InlineBytes bytes;
+internal::InlineBytes make(std::size_t size) {
+  internal::InlineBytes bytes;
   bytes.assign(contents(size));
   return bytes;
 }
 
 TEST(InlineBytes, LiveInTheObjectUpTo39) {
   for (const std::size_t size : sizes) {
-    const InlineBytes bytes = make(size);
+    const internal::InlineBytes bytes = make(size);
     EXPECT_EQ(bytes.view(), contents(size));
     EXPECT_EQ(bytes.size(), size);
     EXPECT_EQ(bytes.isOnHeap(), size > 39);
@@ -36,14 +36,14 @@ TEST(InlineBytes, AreCopiedMovedAndAssignedWhateverBothHeldBefore) {
   for (const std::size_t from : sizes) {
     for (const std::size_t to : sizes) {
       SCOPED_TRACE(std::to_string(from) + " to " + std::to_string(to));
-      InlineBytes source = make(from), target = make(to);
+      internal::InlineBytes source = make(from), target = make(to);
       target = source;
       EXPECT_EQ(target.view(), contents(from));
       EXPECT_EQ(source.view(), contents(from));
       source.append("x");
       EXPECT_EQ(target.view(), contents(from));
 
-      InlineBytes moved = std::move(target);
+      internal::InlineBytes moved = std::move(target);
       EXPECT_EQ(moved.view(), contents(from));
       target.assign(contents(to));  // what was moved from can be assigned to
       target = std::move(moved);
@@ -61,11 +61,11 @@ TEST(InlineBytes, AreCopiedMovedAndAssignedWhateverBothHeldBefore) {
 TEST(InlineBytes, TakePartsOfThemselves) {
   for (const std::size_t size : sizes) {
     SCOPED_TRACE(size);
-    InlineBytes bytes = make(size);
-    const InlineBytes& itself = bytes;
+    internal::InlineBytes bytes = make(size);
+    const internal::InlineBytes& itself = bytes;
     bytes = itself;
     EXPECT_EQ(bytes.view(), contents(size));
-    bytes = std::move(const_cast<InlineBytes&>(itself));
+    bytes = std::move(const_cast<internal::InlineBytes&>(itself));
     EXPECT_EQ(bytes.view(), contents(size));
     bytes.append(bytes.view());
     EXPECT_EQ(bytes.view(), contents(size) + contents(size));
@@ -77,22 +77,24 @@ TEST(InlineBytes, TakePartsOfThemselves) {
   }
 }
 
-TEST(InlineBytes, TakeReadableBytesFromTheEndOfAnInput) {
-  for (const std::size_t size : sizes) {
-    for (const std::size_t behind : {0U, 1U, 39U, 40U, 100U}) {
-      const std::string input = contents(size) + std::string(behind, 'b');
-      const std::vector<char> exact(input.begin(), input.end());  // its end is watched in sanitized builds
-      for (const std::size_t before : {0U, 39U, 50U}) {
-        InlineBytes bytes = make(before);
-        bytes.assignReadable({exact.data(), size}, exact.size());
-        EXPECT_EQ(bytes.view(), contents(size));
-      }
+TEST(InlineBytes, TakeWhatFitsInsideFromReadableBytes) {
+  for (std::size_t size = 0; size <= internal::InlineBytes::inlineCapacity; ++size) {
+    std::string input(size, 'a');
+    input.resize(internal::InlineBytes::objectSize, '\xFF');
+    const std::vector<char> exact(input.begin(), input.end());  // its end is watched in sanitized builds
+    const auto* const start = reinterpret_cast<const std::byte*>(exact.data());
+    EXPECT_TRUE(internal::InlineBytes::isAsciiWithin(start, size));
+    EXPECT_FALSE(internal::InlineBytes::isAsciiWithin(start, size + 1));
+    for (const std::size_t before : {0U, 39U, 50U}) {
+      internal::InlineBytes bytes = make(before);
+      bytes.assignWithin(start, size);
+      EXPECT_EQ(bytes.view(), std::string(size, 'a'));
     }
   }
 }
 
 TEST(InlineBytes, GrowInFewAllocations) {
-  InlineBytes bytes;
+  internal::InlineBytes bytes;
   const HeapMeter meter;
   for (int count = 0; count < 100'000; ++count) bytes.append("x");
   EXPECT_LT(meter.allocations(), 20U);
@@ -100,12 +102,12 @@ TEST(InlineBytes, GrowInFewAllocations) {
 }
 
 TEST(InlineBytes, AreCopiedToTheirOwnSizeWhateverTheirBlockHolds) {
-  InlineBytes shrunk = make(1000);
+  internal::InlineBytes shrunk = make(1000);
   const std::string shorter = contents(39);
   shrunk.assign(shorter);
   EXPECT_TRUE(shrunk.isOnHeap());
   const HeapMeter meter;
-  const InlineBytes copy = shrunk;
+  const internal::InlineBytes copy = shrunk;
   EXPECT_EQ(copy.view(), shorter);
   EXPECT_EQ(meter.allocations(), 0U);
 }

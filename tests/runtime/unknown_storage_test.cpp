@@ -63,11 +63,11 @@ TEST(UnknownStorage, IsAValue) {
   UnknownStorage copy = first;
   EXPECT_EQ(copy, first);
   EXPECT_FALSE(copy == second || copy == UnknownStorage());
-  copy.append(second.records());
+  ASSERT_TRUE(copy.append(second.records()));
   EXPECT_EQ(toHex(copy.records()), "28 01 28 02 28 03");
   EXPECT_EQ(toHex(first.records()), "28 01");
-  copy.append(copy.records());
-  copy.append(copy.records());
+  ASSERT_TRUE(copy.append(copy.records()));
+  ASSERT_TRUE(copy.append(copy.records()));
   EXPECT_EQ(copy.records().size(), 24U);
   EXPECT_EQ(toHex(copy.records().last(6)), "28 01 28 02 28 03");
 
@@ -80,7 +80,7 @@ TEST(UnknownStorage, IsAValue) {
   EXPECT_EQ(copy, first);
   copy = {};
   EXPECT_EQ(copy, UnknownStorage());
-  copy.append({});
+  ASSERT_TRUE(copy.append({}));
   EXPECT_TRUE(copy.isEmpty());
 }
 
@@ -93,7 +93,7 @@ TEST(UnknownStorage, WeighsAboutWhatItsRecordsWeigh) {
   const std::string record = hex("28 01");
   const HeapMeter meter;
   UnknownStorage storage;
-  for (int count = 0; count < 100'000; ++count) storage.append(std::as_bytes(std::span(record)));
+  for (int count = 0; count < 100'000; ++count) ASSERT_TRUE(storage.append(std::as_bytes(std::span(record))));
   EXPECT_LT(meter.allocations(), 40U);
   EXPECT_LT(meter.liveBytes(), 310'000U);
   EXPECT_EQ(sizeof storage, sizeof(void*));

@@ -138,6 +138,6 @@ class ScriptedDecoder {
   bool isOutermost_;
 };
 
-static_assert(Decoder<ScriptedDecoder> && !RereadingDecoder<ScriptedDecoder>);
+static_assert(Decoder<ScriptedDecoder>);
 
 }  // namespace orv::test

@@ -9,6 +9,7 @@
 #include <tuple>
 #include <utility>
 
+#include <orv/instantiate.hpp>
 #include <orv/session_message.hpp>
 
 namespace orv::tool {
@@ -20,28 +21,11 @@ class OpenedEnvelope final : public Message<OpenedEnvelope<Payload>> {
  public:
   static constexpr std::string_view protoMessageName = SessionMessage::protoMessageName;
 
-  OpenedEnvelope() = default;
+  OpenedEnvelope() noexcept {}
   OpenedEnvelope(const SessionMessage& envelope, Payload payload) : data_(std::move(payload)) {
     if (envelope.hasVersion()) version_ = envelope.version();
     if (envelope.hasType()) type_ = envelope.type();
     this->setUnknownFields(envelope.unknownFields());
-  }
-
-  // As every message has them. The library compiles those for its own types; here the rules are named as they
-  // are for any visitor.
-  std::string debugDescription() const {
-    std::string text;
-    TextRenderer renderer(text, OpenedEnvelope::_protobuf_nameMap());
-    (void)this->template traverse<TextRenderer>(renderer);
-    return text;
-  }
-  std::expected<std::string, EncodeError> serialize() const {
-    std::string bytes;
-    BinaryEncoder encoder(bytes);
-    if (auto walked = this->template traverse<BinaryEncoder>(encoder); !walked)
-      return std::unexpected(walked.error());
-    encoder.finish();
-    return bytes;
   }
 
  private:

@@ -39,7 +39,6 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
 
       // Bytes that the device needs to take part; what they hold is between the peers.
       const ByteBuffer& invitationData() const { return invitationData_; }
-      ByteBuffer& mutableInvitationData() { return invitationData_; }
       void setInvitationData(ByteBuffer value) { invitationData_ = std::move(value); }
 
      private:
@@ -71,12 +70,12 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
     void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
 
     // A case reads as a default payload unless it is the one held; writing it replaces what was held.
-    const DeniedContent& denied() const { return caseOrDefault<DeniedContent>(operation_); }
-    DeniedContent& mutableDenied() { return presentCase<DeniedContent>(operation_); }
+    const DeniedContent& denied() const { return internal::caseOrDefault<DeniedContent>(operation_); }
+    DeniedContent& mutableDenied() { return internal::presentCase<DeniedContent>(operation_); }
     void setDenied(DeniedContent value) { operation_ = std::move(value); }
 
-    const ApprovalContent& approved() const { return caseOrDefault<ApprovalContent>(operation_); }
-    ApprovalContent& mutableApproved() { return presentCase<ApprovalContent>(operation_); }
+    const ApprovalContent& approved() const { return internal::caseOrDefault<ApprovalContent>(operation_); }
+    ApprovalContent& mutableApproved() { return internal::presentCase<ApprovalContent>(operation_); }
     void setApproved(ApprovalContent value) { operation_ = std::move(value); }
 
    private:

@@ -2,8 +2,10 @@
 #pragma once
 
 #include <array>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <span>
 
 #include <orv/hasher.hpp>
@@ -55,3 +57,8 @@ class Enumeration {
 };
 
 }  // namespace orv
+
+template <class E>
+requires std::derived_from<E, orv::Enumeration<E>>
+struct std::hash<E> : orv::internal::StandardHash<E> {
+};

@@ -4,11 +4,17 @@
 #include <cstdint>
 #include <string_view>
 
+#include <orv/internal/field_traits.hpp>
+
 namespace orv {
 
-// The type of its storage says how a field is kept: T has implicit presence, std::optional<T> explicit
-// presence (a message always does), std::vector<T> is repeated, and std::optional<std::variant<…>> is a oneof
-// group, with one row for each alternative.
+// The type of its storage says how a field is kept:
+//
+//   Text, ByteBuffer, bool                             implicit presence
+//   std::optional of these, of std::uint32_t, of an
+//     enumeration, of a message                        explicit presence (a message always has it)
+//   std::vector of Text or of a message                repeated
+//   std::optional<std::variant<messages…>>             a oneof group, with one row for each alternative
 //
 // One row: where the field is stored, its number and its text name. `Case` is the payload's type when the
 // storage is a oneof group.
@@ -19,8 +25,7 @@ struct Field {
 };
 
 template <auto Pointer, class Case = void>
-constexpr Field<Pointer, Case> field(std::uint32_t number, std::string_view name) {
-  return {number, name};
-}
+requires internal::StorageOfAField<internal::PointedTo<Pointer>, Case>
+constexpr Field<Pointer, Case> field(std::uint32_t number, std::string_view name) { return {number, name}; }
 
 }  // namespace orv

@@ -1,6 +1,9 @@
-// The rules of all messages for the built-in decoders and visitors. Only the sources of the messages include
-// this: each compiles them for its types, with one line per type, and whoever includes a message's header
-// compiles none of them.
+// What messages can do with the built-in decoder and visitors. Whoever writes a message includes this in the
+// source that compiles it, once for each type:
+//
+//   template class orv::Message<MyMessage>;
+//
+// Whoever includes a message's header then compiles none of it.
 #pragma once
 
 #include <algorithm>
@@ -9,39 +12,77 @@
 #include <cstddef>
 #include <cstdint>
 #include <expected>
+#include <limits>
 #include <span>
 #include <string>
 
+#include <orv/binary_decoder.hpp>
+#include <orv/binary_encoder.hpp>
+#include <orv/hash_visitor.hpp>
 #include <orv/internal/replacing.hpp>
 #include <orv/message.hpp>
+#include <orv/size_counter.hpp>
+#include <orv/text_renderer.hpp>
 
 namespace orv {
 
+namespace internal {
+
+// The loop over all of an input, once for each message type and way of reading.
+template <class Read, class M>
+[[gnu::noinline]] bool readAll(M& message, std::span<const std::byte> bytes, OutermostFrame& frame) {
+  frame.outermostMessage = &M::descriptor();
+  FieldReader reader(bytes, bytes.data() + bytes.size(), frame);
+  return static_cast<bool>(Read()(message, reader));
+}
+
+template <class Read, class M>
+std::expected<void, DecodeError> readInto(M& message, std::span<const std::byte> bytes) {
+  std::expected<void, DecodeError> result;
+  OutermostFrame frame(bytes.data(), {});
+  if (!readAll<Read>(message, bytes, frame)) [[unlikely]] {
+    result = std::unexpected(DecodeError());
+    frame.describe(result.error());
+  }
+  return result;
+}
+
+// The walk over a whole message, once for each type. Answers the encoding's size, or that it does not fit.
+inline constexpr std::size_t doesNotFit = std::numeric_limits<std::size_t>::max();
+template <class M>
+[[gnu::noinline]] std::size_t writeAll(const M& message, std::span<char> room, Target& target) {
+  FieldWriter writer(room, target);
+  if (!message.traverse(writer)) [[unlikely]]
+    return doesNotFit;
+  writer.wipeOverrun();
+  return static_cast<std::size_t>(writer.position() - room.data());
+}
+
+}  // namespace internal
+
 template <class M>
 std::expected<void, DecodeError> Message<M>::decodeMessage(BinaryDecoder& decoder) {
-  if (decodeFields(decoder)) [[likely]]
-    return {};
-  return decoder.failure();
+  return decoder.readWith(self(), internal::DecodeMessage());
 }
 
 template <class M>
-BinaryEncoder::Result Message<M>::traverse(BinaryEncoder& visitor) const {
-  return visitFields(visitor);
+std::expected<void, EncodeError> Message<M>::traverse(BinaryEncoder& visitor) const {
+  return visitor.writeWith([&](internal::FieldWriter& writer) { return traverse(writer); });
 }
 
 template <class M>
-SizeCounter::Result Message<M>::traverse(SizeCounter& visitor) const {
-  return visitFields(visitor);
+std::expected<void, NeverFails> Message<M>::traverse(SizeCounter& visitor) const {
+  return internal::visitFields<Table<M>>(self(), visitor);
 }
 
 template <class M>
-HashVisitor::Result Message<M>::traverse(HashVisitor& visitor) const {
-  return visitFields(visitor);
+std::expected<void, NeverFails> Message<M>::traverse(HashVisitor& visitor) const {
+  return internal::visitFields<Table<M>>(self(), visitor);
 }
 
 template <class M>
-TextRenderer::Result Message<M>::traverse(TextRenderer& visitor) const {
-  return visitFields(visitor);
+std::expected<void, NeverFails> Message<M>::traverse(TextRenderer& visitor) const {
+  return internal::visitFields<Table<M>>(self(), visitor);
 }
 
 template <class M>
@@ -60,7 +101,7 @@ std::uint64_t Message<M>::hashValue() const {
 template <class M>
 std::string Message<M>::debugDescription() const {
   std::string text;
-  TextRenderer renderer(text, _protobuf_nameMap());
+  TextRenderer renderer(text);
   (void)traverse(renderer);
   return text;
 }
@@ -68,41 +109,48 @@ std::string Message<M>::debugDescription() const {
 template <class M>
 std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes) {
   std::expected<M, DecodeError> message;
-  BinaryDecoder decoder(bytes);
-  if (!message->decodeFields(decoder)) [[unlikely]]
-    message = std::unexpected(decoder.failure().error());
+  internal::OutermostFrame frame(bytes.data(), {});
+  if (!internal::readAll<internal::DecodeMessage>(*message, bytes, frame)) [[unlikely]] {
+    message = std::unexpected(DecodeError());
+    frame.describe(message.error());
+  }
   return message;
 }
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::reparse(std::span<const std::byte> bytes) {
-  BinaryDecoder decoder(bytes);
-  if (replaceFields(decoder)) [[likely]]
-    return {};
-  return decoder.failure();
+  return internal::readInto<internal::Replace>(self(), bytes);
+}
+
+template <class M>
+template <class Reader>
+[[gnu::always_inline]] inline internal::Step Message<M>::replaceMessage(Reader& reader) {
+  unknownFields_.clear();
+  return internal::Replacing<Table<M>, M>(self()).read(reader);
 }
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
-  BinaryDecoder decoder(bytes);
-  if (decodeFields(decoder)) [[likely]]
-    return {};
-  return decoder.failure();
+  return internal::readInto<internal::DecodeMessage>(self(), bytes);
 }
 
 template <class M>
 std::expected<std::string, EncodeError> Message<M>::serialize() const {
   // Most messages fit here, and then their string is allocated once, at its final size.
-  std::array<std::byte, 1024> buffer;
-  BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::bold);
-  if (visitFields(encoder))
-    return std::string(reinterpret_cast<const char*>(buffer.data()), encoder.finish());
-  // Larger ones are counted first.
+  std::array<char, 16 << 10> buffer;
+  if (likelyEncodedSize() < buffer.size()) [[likely]] {
+    internal::Target target{.begin = buffer.data()};
+    if (const std::size_t size = internal::writeAll(self(), buffer, target); size != internal::doesNotFit)
+        [[likely]]
+      return std::string(buffer.data(), size);
+  }
+  // Larger ones are counted first. Bold guesses need some room beyond the encoding.
+  constexpr std::size_t slack = 128;
   const std::size_t size = encodedSize();
   if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
   std::string bytes;
-  bytes.resize_and_overwrite(size, [&](char* target, std::size_t room) {
-    const auto written = serializeInto(std::as_writable_bytes(std::span(target, room)));
+  bytes.resize_and_overwrite(size + slack, [&](char* begin, std::size_t room) {
+    const auto written = serializeInto(std::as_writable_bytes(std::span(begin, room)));
     assert(written == size);
     return written.value_or(0);
   });
@@ -111,23 +159,20 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
 
 template <class M>
 std::expected<std::size_t, EncodeError> Message<M>::serializeInto(std::span<std::byte> buffer) const {
-  BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::bold);
-  if (!visitFields(encoder)) [[unlikely]]
-    return serializeCarefully(buffer);
-  encoder.wipeOverrun();
-  return encoder.finish();
-}
-
-// For where it may have been a bold guess that took too much room.
-template <class M>
-std::expected<std::size_t, EncodeError> Message<M>::serializeCarefully(std::span<std::byte> buffer) const {
-  BinaryEncoder encoder(buffer, BinaryEncoder::Guesses::careful);
-  if (const auto walked = visitFields(encoder); !walked) {
-    std::ranges::fill(buffer, std::byte{0});
-    return std::unexpected(walked.error());
+  char* const begin = reinterpret_cast<char*>(buffer.data());
+  const std::span room(begin, std::min(buffer.size(), BinaryEncoder::largestEncoding));
+  internal::Target target{.begin = begin};
+  std::size_t size = internal::writeAll(self(), room, target);
+  if (size == internal::doesNotFit) [[unlikely]] {
+    // It may have been a bold guess that took too much room.
+    target.guessing = internal::Target::Guesses::careful;
+    size = internal::writeAll(self(), room, target);
   }
-  encoder.wipeOverrun();
-  return encoder.finish();
+  if (size == internal::doesNotFit) [[unlikely]] {
+    std::ranges::fill(buffer, std::byte{0});
+    return std::unexpected(target.error);
+  }
+  return size;
 }
 
 template <class M>

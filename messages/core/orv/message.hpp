@@ -4,33 +4,43 @@
 #include <cstddef>
 #include <cstdint>
 #include <expected>
+#include <functional>
 #include <span>
 #include <string>
 #include <string_view>
 #include <type_traits>
 #include <utility>
 
-#include <orv/binary_decoder.hpp>
-#include <orv/binary_encoder.hpp>
+#include <orv/decode_error.hpp>
 #include <orv/decoder.hpp>
-#include <orv/descriptor.hpp>
+#include <orv/encode_error.hpp>
 #include <orv/field.hpp>
-#include <orv/hash_visitor.hpp>
 #include <orv/hasher.hpp>
+#include <orv/internal/rules.hpp>
 #include <orv/internal/storage.hpp>
-#include <orv/name_map.hpp>
-#include <orv/size_counter.hpp>
-#include <orv/text_renderer.hpp>
+#include <orv/internal/table.hpp>
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
 namespace orv {
 
+class BinaryDecoder;
+class BinaryEncoder;
+class SizeCounter;
+class HashVisitor;
+class TextRenderer;
+
+namespace internal {
+class Step;
+}
+
 // The base of every message type M: a regular value that owns all that it holds. M adds its full name, its
 // accessors, its storage and, in a private table `fields`, one row per field in ascending order of the
-// numbers; everything here derives from that table. messages/core/rules.hpp holds the rules themselves. M's
-// constructor is empty rather than defaulted: a defaulted one makes M() fill all of its memory with zeros
-// first, which costs a fifth of the decoding of a list.
+// numbers; everything here derives from that table. M's constructor is empty rather than defaulted: a
+// defaulted one makes M() fill all of its memory with zeros first.
+//
+// What is only declared here is compiled once for each type, by the line `template class orv::Message<M>;` in
+// a source that includes <orv/instantiate.hpp>.
 template <class M>
 class Message {
  public:
@@ -40,10 +50,10 @@ class Message {
   void setUnknownFields(UnknownStorage value) { unknownFields_ = std::move(value); }
 
   // Field numbers and text names.
-  static constexpr NameMap _protobuf_nameMap();
+  static constexpr NameMap _protobuf_nameMap() { return Table<M>::nameMap(); }
 
   // Full name and fields, with the types of nested messages.
-  static constexpr const MessageDescriptor& descriptor();
+  static constexpr const MessageDescriptor& descriptor() { return Table<M>::descriptor; }
 
   // No message has required fields.
   static constexpr bool isInitialized() { return true; }
@@ -51,24 +61,27 @@ class Message {
   // Reads fields into this message until the decoder has no more: values are replaced, nested messages
   // merged, lists grown. The decoder's error is returned as it was made; what was read before it stays.
   template <DecoderOf<M> D>
-  [[nodiscard]] DecodeResult<D> decodeMessage(D& decoder) {
-    return decodeFields(decoder);
+  [[nodiscard, gnu::always_inline]] inline DecodeResult<D> decodeMessage(D& decoder) {
+    return internal::readFields<Table<M>>(
+        self(), decoder, [&]<std::size_t index>(D & at) __attribute__((always_inline)) {
+          return internal::decodeRow<Table<M>, index>(self(), at);
+        });
   }
   [[nodiscard]] std::expected<void, DecodeError> decodeMessage(BinaryDecoder& decoder);
 
   // Hands the fields that are to be emitted to the visitor, in ascending order, the unknown fields last. The
   // visitor's first error ends the walk and is returned as it was made.
   template <VisitorOf<M> V>
-  [[nodiscard]] VisitResult<V> traverse(V& visitor) const {
-    return visitFields(visitor);
+  [[nodiscard, gnu::always_inline]] inline VisitResult<V> traverse(V& visitor) const {
+    return internal::visitFields<Table<M>>(self(), visitor);
   }
-  [[nodiscard]] BinaryEncoder::Result traverse(BinaryEncoder& visitor) const;
-  SizeCounter::Result traverse(SizeCounter& visitor) const;
-  HashVisitor::Result traverse(HashVisitor& visitor) const;
-  TextRenderer::Result traverse(TextRenderer& visitor) const;
+  [[nodiscard]] std::expected<void, EncodeError> traverse(BinaryEncoder& visitor) const;
+  std::expected<void, NeverFails> traverse(SizeCounter& visitor) const;
+  std::expected<void, NeverFails> traverse(HashVisitor& visitor) const;
+  std::expected<void, NeverFails> traverse(TextRenderer& visitor) const;
 
   // Equal fields, in ascending order, and equal unknown fields.
-  friend bool operator==(const M& left, const M& right) { return left.Message::hasEqualFields(right); }
+  friend bool operator==(const M& left, const M& right) { return left.Message::isEqual(right); }
 
   // As ==, for a message of any type: a message of another type is never equal.
   template <class Other>
@@ -114,6 +127,22 @@ class Message {
   // How many bytes serialize gives.
   std::size_t encodedSize() const;
 
+  // About how many bytes serialize gives, in constant time: lists are judged by their lengths, nested
+  // messages hardly count. Encoders guess by it how many bytes a message's length will take.
+  std::size_t likelyEncodedSize() const {
+    std::size_t size = 0;
+    Table<M>::forEachIndex([&]<std::size_t index>() {
+      if constexpr (Table<M>::template isFirstRow<index>)
+        size += internal::likelySize(Table<M>::template storage<index>(self()));
+    });
+    return size;
+  }
+
+  // As decodeMessage, into a message whose old contents go and whose memory is used again: what reparse does,
+  // for the messages nested in it.
+  template <class Reader>
+  internal::Step replaceMessage(Reader& reader);
+
  protected:
   Message() = default;
   Message(const Message&) = default;
@@ -123,55 +152,27 @@ class Message {
   ~Message() = default;
 
  private:
-  friend BinaryDecoder;  // reads nested messages
-  friend BinaryEncoder;  // guesses their sizes
-
   M& self() { return static_cast<M&>(*this); }
   const M& self() const { return static_cast<const M&>(*this); }
 
-  // The rules, each written once for every decoder, every visitor and every row.
-  template <class D>
-  DecodeResult<D> decodeFields(D& decoder);
-  template <std::size_t index, class D>
-  DecodeResult<D> decodeRow(D& decoder, std::uint32_t number);
-  template <class D, auto pointer, class Case>
-  DecodeResult<D> decodeField(D& decoder, const Field<pointer, Case>& row);
-
-  template <class D>
-  DecodeResult<D> replaceFields(D& decoder);
-  template <std::size_t index, class D>
-  DecodeResult<D> replaceRow(D& decoder, std::uint32_t number, std::uint64_t& rowsRead);
-  template <std::size_t index>
-  void resetRow(std::uint64_t rowsRead);
-  template <std::size_t index>
-  static constexpr std::uint64_t rowBits();
-
-  template <class V>
-  VisitResult<V> visitFields(V& visitor) const;
-  // Inlined by order: where g++ 12 calls it for some rows, a small message takes a tenth longer to encode.
-  template <std::size_t index, class V>
-  [[gnu::always_inline]] inline VisitResult<V> visitRowsFrom(V& visitor) const;
-  template <class V, auto pointer, class Case>
-  [[gnu::always_inline]] inline VisitResult<V> visitField(V& visitor, const Field<pointer, Case>& row) const;
-
-  [[gnu::noinline]] std::expected<std::size_t, EncodeError> serializeCarefully(
-      std::span<std::byte> buffer) const;
-
-  // Tables made from M's; a template, because M is not complete where this class is.
+  // M's table; a template, because M is not complete where this class is.
+  struct Rows {
+    template <class Complete>
+    static constexpr const auto& of() {
+      return Complete::fields;
+    }
+  };
   template <class Complete>
-  struct Constants;
+  using Table = internal::Table<Complete, Rows>;
 
-  // About how many bytes serialize gives: the elements of lists are judged by their size in memory, nested
-  // messages hardly count. Takes no time to speak of, however long the lists.
-  std::size_t likelyEncodedSize() const;
-
-  bool hasEqualFields(const M& other) const;
-  template <auto pointer, class Case>
-  bool hasEqualField(const M& other, const Field<pointer, Case>& row) const;
+  bool isEqual(const M& other) const {
+    return internal::haveEqualFields<Table<M>>(self(), other) && unknownFields_ == other.unknownFields_;
+  }
 
   UnknownStorage unknownFields_;
 };
 
 }  // namespace orv
 
-#include <orv/internal/rules.hpp>
+template <orv::internal::IsMessage M>
+struct std::hash<M> : orv::internal::StandardHash<M> {};

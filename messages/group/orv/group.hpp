@@ -25,7 +25,6 @@ class Group final : public Message<Group> {
     Initialization() noexcept {}
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
-    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
     // In the order given; duplicates are kept.
@@ -52,11 +51,10 @@ class Group final : public Message<Group> {
     MemberAdded() noexcept {}
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
-    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
-    const Member& member() const { return valueOrDefault(member_); }
-    Member& mutableMember() { return presentValue(member_); }
+    const Member& member() const { return internal::valueOrDefault(member_); }
+    Member& mutableMember() { return internal::presentValue(member_); }
     void setMember(Member value) { member_ = std::move(value); }
     bool hasMember() const { return member_.has_value(); }
     void clearMember() { member_.reset(); }
@@ -80,11 +78,10 @@ class Group final : public Message<Group> {
     MemberRemoved() noexcept {}
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
-    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
-    const Member& member() const { return valueOrDefault(member_); }
-    Member& mutableMember() { return presentValue(member_); }
+    const Member& member() const { return internal::valueOrDefault(member_); }
+    Member& mutableMember() { return internal::presentValue(member_); }
     void setMember(Member value) { member_ = std::move(value); }
     bool hasMember() const { return member_.has_value(); }
     void clearMember() { member_.reset(); }
@@ -108,11 +105,9 @@ class Group final : public Message<Group> {
     MemberLeft() noexcept {}
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
-    ByteBuffer& mutableGroupUuid() { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
     bool usesToken() const { return usesToken_; }
-    bool& mutableUsesToken() { return usesToken_; }
     void setUsesToken(bool value) { usesToken_ = value; }
 
    private:
@@ -138,20 +133,20 @@ class Group final : public Message<Group> {
   void setEvent(std::optional<OneOf_Event> value) { event_ = std::move(value); }
 
   // A case reads as a default payload unless it is the one held; writing it replaces what was held.
-  const Initialization& initialize() const { return caseOrDefault<Initialization>(event_); }
-  Initialization& mutableInitialize() { return presentCase<Initialization>(event_); }
+  const Initialization& initialize() const { return internal::caseOrDefault<Initialization>(event_); }
+  Initialization& mutableInitialize() { return internal::presentCase<Initialization>(event_); }
   void setInitialize(Initialization value) { event_ = std::move(value); }
 
-  const MemberAdded& memberAdded() const { return caseOrDefault<MemberAdded>(event_); }
-  MemberAdded& mutableMemberAdded() { return presentCase<MemberAdded>(event_); }
+  const MemberAdded& memberAdded() const { return internal::caseOrDefault<MemberAdded>(event_); }
+  MemberAdded& mutableMemberAdded() { return internal::presentCase<MemberAdded>(event_); }
   void setMemberAdded(MemberAdded value) { event_ = std::move(value); }
 
-  const MemberRemoved& memberRemoved() const { return caseOrDefault<MemberRemoved>(event_); }
-  MemberRemoved& mutableMemberRemoved() { return presentCase<MemberRemoved>(event_); }
+  const MemberRemoved& memberRemoved() const { return internal::caseOrDefault<MemberRemoved>(event_); }
+  MemberRemoved& mutableMemberRemoved() { return internal::presentCase<MemberRemoved>(event_); }
   void setMemberRemoved(MemberRemoved value) { event_ = std::move(value); }
 
-  const MemberLeft& memberLeft() const { return caseOrDefault<MemberLeft>(event_); }
-  MemberLeft& mutableMemberLeft() { return presentCase<MemberLeft>(event_); }
+  const MemberLeft& memberLeft() const { return internal::caseOrDefault<MemberLeft>(event_); }
+  MemberLeft& mutableMemberLeft() { return internal::presentCase<MemberLeft>(event_); }
   void setMemberLeft(MemberLeft value) { event_ = std::move(value); }
 
  private:

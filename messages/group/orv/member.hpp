@@ -23,8 +23,8 @@ class Member final : public Message<Member> {
   void setHandle(Text value) { handle_ = std::move(value); }
 
   // The token that the member joined with, if any. Changing it in place makes it present.
-  const Text& tokenID() const { return valueOrDefault(tokenID_); }
-  Text& mutableTokenID() { return presentValue(tokenID_); }
+  const Text& tokenID() const { return internal::valueOrDefault(tokenID_); }
+  Text& mutableTokenID() { return internal::presentValue(tokenID_); }
   void setTokenID(Text value) { tokenID_ = std::move(value); }
   bool hasTokenID() const { return tokenID_.has_value(); }
   void clearTokenID() { tokenID_.reset(); }

@@ -47,8 +47,8 @@ class JoinResponse final : public Message<JoinResponse> {
       void setMemberHandles(std::vector<Text> value) { memberHandles_ = std::move(value); }
 
       // Bytes of the application's own, if any.
-      const ByteBuffer& userInfo() const { return valueOrDefault(userInfo_); }
-      ByteBuffer& mutableUserInfo() { return presentValue(userInfo_); }
+      const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
+      ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }
       void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
       bool hasUserInfo() const { return userInfo_.has_value(); }
       void clearUserInfo() { userInfo_.reset(); }
@@ -82,12 +82,12 @@ class JoinResponse final : public Message<JoinResponse> {
     void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
 
     // A case reads as a default payload unless it is the one held; writing it replaces what was held.
-    const DeniedContent& denied() const { return caseOrDefault<DeniedContent>(operation_); }
-    DeniedContent& mutableDenied() { return presentCase<DeniedContent>(operation_); }
+    const DeniedContent& denied() const { return internal::caseOrDefault<DeniedContent>(operation_); }
+    DeniedContent& mutableDenied() { return internal::presentCase<DeniedContent>(operation_); }
     void setDenied(DeniedContent value) { operation_ = std::move(value); }
 
-    const ApprovalContent& approved() const { return caseOrDefault<ApprovalContent>(operation_); }
-    ApprovalContent& mutableApproved() { return presentCase<ApprovalContent>(operation_); }
+    const ApprovalContent& approved() const { return internal::caseOrDefault<ApprovalContent>(operation_); }
+    ApprovalContent& mutableApproved() { return internal::presentCase<ApprovalContent>(operation_); }
     void setApproved(ApprovalContent value) { operation_ = std::move(value); }
 
    private:
@@ -106,8 +106,8 @@ class JoinResponse final : public Message<JoinResponse> {
 
   JoinResponse() noexcept {}
 
-  const ByteBuffer& encryptedData() const { return valueOrDefault(encryptedData_); }
-  ByteBuffer& mutableEncryptedData() { return presentValue(encryptedData_); }
+  const ByteBuffer& encryptedData() const { return internal::valueOrDefault(encryptedData_); }
+  ByteBuffer& mutableEncryptedData() { return internal::presentValue(encryptedData_); }
   void setEncryptedData(ByteBuffer value) { encryptedData_ = std::move(value); }
   bool hasEncryptedData() const { return encryptedData_.has_value(); }
   void clearEncryptedData() { encryptedData_.reset(); }

@@ -6,12 +6,11 @@
 #include <cstdint>
 #include <cstring>
 #include <string_view>
-#include <type_traits>
 #include <utility>
 
 #include <orv/internal/words.hpp>
 
-namespace orv {
+namespace orv::internal {
 
 // Owned bytes. Up to 39 of them live inside the object, which covers a 36-character identifier, a 16-byte
 // UUID and a typical handle without an allocation; longer contents live in one heap block of their own.
@@ -21,12 +20,8 @@ class InlineBytes {
   static constexpr std::size_t inlineCapacity = 39;
   static constexpr std::size_t objectSize = 40;
 
-  constexpr InlineBytes() noexcept {
-    if (std::is_constant_evaluated()) {
-      for (unsigned char& byte : raw_) byte = 0;
-    }
-    raw_[tagOffset] = 0;
-  }
+  // All bytes are set, so that whole words may be read from then on.
+  constexpr InlineBytes() noexcept : raw_{} {}
   InlineBytes(const InlineBytes& other) {
     if (other.isOnHeap()) [[unlikely]]
       copyBlock(other.view());
@@ -68,7 +63,7 @@ class InlineBytes {
   }
   std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
 
-  // Compares all words: what is behind the contents, which may never have been written, is masked away.
+  // Compares all words: what is behind the contents is masked away.
   friend bool operator==(const InlineBytes& left, const InlineBytes& right) {
     if (left.isOnHeap() || right.isOnHeap()) [[unlikely]]
       return left.view() == right.view();
@@ -80,13 +75,10 @@ class InlineBytes {
            }) == 0;
   }
 
-  // Whether `bytes`, from whose start on `readable` bytes may be read, fit inside an object and are ASCII.
-  // False for longer bytes and at the end of what may be read, whatever they are.
-  static bool isShortAscii(std::string_view bytes, std::size_t readable) {
-    if (bytes.size() > inlineCapacity || readable < objectSize) return false;
-    const char* const mask = contentMask(bytes.size());
-    return (anyWord([&](std::size_t at) { return wordAt(bytes.data() + at) & wordAt(mask + at); }) &
-            highBits) == 0;
+  // Whether the first `size` bytes are ASCII, of objectSize that may be read; `size` is what fits inside.
+  static bool isAsciiWithin(const std::byte* bytes, std::size_t size) {
+    const char* const mask = contentMask(size);
+    return (anyWord([&](std::size_t at) { return wordAt(bytes + at) & wordAt(mask + at); }) & highBits) == 0;
   }
 
   // All bits of what a function gives for the places of an object's words, without a loop.
@@ -110,15 +102,15 @@ class InlineBytes {
   void assign(std::string_view bytes);
   void append(std::string_view bytes);
 
-  // As assign, for bytes that are not this object's own, where `readable` bytes may be read from their start
-  // on: short contents are then copied in one fixed-size step, whatever their length.
-  void assignReadable(std::string_view bytes, std::size_t readable) {
-    if (bytes.size() <= inlineCapacity && readable >= objectSize && !isOnHeap()) [[likely]] {
-      std::memcpy(raw_, bytes.data(), objectSize);
-      raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
-    } else {
-      assign(bytes);
+  // Takes the first `size` bytes, which fit inside, of objectSize that may be read and are not this object's
+  // own: one step of a fixed size, whatever their number.
+  void assignWithin(const std::byte* bytes, std::size_t size) {
+    if (isOnHeap()) [[unlikely]] {
+      assign({reinterpret_cast<const char*>(bytes), size});
+      return;
     }
+    std::memcpy(raw_, bytes, objectSize);
+    raw_[tagOffset] = static_cast<unsigned char>(size);
   }
 
  private:
@@ -161,4 +153,4 @@ class InlineBytes {
   alignas(Block) unsigned char raw_[objectSize];
 };
 
-}  // namespace orv
+}  // namespace orv::internal

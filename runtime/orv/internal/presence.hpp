@@ -3,7 +3,7 @@
 
 #include <optional>
 
-namespace orv {
+namespace orv::internal {
 
 // The value for change in place; an absent one becomes present with its default.
 template <class T>
@@ -15,4 +15,4 @@ T& presentValue(std::optional<T>& value) {
   return value.has_value() ? *value : value.emplace();
 }
 
-}  // namespace orv
+}  // namespace orv::internal

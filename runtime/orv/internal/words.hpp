@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <cstring>
 
-namespace orv {
+namespace orv::internal {
 
 // Eight bytes, which need not be aligned.
 inline std::uint64_t wordAt(const void* bytes) {
@@ -16,4 +16,4 @@ inline std::uint64_t wordAt(const void* bytes) {
 // Set in each byte that is not ASCII.
 inline constexpr std::uint64_t highBits = 0x8080808080808080;
 
-}  // namespace orv
+}  // namespace orv::internal

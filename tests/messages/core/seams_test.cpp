@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include <orv/all_messages.hpp>
+#include <orv/orv.hpp>
 #include "tests/testing/hex.hpp"
 #include "tests/testing/scripted_decoder.hpp"
 #include "tests/testing/tracing_visitor.hpp"

@@ -1,71 +1,79 @@
-// The rules of all messages, over a message's field table: names, decode loop, encode walk, equality.
-// Included by message.hpp; the rules for the built-in decoders and visitors are compiled in the library
-// (built_in.hpp).
+// The rules of all messages, over a message's field table: decode loop, encode walk, equality. A rule that a
+// small message's whole time goes into is inlined into the loop of the decoder or visitor.
 #pragma once
 
-#include <array>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
 #include <optional>
-#include <tuple>
-#include <type_traits>
 #include <utility>
 #include <variant>
 #include <vector>
 
-#include <orv/enumeration.hpp>
-#include <orv/message.hpp>
+#include <orv/decoder.hpp>
+#include <orv/internal/field_traits.hpp>
+#include <orv/internal/table.hpp>
+#include <orv/visitor.hpp>
 
-namespace orv::rules {
+namespace orv::internal {
 
-// What a field's storage holds, and in which form.
-template <class Storage>
-struct StorageTraits {
-  using Value = Storage;
-  static constexpr bool isRepeated = false;
-};
-template <class T>
-struct StorageTraits<std::optional<T>> {
-  using Value = T;
-  static constexpr bool isRepeated = false;
-};
-template <class T>
-struct StorageTraits<std::vector<T>> {
-  using Value = T;
-  static constexpr bool isRepeated = true;
-};
+template <class Next>
+[[gnu::always_inline]] inline bool isAtField(const Next& next) {
+  return next && (*next).has_value();
+}
 
-template <class Pointer>
-struct PointedTo;
-template <class M, class Storage>
-struct PointedTo<Storage M::*> {
-  using Type = Storage;
-};
+// Takes fields that belong to the row at `index`, then to those behind it, while there are any.
+template <class Table, std::size_t index, class M, class D, class Next, class Take>
+[[gnu::always_inline]] inline DecodeResult<D> takeFieldsFrom(M& message, D& decoder, Next& next,
+                                                             bool& isKnown, Take& take) {
+  if constexpr (index < Table::size) {
+    while (**next == Table::template number<index>) {
+      isKnown = true;
+      if (auto result = take.template operator()<index>(decoder); !result) [[unlikely]]
+        return result;
+      next = decoder.nextFieldNumber(message);
+      if (!isAtField(next)) return {};
+    }
+    return takeFieldsFrom<Table, index + 1>(message, decoder, next, isKnown, take);
+  }
+  return {};
+}
 
-template <class T>
-concept AnyMessage = std::derived_from<T, Message<T>>;
-template <class T>
-concept AnyEnumeration = std::derived_from<T, Enumeration<T>>;
+// The decode loop: `take` is called with the index of each field's row and the decoder that stands at it. A
+// number without a row is left to the decoder, which keeps the field as unknown. Most encoders write fields
+// in ascending order, so the row of a field is looked for from the row of the one before it on.
+template <class Table, class M, class D, class Take>
+[[gnu::always_inline]] inline DecodeResult<D> readFields(M& message, D& decoder, Take take) {
+  auto next = decoder.nextFieldNumber(message);
+  while (isAtField(next)) {
+    bool isKnown = false;
+    if (auto result = takeFieldsFrom<Table, 0>(message, decoder, next, isKnown, take); !result) [[unlikely]]
+      return result;
+    if (!isKnown) next = decoder.nextFieldNumber(message);
+  }
+  if (!next) [[unlikely]]
+    return std::unexpected(next.error());
+  return {};
+}
 
 // The decode action for one occurrence of a field that is no oneof member: the operation for the type of its
 // storage.
 template <class D, class Storage>
-DecodeResult<D> decodeInto(D& decoder, Storage& storage) {
-  using Value = typename StorageTraits<Storage>::Value;
-  constexpr bool isRepeated = StorageTraits<Storage>::isRepeated;
-  if constexpr (std::same_as<Value, Text> && isRepeated) {
+[[gnu::always_inline]] inline DecodeResult<D> decodeField(D& decoder, Storage& storage) {
+  constexpr ValueType type = valueTypeOf<typename StorageTraits<Storage>::Value>();
+  constexpr bool isRepeated = StorageTraits<Storage>::kind == FieldKind::repeated;
+  if constexpr (type == ValueType::string && isRepeated) {
     return decoder.decodeRepeatedStringField(storage);
-  } else if constexpr (std::same_as<Value, Text>) {
+  } else if constexpr (type == ValueType::string) {
     return decoder.decodeSingularStringField(storage);
-  } else if constexpr (std::same_as<Value, ByteBuffer>) {
+  } else if constexpr (type == ValueType::bytes) {
     return decoder.decodeSingularBytesField(storage);
-  } else if constexpr (std::same_as<Value, bool>) {
+  } else if constexpr (type == ValueType::boolean) {
     return decoder.decodeSingularBoolField(storage);
-  } else if constexpr (std::same_as<Value, std::uint32_t>) {
+  } else if constexpr (type == ValueType::uint32) {
     return decoder.decodeSingularUInt32Field(storage);
-  } else if constexpr (AnyEnumeration<Value>) {
+  } else if constexpr (type == ValueType::enumeration) {
     return decoder.decodeSingularEnumField(storage);
   } else if constexpr (isRepeated) {
     return decoder.decodeRepeatedMessageField(storage);
@@ -78,279 +86,162 @@ DecodeResult<D> decodeInto(D& decoder, Storage& storage) {
 // replaces any other. Unless it is read whole, and the decoder accepts it where the group held a case, the
 // group stays as it was.
 template <class Case, class D, class... Cases>
-DecodeResult<D> decodeOneofMember(D& decoder, std::optional<std::variant<Cases...>>& group) {
-  const bool heldACase = group.has_value();
-  Case* const held = heldACase ? std::get_if<Case>(&*group) : nullptr;
-  if constexpr (RereadingDecoder<D>) {
-    if (!heldACase) {
-      if (!decoder.isAtLengthDelimitedField()) return {};
-      if (auto read = decoder.readNewMessage(presentCase<Case>(group)); !read) {
-        group.reset();
-        return read;
-      }
-      return {};
+[[gnu::always_inline]] inline DecodeResult<D> decodeCase(D& decoder,
+                                                         std::optional<std::variant<Cases...>>& group) {
+  if constexpr (requires { decoder.template decodeCase<Case>(group); }) {
+    return decoder.template decodeCase<Case>(group);
+  } else {
+    const bool heldACase = group.has_value();
+    std::optional<Case> working;
+    if (heldACase) {
+      if (const Case* const held = std::get_if<Case>(&*group)) working = *held;
     }
-    if (held != nullptr) {
-      if (auto checked = decoder.checkMessageField(*held); !checked) return checked;
+    if (auto result = decoder.decodeSingularMessageField(working); !result) return result;
+    if (!working.has_value()) return {};
+    if (heldACase) {
       if (auto accepted = decoder.handleConflictingOneOf(); !accepted) return accepted;
-      return decoder.mergeMessageField(*held);
     }
+    group.emplace(std::move(*working));
+    return {};
   }
-  std::optional<Case> working;
-  if (held != nullptr) working = *held;
-  if (auto result = decoder.decodeSingularMessageField(working); !result) return result;
-  if (!working.has_value()) return {};
-  if (heldACase) {
-    if (auto accepted = decoder.handleConflictingOneOf(); !accepted) return accepted;
+}
+
+// One occurrence of the field in the row at `index`.
+template <class Table, std::size_t index, class M, class D>
+[[gnu::always_inline]] inline DecodeResult<D> decodeRow(M& message, D& decoder) {
+  auto& storage = Table::template storage<index>(message);
+  if constexpr (Table::template isCase<index>) {
+    return decodeCase<typename Table::template Case<index>>(decoder, storage);
+  } else {
+    return decodeField(decoder, storage);
   }
-  group.emplace(std::move(*working));
-  return {};
 }
 
 // The visitor operation for the type of a field's value.
 template <class V, class Value>
-VisitResult<V> visitValue(V& visitor, const Value& value, std::uint32_t number) {
-  if constexpr (std::same_as<Value, Text>) {
+[[gnu::always_inline]] inline VisitResult<V> visitValue(V& visitor, const Value& value,
+                                                        std::uint32_t number) {
+  constexpr ValueType type = valueTypeOf<Value>();
+  if constexpr (type == ValueType::string) {
     return visitor.visitSingularStringField(value, number);
-  } else if constexpr (std::same_as<Value, ByteBuffer>) {
+  } else if constexpr (type == ValueType::bytes) {
     return visitor.visitSingularBytesField(value, number);
-  } else if constexpr (std::same_as<Value, bool>) {
+  } else if constexpr (type == ValueType::boolean) {
     return visitor.visitSingularBoolField(value, number);
-  } else if constexpr (std::same_as<Value, std::uint32_t>) {
+  } else if constexpr (type == ValueType::uint32) {
     return visitor.visitSingularUInt32Field(value, number);
-  } else if constexpr (AnyEnumeration<Value>) {
+  } else if constexpr (type == ValueType::enumeration) {
     return visitor.visitSingularEnumField(value, number);
   } else {
     return visitor.visitSingularMessageField(value, number);
   }
 }
 
-// A field with implicit presence is left out when it holds its default.
-template <class V, class Value>
-VisitResult<V> visitStorage(V& visitor, const Value& value, std::uint32_t number) {
-  bool isDefault;
-  if constexpr (std::same_as<Value, bool>) {
-    isDefault = !value;
+// Whether a field is to be emitted; of a oneof, whether any of its members is. One with implicit presence is
+// left out when it holds its default, one with explicit presence when absent, a list when empty.
+template <class Storage>
+[[gnu::always_inline]] inline bool isEmitted(const Storage& storage) {
+  constexpr FieldKind kind = StorageTraits<Storage>::kind;
+  if constexpr (kind == FieldKind::repeated) {
+    return !storage.empty();
+  } else if constexpr (kind != FieldKind::implicitPresence) {
+    return storage.has_value();
+  } else if constexpr (std::same_as<Storage, bool>) {
+    return storage;
   } else {
-    isDefault = value.isEmpty();
-  }
-  if (isDefault) return {};
-  return visitValue(visitor, value, number);
-}
-
-// A field with explicit presence is emitted when present, whatever its value.
-template <class V, class Value>
-VisitResult<V> visitStorage(V& visitor, const std::optional<Value>& value, std::uint32_t number) {
-  if (!value.has_value()) return {};
-  return visitValue(visitor, *value, number);
-}
-
-// A list that is not empty is handed over in one call.
-template <class V, class Element>
-VisitResult<V> visitStorage(V& visitor, const std::vector<Element>& list, std::uint32_t number) {
-  if (list.empty()) return {};
-  if constexpr (std::same_as<Element, Text>) {
-    return visitor.visitRepeatedStringField(list, number);
-  } else {
-    return visitor.visitRepeatedMessageField(list, number);
+    return !storage.isEmpty();
   }
 }
 
-// About how many bytes a field takes in the encoding, tag and length included.
+template <class Table, std::size_t index, class M, class V>
+[[gnu::always_inline]] inline VisitResult<V> visitRow(const M& message, V& visitor) {
+  const auto& storage = Table::template storage<index>(message);
+  using Storage = typename Table::template Storage<index>;
+  constexpr std::uint32_t number = Table::template number<index>;
+  if (!isEmitted(storage)) return {};
+  if constexpr (Table::template isCase<index>) {
+    const auto* const held = std::get_if<typename Table::template Case<index>>(&*storage);
+    if (held == nullptr) return {};
+    return visitor.visitSingularMessageField(*held, number);
+  } else if constexpr (StorageTraits<Storage>::kind == FieldKind::implicitPresence) {
+    return visitValue(visitor, storage, number);
+  } else if constexpr (StorageTraits<Storage>::kind != FieldKind::repeated) {
+    return visitValue(visitor, *storage, number);
+  } else if constexpr (std::same_as<typename StorageTraits<Storage>::Value, Text>) {
+    return visitor.visitRepeatedStringField(storage, number);
+  } else {
+    return visitor.visitRepeatedMessageField(storage, number);
+  }
+}
+
+template <class Table, std::size_t index, class M, class V>
+[[gnu::always_inline]] inline VisitResult<V> visitRowsFrom(const M& message, V& visitor) {
+  if constexpr (index == Table::size) {
+    return message.unknownFields().traverse(visitor);
+  } else {
+    if (auto result = visitRow<Table, index>(message, visitor); !result) [[unlikely]]
+      return result;
+    return visitRowsFrom<Table, index + 1>(message, visitor);
+  }
+}
+
+// How many fields are emitted, the unknown ones not counted.
+template <class Table, class M>
+std::size_t countEmitted(const M& message) {
+  std::size_t count = 0;
+  Table::forEachIndex([&]<std::size_t index>() {
+    if constexpr (Table::template isFirstRow<index>)
+      count += isEmitted(Table::template storage<index>(message)) ? 1 : 0;
+  });
+  return count;
+}
+
+// The encode walk, between the visitor's beginMessage and endMessage where it has them.
+template <class Table, class M, class V>
+[[gnu::always_inline]] inline VisitResult<V> visitFields(const M& message, V& visitor) {
+  if constexpr (requires { visitor.beginMessage(message, std::size_t{0}); }) {
+    if (auto begun = visitor.beginMessage(message, countEmitted<Table>(message)); !begun) return begun;
+  }
+  if constexpr (requires { visitor.endMessage(message); }) {
+    if (auto walked = visitRowsFrom<Table, 0>(message, visitor); !walked) return walked;
+    return visitor.endMessage(message);
+  } else {
+    return visitRowsFrom<Table, 0>(message, visitor);
+  }
+}
+
+// Each storage is compared once: a oneof group as a whole, at its first row.
+template <class Table, class M>
+[[gnu::always_inline]] inline bool haveEqualFields(const M& left, const M& right) {
+  const auto areEqual = [&]<std::size_t index>() {
+    if constexpr (Table::template isFirstRow<index>)
+      return Table::template storage<index>(left) == Table::template storage<index>(right);
+    return true;
+  };
+  return [&]<std::size_t... indices>(std::index_sequence<indices...>) {
+    return (areEqual.template operator()<indices>() && ...);
+  }
+  (std::make_index_sequence<Table::size>());
+}
+
+// About how many bytes a field takes in the encoding, tag and length included. Lists are judged by the size
+// of their elements in memory: a member with a typical handle and token takes two thirds of it, a typical
+// handle as well.
 template <class Storage>
 std::size_t likelySize(const Storage& storage) {
   constexpr std::size_t headSize = 2;
-  if constexpr (requires { storage.sizeInBytes(); }) {
+  if constexpr (StorageTraits<Storage>::kind == FieldKind::repeated) {
+    return storage.size() * (sizeof(typename Storage::value_type) * 2 / 3);
+  } else if constexpr (requires { storage.sizeInBytes(); }) {
     return headSize + storage.sizeInBytes();
+  } else if constexpr (requires { storage.size(); }) {
+    return headSize + storage.size();
   } else if constexpr (requires { storage.has_value(); }) {
-    return storage.has_value() ? likelySize(*storage) : 0;
-  } else if constexpr (StorageTraits<Storage>::isRepeated) {
-    // A member with a typical handle and token takes two thirds of its size in memory, a typical handle as
-    // well.
-    constexpr std::size_t elementSize = sizeof(typename Storage::value_type) * 2 / 3;
-    return storage.size() * elementSize;
+    if constexpr (requires { storage->isEmpty(); }) return storage.has_value() ? likelySize(*storage) : 0;
+    return headSize;
   } else {
     return headSize;
   }
 }
 
-// Whether Case is the first alternative of the group that is kept in this storage.
-template <class Case, class Storage>
-inline constexpr bool isFirstCase = false;
-template <class Case, class... Others>
-inline constexpr bool isFirstCase<Case, std::optional<std::variant<Case, Others...>>> = true;
-
-template <class Value>
-constexpr ValueType valueTypeOf() {
-  if constexpr (std::same_as<Value, Text>) return ValueType::string;
-  if constexpr (std::same_as<Value, ByteBuffer>) return ValueType::bytes;
-  if constexpr (std::same_as<Value, bool>) return ValueType::boolean;
-  if constexpr (std::same_as<Value, std::uint32_t>) return ValueType::uint32;
-  if constexpr (AnyEnumeration<Value>) return ValueType::enumeration;
-  return ValueType::message;
-}
-
-template <class Storage, class Case>
-constexpr FieldKind kindOf() {
-  if constexpr (!std::is_void_v<Case>) return FieldKind::oneofMember;
-  if constexpr (StorageTraits<Storage>::isRepeated) return FieldKind::repeated;
-  if constexpr (AnyMessage<typename StorageTraits<Storage>::Value>) return FieldKind::singularMessage;
-  if constexpr (std::same_as<typename StorageTraits<Storage>::Value, Storage>)
-    return FieldKind::implicitPresence;
-  return FieldKind::explicitPresence;
-}
-
-template <auto pointer, class Case>
-constexpr FieldDescriptor descriptorOfRow(const Field<pointer, Case>& row, std::uint8_t oneof) {
-  using Storage = typename PointedTo<decltype(pointer)>::Type;
-  using Value = std::conditional_t<std::is_void_v<Case>, typename StorageTraits<Storage>::Value, Case>;
-  FieldDescriptor field{row.number, row.name, kindOf<Storage, Case>(), valueTypeOf<Value>(), oneof,
-                        nullptr,    {}};
-  if constexpr (AnyMessage<Value>) field.message = &Value::descriptor();
-  if constexpr (AnyEnumeration<Value>) field.cases = Value::_protobuf_nameMap();
-  return field;
-}
-
-}  // namespace orv::rules
-
-namespace orv {
-
-template <class M>
-constexpr NameMap Message<M>::_protobuf_nameMap() {
-  return NameMap(Constants<M>::names);
-}
-
-template <class M>
-constexpr const MessageDescriptor& Message<M>::descriptor() {
-  return Constants<M>::descriptor;
-}
-
-template <class M>
-template <class Complete>
-struct Message<M>::Constants {
-  // How many oneofs begin before the one that the row belongs to: each begins with its first case.
-  template <class C, auto pointer, class Case>
-  static constexpr std::uint8_t oneofIndex(const Field<pointer, Case>&) {
-    std::uint8_t begun = 0;
-    std::uint8_t index = 0;
-    const auto look = [&]<auto other, class OtherCase>(const Field<other, OtherCase>&) {
-      if constexpr (!std::is_void_v<OtherCase>) {
-        if (rules::isFirstCase<OtherCase, typename rules::PointedTo<decltype(other)>::Type>) ++begun;
-        if constexpr (std::is_same_v<std::integral_constant<decltype(pointer), pointer>,
-                                     std::integral_constant<decltype(other), other>>)
-          index = static_cast<std::uint8_t>(begun - 1);
-      }
-    };
-    std::apply([&](const auto&... rows) { (look(rows), ...); }, C::fields);
-    return index;
-  }
-
-  static constexpr auto names = std::apply(
-      [](const auto&... rows) {
-        return std::array<NameMap::Entry, sizeof...(rows)>{NameMap::Entry{rows.number, rows.name}...};
-      },
-      Complete::fields);
-  static constexpr auto fields = std::apply(
-      [](const auto&... rows) {
-        return std::array<FieldDescriptor, sizeof...(rows)>{
-            rules::descriptorOfRow(rows, oneofIndex<Complete>(rows))...};
-      },
-      Complete::fields);
-  static constexpr MessageDescriptor descriptor{Complete::protoMessageName, fields};
-};
-
-template <class M>
-template <class D>
-DecodeResult<D> Message<M>::decodeFields(D& decoder) {
-  for (;;) {
-    const auto number = decoder.nextFieldNumber(self());
-    if (!number) [[unlikely]]
-      return std::unexpected(number.error());
-    if (!number->has_value()) return {};
-    auto result = decodeRow<0>(decoder, **number);
-    if (!result) [[unlikely]]
-      return result;
-  }
-}
-
-// Finds the row of the number. A number without a row is left to the decoder, which keeps it as unknown.
-template <class M>
-template <std::size_t index, class D>
-DecodeResult<D> Message<M>::decodeRow(D& decoder, std::uint32_t number) {
-  if constexpr (index == std::tuple_size_v<decltype(M::fields)>) {
-    return {};
-  } else {
-    constexpr auto row = std::get<index>(M::fields);
-    if (number == row.number) return decodeField(decoder, row);
-    return decodeRow<index + 1>(decoder, number);
-  }
-}
-
-template <class M>
-template <class D, auto pointer, class Case>
-DecodeResult<D> Message<M>::decodeField(D& decoder, const Field<pointer, Case>&) {
-  if constexpr (std::is_void_v<Case>) {
-    return rules::decodeInto(decoder, self().*pointer);
-  } else {
-    return rules::decodeOneofMember<Case>(decoder, self().*pointer);
-  }
-}
-
-template <class M>
-template <class V>
-VisitResult<V> Message<M>::visitFields(V& visitor) const {
-  return visitRowsFrom<0>(visitor);
-}
-
-template <class M>
-template <std::size_t index, class V>
-VisitResult<V> Message<M>::visitRowsFrom(V& visitor) const {
-  if constexpr (index == std::tuple_size_v<decltype(M::fields)>) {
-    return unknownFields_.traverse(visitor);
-  } else {
-    constexpr auto row = std::get<index>(M::fields);
-    if (auto result = visitField(visitor, row); !result) [[unlikely]]
-      return result;
-    return visitRowsFrom<index + 1>(visitor);
-  }
-}
-
-template <class M>
-template <class V, auto pointer, class Case>
-VisitResult<V> Message<M>::visitField(V& visitor, const Field<pointer, Case>& row) const {
-  const auto& storage = self().*pointer;
-  if constexpr (std::is_void_v<Case>) {
-    return rules::visitStorage(visitor, storage, row.number);
-  } else {
-    const Case* const held = storage.has_value() ? std::get_if<Case>(&*storage) : nullptr;
-    if (held == nullptr) return {};
-    return visitor.visitSingularMessageField(*held, row.number);
-  }
-}
-
-template <class M>
-std::size_t Message<M>::likelyEncodedSize() const {
-  const auto sizeOfRow = [&]<auto pointer, class Case>(const Field<pointer, Case>&)->std::size_t {
-    return rules::likelySize(self().*pointer);
-  };
-  const auto sizeOfRows = [&](const auto&... rows) { return (std::size_t{0} + ... + sizeOfRow(rows)); };
-  return std::apply(sizeOfRows, M::fields);
-}
-
-template <class M>
-bool Message<M>::hasEqualFields(const M& other) const {
-  const auto areEqual = [&](const auto&... rows) { return (hasEqualField(other, rows) && ...); };
-  return std::apply(areEqual, M::fields) && unknownFields_ == other.unknownFields_;
-}
-
-template <class M>
-template <auto pointer, class Case>
-bool Message<M>::hasEqualField(const M& other, const Field<pointer, Case>&) const {
-  const auto& storage = self().*pointer;
-  // A oneof group is compared as a whole, once: with its first case.
-  if constexpr (!std::is_void_v<Case> && !rules::isFirstCase<Case, std::remove_cvref_t<decltype(storage)>>)
-    return true;
-  return storage == other.*pointer;
-}
-
-}  // namespace orv
+}  // namespace orv::internal

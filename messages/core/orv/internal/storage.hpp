@@ -1,18 +1,22 @@
 // How accessors read and change fields that may be absent.
 #pragma once
 
+#include <cstddef>
+#include <new>
 #include <optional>
 #include <utility>
 #include <variant>
 
 #include <orv/internal/presence.hpp>
 
-namespace orv {
+namespace orv::internal {
 
-// What a getter gives for an absent field: one default value per type, made on first use and never freed.
+// What a getter gives for an absent field: one default value per type, made on first use, which allocates
+// nothing, and never destroyed.
 template <class T>
 const T& defaultInstance() {
-  static const T& instance = *new T();
+  alignas(T) static std::byte storage[sizeof(T)];
+  static const T& instance = *::new (static_cast<void*>(storage)) T();
   return instance;
 }
 
@@ -39,4 +43,4 @@ Case& presentCase(std::optional<std::variant<Cases...>>& group) {
   return std::get<Case>(group.emplace(std::in_place_type<Case>));
 }
 
-}  // namespace orv
+}  // namespace orv::internal

@@ -1,0 +1,134 @@
+#include <orv/internal/field_reader.hpp>
+
+#include <cassert>
+
+#include <orv/utf8.hpp>
+
+namespace orv::internal {
+
+// Outside the fast path what is wrong is found by a WireReader, which says it.
+
+bool FieldReader::isWellFormed(const std::byte* text, std::size_t size) {
+  return utf8::isWellFormed({reinterpret_cast<const char*>(text), size});
+}
+
+OutermostFrame& FieldReader::outermost(Frame& frame) {
+  Frame* at = &frame;
+  while (at->outer != nullptr) at = at->outer;
+  return static_cast<OutermostFrame&>(*at);
+}
+
+Step FieldReader::askHook(Frame& frame) {
+  if (frame.mode == Frame::Mode::confirmed) return {};
+  OutermostFrame& outermost = FieldReader::outermost(frame);
+  const auto answer = outermost.conflictHook();
+  if (answer) return {};
+  outermost.end = OutermostFrame::End::refusal;
+  outermost.refusal = answer.error();
+  return std::unexpected(Failed());
+}
+
+void FieldReader::note(DecodeCause cause, const std::byte* at, std::uint32_t length, std::uint32_t detail,
+                       Frame& frame, std::uint32_t number) {
+  OutermostFrame& outermost = FieldReader::outermost(frame);
+  outermost.end = OutermostFrame::End::fault;
+  outermost.cause = cause;
+  outermost.at = at;
+  outermost.length = length;
+  outermost.detail = detail;
+  outermost.depth = frame.nesting;
+  for (const Frame* inner = &frame; inner != nullptr; number = inner->number, inner = inner->outer) {
+    if (inner->nesting < outermost.numbers.size()) outermost.numbers[inner->nesting] = number;
+  }
+}
+
+void OutermostFrame::describe(DecodeError& error) const {
+  assert(end != End::none && "only what has failed has an error");
+  if (end == End::refusal) {
+    error = *refusal;
+    return;
+  }
+  error.cause = cause;
+  error.length = length;
+  error.detail = detail;
+  error.offset = static_cast<std::size_t>(at - inputBegin);
+  const std::size_t size = std::size_t{depth} + 1;
+  const std::size_t kept = std::min(size, FieldPath::capacity);
+  error.path.assign(*outermostMessage, std::span(numbers).first(kept), size - kept);
+}
+
+// Neighbours that are unknown too are kept in the same step.
+const std::byte* FieldReader::keepUnknown(Place place, Tag tag, Frame& frame,
+                                          const MessageDescriptor& message, UnknownStorage& unknownFields) {
+  const std::byte* const first = place.record;
+  const std::byte* record = place.record;
+  WireReader reader(std::span(place.value, place.end));
+  for (;;) {
+    if (const auto skipped = reader.skipValue(tag, record, frame.nesting); !skipped) {
+      unknownFields.appendRecords(std::span(first, record));
+      note(skipped.error(), frame, tag.fieldNumber());
+      return nullptr;
+    }
+    record = reader.position();
+    WireReader ahead = reader;
+    if (ahead.isAtEnd()) break;
+    const auto next = ahead.readTag();
+    if (!next || message.field(next->fieldNumber()) != nullptr) break;
+    tag = *next;
+    reader = ahead;
+  }
+  unknownFields.appendRecords(std::span(first, record));
+  return record;
+}
+
+FieldReader::Read<Tag> FieldReader::readLongTag(const std::byte* at, const std::byte* end, Frame& frame) {
+  WireReader reader(std::span(at, end));
+  const auto tag = reader.readTag();
+  if (tag) return {reader.position(), *tag};
+  note(tag.error(), frame, 0);
+  return {nullptr, Tag{0}};
+}
+
+FieldReader::Read<std::uint64_t> FieldReader::readLongVarint(const std::byte* at, const std::byte* end,
+                                                             Frame& frame, Tag tag) {
+  WireReader reader(std::span(at, end));
+  const auto varint = reader.readVarint();
+  if (varint) return {reader.position(), *varint};
+  note(varint.error(), frame, tag.fieldNumber());
+  return {nullptr, 0};
+}
+
+std::span<const std::byte> FieldReader::readLongBody(const std::byte* at, const std::byte* end, Frame& frame,
+                                                     Tag tag) {
+  // A length of two bytes is common.
+  if (end - at >= 2) {
+    const auto low = std::to_integer<std::size_t>(at[0]);
+    const auto high = std::to_integer<std::size_t>(at[1]);
+    const std::size_t length = (low & 0x7F) | high << 7;
+    if (low >= 0x80 && high < 0x80 && length <= static_cast<std::size_t>(end - at - 2)) [[likely]]
+      return {at + 2, length};
+    if (low < 0x80 && low <= static_cast<std::size_t>(end - at - 1)) return {at + 1, low};
+  }
+  const auto body = WireReader(std::span(at, end)).readLengthDelimited();
+  if (body) return *body;
+  note(body.error(), frame, tag.fieldNumber());
+  return {};
+}
+
+std::string_view FieldReader::readLongText(const std::byte* at, const std::byte* end, Frame& frame, Tag tag) {
+  const std::span<const std::byte> body = readLongBody(at, end, frame, tag);
+  if (body.data() == nullptr) return {};
+  const std::string_view text(reinterpret_cast<const char*>(body.data()), body.size());
+  const std::size_t wellFormed = utf8::wellFormedPrefix(text);
+  if (wellFormed == text.size()) return text;
+  note(DecodeCause::illFormedText, body.data(), static_cast<std::uint32_t>(text.size()),
+       static_cast<std::uint32_t>(wellFormed), frame, tag.fieldNumber());
+  return {};
+}
+
+Step FieldReader::failTooDeep(const std::byte* record, Frame& frame, Tag tag) {
+  note(DecodeCause::nestingTooDeep, record, 0, 0, frame, tag.fieldNumber());
+  return std::unexpected(Failed());
+}
+
+}  // namespace orv::internal

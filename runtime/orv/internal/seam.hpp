@@ -1,0 +1,52 @@
+// What the two seams, Decoder and Visitor, share.
+#pragma once
+
+#include <cstdint>
+#include <expected>
+#include <optional>
+
+#include <orv/name_map.hpp>
+
+namespace orv::internal {
+
+// What the operations of a decoder or visitor answer: its own Result where it names one, which then is the
+// like of std::expected<void, Error>.
+template <class Seam>
+struct ResultOfSeam {
+  using Type = std::expected<void, typename Seam::Error>;
+};
+template <class Seam>
+requires requires { typename Seam::Result; }
+struct ResultOfSeam<Seam> {
+  using Type = typename Seam::Result;
+};
+template <class Seam>
+using ResultOf = typename ResultOfSeam<Seam>::Type;
+
+// What a decoder's nextFieldNumber answers: its own NextFieldNumber where it names one.
+template <class D>
+struct NextNumberOfDecoder {
+  using Type = std::expected<std::optional<std::uint32_t>, typename D::Error>;
+};
+template <class D>
+requires requires { typename D::NextFieldNumber; }
+struct NextNumberOfDecoder<D> {
+  using Type = typename D::NextFieldNumber;
+};
+template <class D>
+using NextNumberOf = typename NextNumberOfDecoder<D>::Type;
+
+// What operations on any enumeration may rely on: the concepts try them with this one.
+class SomeEnumeration {
+ public:
+  constexpr explicit SomeEnumeration(std::int64_t rawValue) : rawValue_(rawValue) {}
+  constexpr std::int64_t rawValue() const { return rawValue_; }
+  static constexpr NameMap _protobuf_nameMap() { return {}; }
+  template <class Hasher>
+  void hash(Hasher&) const {}
+
+ private:
+  std::int64_t rawValue_;
+};
+
+}  // namespace orv::internal
