@@ -16,14 +16,14 @@ namespace {
 namespace io = google::protobuf::io;
 
 // In the order of StreamError::Cause.
-constexpr std::array<std::string_view, 5> sentences{
+constexpr std::array<std::string_view, 5> streamSentences{
     "the stream could not be read",
     "the stream ends inside a message",
     "length of 2^31 or more, or spelled in more than five bytes",
     "message longer than is allowed",
     "malformed message",
 };
-static_assert(sentences.size() == static_cast<std::size_t>(StreamError::Cause::malformedMessage) + 1);
+static_assert(streamSentences.size() == static_cast<std::size_t>(StreamError::Cause::malformedMessage) + 1);
 
 // The read function as libprotobuf's streams see it.
 class ReadFunctionStream final : public io::CopyingInputStream {
@@ -47,7 +47,7 @@ class ReadFunctionStream final : public io::CopyingInputStream {
 
 std::string StreamError::reason() const {
   if (decodeError.has_value()) return decodeError->reason();
-  std::string text(sentences[static_cast<std::size_t>(cause)]);
+  std::string text(streamSentences[static_cast<std::size_t>(cause)]);
   if (cause == Cause::tooLarge) text += " (" + std::to_string(length) + " bytes)";
   return text;
 }

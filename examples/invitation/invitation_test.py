@@ -5,6 +5,7 @@ usage: invitation_test.py INVITATION PROTOC SCHEMA [unittest arguments]
 """
 
 import os
+import pathlib
 import re
 import signal
 import socket
@@ -13,6 +14,9 @@ import sys
 import tempfile
 import time
 import unittest
+
+sys.path.append(str(pathlib.Path(__file__).parents[2] / "tests" / "testing"))
+from framing import delimited, read_delimited
 
 INVITATION, PROTOC, SCHEMA = sys.argv[1:4]
 
@@ -38,19 +42,6 @@ def decode(message, data):
     return " ".join(protoc("--decode", message, data).decode().split())
 
 
-def varint(number):
-    groups = []
-    while True:
-        groups.append(number & 0x7F)
-        number >>= 7
-        if not number:
-            return bytes([group | 0x80 for group in groups[:-1]] + groups[-1:])
-
-
-def delimited(body):
-    return varint(len(body)) + body
-
-
 def escaped(data):
     return "".join(f"\\{byte:03o}" for byte in data)
 
@@ -59,22 +50,6 @@ def envelope(kind, payload, version=1):
     """A session message behind its length."""
     data = escaped(payload)
     return delimited(encode("SessionMessage", f'version: {version} type: {kind} data: "{data}"'))
-
-
-def read_delimited(data):
-    bodies = []
-    while data:
-        length, shift, at = 0, 0, 0
-        while True:
-            length |= (data[at] & 0x7F) << shift
-            shift += 7
-            at += 1
-            if data[at - 1] < 0x80:
-                break
-        assert at + length <= len(data), "the file ends inside a message"
-        bodies.append(data[at:at + length])
-        data = data[at + length:]
-    return bodies
 
 
 def data_of(body):

@@ -43,7 +43,7 @@ struct MessageDescriptor {
   constexpr bool holdsOneof() const {
     return std::ranges::any_of(fields, [](const FieldDescriptor& field) {
       return field.kind == FieldKind::oneofMember ||
-             (field.message != nullptr && field.message->holdsOneof());
+             (field.type == ValueType::message && field.message->holdsOneof());
     });
   }
 

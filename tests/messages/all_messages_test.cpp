@@ -13,8 +13,6 @@
 namespace orv::test {
 namespace {
 
-std::string encoded(const AnyMessage& message) { return toHex(message.serialize().value()); }
-
 // Field 15 is defined nowhere.
 const std::string unknownRecord = hex("F8 00 81 00");
 

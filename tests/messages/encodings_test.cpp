@@ -10,8 +10,6 @@
 namespace orv::test {
 namespace {
 
-std::string encoded(const AnyMessage& message) { return toHex(message.serialize().value()); }
-
 TEST(Encodings, AreReadAndWrittenByTheRules) {
   for (const ReadCase& row : readCases()) {
     SCOPED_TRACE(row.name);

@@ -41,6 +41,9 @@ inline std::string toHex(std::string_view bytes) {
   return digits;
 }
 
+// A message's encoding.
+std::string encoded(const auto& message) { return toHex(message.serialize().value()); }
+
 inline std::string repeated(std::string_view bytes, std::size_t count) {
   std::string all;
   all.reserve(bytes.size() * count);

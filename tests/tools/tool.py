@@ -1,9 +1,13 @@
 """What the tests of the command share."""
 
 import os
+import pathlib
 import subprocess
 import sys
 import tempfile
+
+sys.path.append(str(pathlib.Path(__file__).parents[1] / "testing"))
+from framing import delimited, record
 
 COMMAND = os.path.abspath(sys.argv[1])
 SKIPPED = 77
@@ -24,22 +28,6 @@ def expect(name, actual, expected):
         return
     failures += 1
     print(f"{name}:\n  expected {expected!r}\n  but got  {actual!r}")
-
-
-def varint(number):
-    encoded = b""
-    while number >= 0x80:
-        encoded += bytes([number & 0x7F | 0x80])
-        number >>= 7
-    return encoded + bytes([number])
-
-
-def delimited(*messages):
-    return b"".join(varint(len(message)) + message for message in messages)
-
-
-def record(number, body):
-    return varint(number << 3 | 2) + varint(len(body)) + body
 
 
 def in_scratch_directory(test):

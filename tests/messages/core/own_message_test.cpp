@@ -36,8 +36,6 @@ template class Message<test::Wrapper>;
 namespace test {
 namespace {
 
-std::string encoded(const Wrapper& message) { return toHex(message.serialize().value()); }
-
 TEST(OwnMessage, IsReadWrittenComparedAndNamedByItsTable) {
   const std::string bytes = hex("0A 02 22 00 12 00 12 02 0A 00 FA 7F 01 61 18 05");
   const Wrapper message = Wrapper::parse(bytes).value();

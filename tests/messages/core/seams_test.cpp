@@ -14,11 +14,6 @@ namespace {
 using Fields = std::vector<ScriptedField>;
 using Calls = std::vector<std::string>;
 
-template <class M>
-std::string encoded(const M& message) {
-  return toHex(message.serialize().value());
-}
-
 // A decoder that lacks an operation for any message is no decoder of messages, rather than an error in the
 // rules.
 struct DecoderWithoutNumbers : ScriptedDecoder {
