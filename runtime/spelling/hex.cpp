@@ -1,6 +1,7 @@
 #include <orv/spelling/hex.hpp>
 
 #include <algorithm>
+#include <bit>
 
 namespace orv::spelling {
 
@@ -23,19 +24,22 @@ std::string shown(char c) {
 }  // namespace
 
 void appendHex(std::string_view bytes, std::string& output, std::string_view between) {
-  output.reserve(output.size() + bytes.size() * (2 + between.size()));
+  if (bytes.empty()) return;
+  const std::size_t start = output.size();
+  output.resize(start + bytes.size() * (2 + between.size()) - between.size());
+  char* target = output.data() + start;
   for (std::size_t at = 0; at < bytes.size(); ++at) {
-    if (at != 0) output += between;
+    if (at != 0) target = std::ranges::copy(between, target).out;
     const auto byte = static_cast<unsigned char>(bytes[at]);
-    output += digits[byte >> 4];
-    output += digits[byte & 0xF];
+    *target++ = digits[byte >> 4];
+    *target++ = digits[byte & 0xF];
   }
 }
 
 std::string hexNumber(std::uint64_t number, std::size_t fewestDigits) {
-  std::string text;
-  for (; number != 0 || text.size() < fewestDigits; number >>= 4) text += digits[number & 0xF];
-  std::ranges::reverse(text);
+  const std::size_t needed = (static_cast<std::size_t>(std::bit_width(number)) + 3) / 4;
+  std::string text(std::max(needed, fewestDigits), '0');
+  for (std::size_t at = text.size(); number != 0; number >>= 4) text[--at] = digits[number & 0xF];
   return text;
 }
 

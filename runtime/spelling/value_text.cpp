@@ -14,6 +14,10 @@ bool isShown(const utf8::Step& step) {
 
 // What stands at the start of the text, as it is or in escapes. Answers how many bytes it takes.
 std::size_t appendCharacter(std::string_view text, std::string& output) {
+  if (const char first = text.front(); first >= 0x20 && first < 0x7F) {
+    output += first;
+    return 1;
+  }
   const utf8::Step step = utf8::step(text);
   const std::string_view character = text.substr(0, step.length);
   if (isShown(step)) {

@@ -11,6 +11,7 @@ Outcome<void> takeMessages(const std::string& path, const Options& options, Outp
   const auto opened = MessageInput::open(path, options);
   if (!opened) return std::unexpected(opened.error());
   MessageInput& input = **opened;
+  const bool isTerminal = output.isTerminal();
   for (;;) {
     const auto hasNext = input.next();
     if (!hasNext) {
@@ -19,7 +20,7 @@ Outcome<void> takeMessages(const std::string& path, const Options& options, Outp
     }
     if (!*hasNext) return {};
     if (auto taken = work.take(input); !taken) return taken;
-    if (output.isTerminal()) {
+    if (isTerminal) {
       if (auto flushed = output.flush(); !flushed) return flushed;
     }
     progress.update(input.frame().number, input.frame().offset);

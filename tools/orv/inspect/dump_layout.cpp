@@ -30,16 +30,15 @@ std::size_t columns(std::string_view text) {
   return static_cast<std::size_t>(std::ranges::count_if(text, startsCharacter));
 }
 
-// The text in so many columns, with an ellipsis where it is cut.
-std::string fitted(std::string_view text, std::size_t room) {
-  if (columns(text) <= room) return std::string(text);
-  if (room == 0) return {};
-  // The ellipsis takes the place of the first character that is left out.
+// How much of the text stands in so many columns, where an ellipsis takes the place of the first character that
+// is left out.
+std::string_view fitting(std::string_view text, std::size_t room) {
+  if (text.size() <= room || columns(text) <= room) return text;
   std::size_t end = 0;
   for (std::size_t started = 0; end < text.size(); ++end) {
-    if (startsCharacter(text[end]) && ++started == room) break;
+    if (startsCharacter(text[end]) && ++started >= room) break;
   }
-  return std::string(text.substr(0, end)) + "…";
+  return text.substr(0, end);
 }
 
 }  // namespace
@@ -77,19 +76,18 @@ void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Not
 void DumpLayout::appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const {
   palette_.append(output, Palette::Colour::offset, spelling::hexNumber(bytes.offset + row, offsetDigits));
   output += "  ";
-  const auto hex = [](std::span<const std::byte> part) {
-    std::string text;
-    spelling::appendHex(charactersOf(part), text, " ");
-    return text += part.empty() ? "" : " ";
+  const auto append = [&](Palette::Colour colour, std::span<const std::byte> part) {
+    if (part.empty()) return;
+    palette_.start(output, colour);
+    spelling::appendHex(charactersOf(part), output, " ");
+    output += ' ';
+    palette_.stop(output);
   };
   const std::size_t headerEnd = bytes.header.size();
   const std::size_t end = std::min(row + bytesPerRow_, headerEnd + bytes.value.size());
   const std::size_t split = std::clamp(headerEnd, row, std::max(row, end));
-  palette_.append(output, Palette::Colour::tag,
-                  hex(bytes.header.subspan(std::min(row, headerEnd), split - row)));
-  if (end > split) {
-    palette_.append(output, bytes.valueColour, hex(bytes.value.subspan(split - headerEnd, end - split)));
-  }
+  append(Palette::Colour::tag, bytes.header.subspan(std::min(row, headerEnd), split - row));
+  if (end > split) append(bytes.valueColour, bytes.value.subspan(split - headerEnd, end - split));
   output.append(3 * (bytesPerRow_ - (std::max(row, end) - row)) + 1, ' ');
 }
 
@@ -109,8 +107,20 @@ std::size_t DumpLayout::roomBehind(std::size_t column) const {
 }
 
 bool DumpLayout::fitsBeside(const Note& note) const {
+  if (width_ == 0) return true;
   const std::size_t start = noteColumn() + indentation(note) + pathWidth(note) + kindWidth(note);
   return columns(note.value) <= roomBehind(start);
+}
+
+void DumpLayout::appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
+                               std::size_t room) const {
+  const std::string_view shown = fitting(text, room);
+  const bool isCut = shown.size() < text.size() && room != 0;
+  if (shown.empty() && !isCut) return;
+  palette_.start(output, colour);
+  output += shown;
+  if (isCut) output += "…";
+  palette_.stop(output);
 }
 
 void DumpLayout::appendNote(std::string& output, const Note& note) const {
@@ -118,9 +128,8 @@ void DumpLayout::appendNote(std::string& output, const Note& note) const {
   output.append(column - noteColumn(), ' ');
   const auto append = [&](Palette::Colour colour, std::string_view text, std::size_t width) {
     const std::size_t room = std::min(width, roomBehind(column));
-    const std::string fitting = fitted(text, room);
-    palette_.append(output, colour, fitting);
-    output.append(room - columns(fitting), ' ');
+    appendFitting(output, colour, text, room);
+    output.append(room - std::min(room, columns(text)), ' ');
     column += room;
   };
   append(note.colour == Palette::Colour::value ? Palette::Colour::name : note.colour, note.path,
@@ -133,10 +142,10 @@ void DumpLayout::appendValue(std::string& output, const Note& note, bool isBelow
   if (isBelow) {
     output.append(std::min(roomBehind(noteColumn()), indentation(note) + 2), ' ');
     start += 2;
-  } else {
+  } else if (width_ != 0) {
     start += pathWidth(note) + kindWidth(note);
   }
-  palette_.append(output, note.colour, fitted(note.value, roomBehind(start)));
+  appendFitting(output, note.colour, note.value, roomBehind(start));
 }
 
 void DumpLayout::appendError(std::string& output, std::string_view text) const {

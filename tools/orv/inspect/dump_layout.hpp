@@ -45,6 +45,9 @@ class DumpLayout {
   // Path and kind.
   void appendNote(std::string& output, const Note& note) const;
   void appendValue(std::string& output, const Note& note, bool isBelow) const;
+  // The text in so many columns, with an ellipsis where it is cut.
+  void appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
+                     std::size_t room) const;
 
   // Places and widths in columns.
   std::size_t noteColumn() const;

@@ -36,15 +36,21 @@ Palette::Palette(ColourChoice choice, int descriptor)
             (choice == ColourChoice::automatic && wantsColour(descriptor))) {}
 
 void Palette::append(std::string& output, Colour colour, std::string_view text) const {
-  if (!isOn_ || text.empty()) {
-    output += text;
-    return;
-  }
+  if (text.empty()) return;
+  start(output, colour);
+  output += text;
+  stop(output);
+}
+
+void Palette::start(std::string& output, Colour colour) const {
+  if (!isOn_) return;
   output += "\033[";
   output += codes[static_cast<std::size_t>(colour)];
   output += 'm';
-  output += text;
-  output += "\033[0m";
+}
+
+void Palette::stop(std::string& output) const {
+  if (isOn_) output += "\033[0m";
 }
 
 }  // namespace orv::tool

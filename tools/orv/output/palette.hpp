@@ -37,6 +37,10 @@ class Palette {
   // Appends the text in the colour.
   void append(std::string& output, Colour colour, std::string_view text) const;
 
+  // What is appended from the start to the stop is in the colour.
+  void start(std::string& output, Colour colour) const;
+  void stop(std::string& output) const;
+
  private:
   bool isOn_;
 };
