@@ -5,6 +5,7 @@
 #include <string_view>
 #include <variant>
 
+#include <orv/byte_view.hpp>
 #include <orv/spelling/value_text.hpp>
 
 namespace orv::compare {
@@ -70,6 +71,30 @@ Difference changed(const Leaf& before, const Leaf& after) {
 bool hasContents(std::span<const Leaf> leaves) { return leaves.size() > 1 && leaves[1].isIn(leaves[0]); }
 
 }  // namespace
+
+std::string Leaf::path() const {
+  std::string path;
+  for (const Step& step : place) {
+    if (!path.empty()) path += '.';
+    path += step.name;
+    if (step.isInList) path += '[' + std::to_string(step.index) + ']';
+  }
+  return path;
+}
+
+bool Leaf::isIn(const Leaf& message) const {
+  return place.size() > message.place.size() &&
+         std::ranges::equal(message.place, std::span(place).first(message.place.size()));
+}
+
+LeafCollector::Result LeafCollector::visitUnknownFields(const UnknownStorage& unknownFields) {
+  std::size_t index = 0;
+  for (const UnknownField& field : unknownFields) {
+    const std::string bytes(charactersOf(field.record));
+    addAt({Step::unknownFields, index++, true, "unknownFields"}, UnknownRecord{bytes});
+  }
+  return {};
+}
 
 std::vector<Difference> differencesOfLeaves(std::span<const Leaf> left, std::span<const Leaf> right) {
   std::vector<Difference> list;

@@ -38,37 +38,6 @@ std::expected<std::optional<std::uint32_t>, Error> DocumentDecoder::nextNumber(N
   return std::nullopt;
 }
 
-DocumentDecoder::Result DocumentDecoder::decodeSingularStringField(Text& value) {
-  auto read = readText();
-  if (!read) return std::unexpected(std::move(read.error()));
-  value = std::move(*read);
-  return {};
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeSingularBytesField(ByteBuffer& value) {
-  auto read = readBytes();
-  if (!read) return std::unexpected(std::move(read.error()));
-  value = std::move(*read);
-  return {};
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeSingularBoolField(bool& value) {
-  const auto read = readBool();
-  if (!read) return std::unexpected(read.error());
-  value = *read;
-  return {};
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeRepeatedStringField(std::vector<Text>& texts) {
-  makeRoom(texts);
-  return forEachItem([&]() -> Result {
-    auto text = readText();
-    if (!text) return std::unexpected(std::move(text.error()));
-    texts.push_back(std::move(*text));
-    return {};
-  });
-}
-
 std::expected<Text, Error> DocumentDecoder::readText() const {
   if (value_->kind() != Value::Kind::text) return failExpecting("a string");
   // The parser lets well-formed text through only.

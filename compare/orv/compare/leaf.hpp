@@ -45,9 +45,7 @@ struct EnumerationValue {
   std::int64_t rawValue;
   std::string_view name;
 
-  friend bool operator==(const EnumerationValue& left, const EnumerationValue& right) {
-    return left.rawValue == right.rawValue;
-  }
+  friend bool operator==(const EnumerationValue&, const EnumerationValue&) = default;
 };
 
 // A kept record, as it came.

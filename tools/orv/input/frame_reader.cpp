@@ -13,15 +13,11 @@ namespace orv::tool {
 
 namespace {
 
-std::string tooLarge(std::size_t maximumSize) {
-  return "message of more than " + std::to_string(maximumSize) + " bytes, the most that --max-size allows";
-}
-
 // Input that is one message, read as a whole.
 class WholeInput final : public FrameReader {
  public:
   WholeInput(InputFile& file, Format format, std::size_t maximumSize)
-      : FrameReader(file.name()), source_(file, format), maximumSize_(maximumSize) {}
+      : FrameReader(file.name(), maximumSize), source_(file, format) {}
 
   Outcome<std::optional<Frame>> next() override {
     if (std::exchange(isRead_, true)) return std::nullopt;
@@ -32,8 +28,7 @@ class WholeInput final : public FrameReader {
       if (count < 0) return std::unexpected(source_.failure());
       if (count == 0) break;
       const auto size = static_cast<std::size_t>(count);
-      if (size > maximumSize_ - content_.size())
-        return std::unexpected(malformed(empty, tooLarge(maximumSize_)));
+      if (size > maximumSize() - content_.size()) return failTooLarge(empty);
       content_ += charactersOf(std::span(piece).first(size));
     }
     Frame whole = empty;
@@ -43,7 +38,6 @@ class WholeInput final : public FrameReader {
 
  private:
   ByteSource source_;
-  std::size_t maximumSize_;
   std::string content_;
   bool isRead_ = false;
 };
@@ -52,10 +46,9 @@ class WholeInput final : public FrameReader {
 class DelimitedInput final : public FrameReader {
  public:
   DelimitedInput(InputFile& file, Format format, std::size_t maximumSize)
-      : FrameReader(file.name()),
+      : FrameReader(file.name(), maximumSize),
         source_(file, format),
-        reader_([this](std::span<std::byte> buffer) { return source_.read(buffer); }, maximumSize),
-        maximumSize_(maximumSize) {}
+        reader_([this](std::span<std::byte> buffer) { return source_.read(buffer); }, maximumSize) {}
 
   Outcome<std::optional<Frame>> next() override {
     ++number_;
@@ -73,40 +66,13 @@ class DelimitedInput final : public FrameReader {
     if (error.cause == StreamError::Cause::tooLarge) {
       return malformedBytes(frame, 0,
                             "length " + std::to_string(error.length) + " is above " +
-                                std::to_string(maximumSize_) + ", the most that --max-size allows");
+                                std::to_string(maximumSize()) + ", the most that --max-size allows");
     }
     return malformedBytes(frame, 0, error.reason());
   }
 
   ByteSource source_;
   DelimitedReader reader_;
-  std::size_t maximumSize_;
-  std::uint64_t number_ = 0;
-};
-
-// Documents or texts, one after the other.
-class TextInput final : public FrameReader {
- public:
-  TextInput(InputFile& file, Format format, std::size_t maximumSize)
-      : FrameReader(file.name()), stream_(file, format, maximumSize), maximumSize_(maximumSize) {}
-
-  Outcome<std::optional<Frame>> next() override {
-    Frame frame{.content = {}, .number = ++number_, .offset = 0, .line = 1};
-    switch (stream_.next()) {
-      case TextStream::Step::end: return std::nullopt;
-      case TextStream::Step::readFailed: return failWithErrno(fileName());
-      case TextStream::Step::tooLarge: return std::unexpected(malformed(frame, tooLarge(maximumSize_)));
-      case TextStream::Step::text: break;
-    }
-    frame.content = stream_.text();
-    frame.offset = stream_.offset();
-    frame.line = stream_.line();
-    return frame;
-  }
-
- private:
-  TextStream stream_;
-  std::size_t maximumSize_;
   std::uint64_t number_ = 0;
 };
 
@@ -120,7 +86,12 @@ std::unique_ptr<FrameReader> FrameReader::make(InputFile& file, Format format, c
   const std::size_t size = options.maximumSize;
   if (!options.isDelimited) return std::make_unique<WholeInput>(file, format, size);
   if (isBytes(format)) return std::make_unique<DelimitedInput>(file, format, size);
-  return std::make_unique<TextInput>(file, format, size);
+  return std::make_unique<TextStream>(file, format, size);
+}
+
+std::unexpected<Failure> FrameReader::failTooLarge(const Frame& frame) const {
+  return std::unexpected(malformed(frame, "message of more than " + std::to_string(maximumSize_) +
+                                              " bytes, the most that --max-size allows"));
 }
 
 Failure FrameReader::malformed(const Frame& frame, std::string_view reason) const {

@@ -45,12 +45,16 @@ class FrameReader {
   Failure malformed(const Frame& frame, std::string_view reason) const;
 
  protected:
-  explicit FrameReader(std::string fileName) : fileName_(std::move(fileName)) {}
+  // A message may have so many bytes.
+  FrameReader(std::string fileName, std::size_t maximumSize)
+      : fileName_(std::move(fileName)), maximumSize_(maximumSize) {}
 
-  const std::string& fileName() const { return fileName_; }
+  std::size_t maximumSize() const { return maximumSize_; }
+  std::unexpected<Failure> failTooLarge(const Frame& frame) const;
 
  private:
   std::string fileName_;
+  std::size_t maximumSize_;
 };
 
 }  // namespace orv::tool

@@ -41,15 +41,29 @@ class BracketDepth {
 
 }  // namespace
 
-TextStream::Step TextStream::next() { return isJson_ ? nextDocument() : nextText(); }
+Outcome<std::optional<Frame>> TextStream::next() {
+  ++frame_.number;
+  startAtNextLine();
+  const auto gathered = isJson_ ? gatherDocument() : gatherText();
+  if (!gathered) return std::unexpected(gathered.error());
+  if (!*gathered) return std::nullopt;
+  frame_.content = text_;
+  return frame_;
+}
 
 void TextStream::startAtNextLine() {
   text_.clear();
-  offset_ = nextOffset_;
-  line_ = nextLine_;
+  frame_.offset = nextOffset_;
+  frame_.line = nextLine_;
 }
 
-TextStream::Step TextStream::readLine(std::string& line) {
+Outcome<void> TextStream::add(std::string_view line) {
+  if (line.size() > maximumSize() - text_.size()) return failTooLarge(frame_);
+  text_ += line;
+  return {};
+}
+
+Outcome<bool> TextStream::readLine(std::string& line) {
   std::size_t searched = taken_;
   for (;;) {
     const auto end = buffer_.find('\n', searched);
@@ -60,60 +74,54 @@ TextStream::Step TextStream::readLine(std::string& line) {
     searched = buffer_.size() - taken_;
     buffer_.erase(0, taken_);
     taken_ = 0;
-    if (buffer_.size() > maximumSize_) return Step::tooLarge;
+    if (buffer_.size() > maximumSize()) return failTooLarge(frame_);
     std::byte piece[65536];
     const std::ptrdiff_t count = file_.read(piece);
-    if (count < 0) return Step::readFailed;
+    if (count < 0) return failWithErrno(file_.name());
     if (count == 0) {
       line = buffer_;
       break;
     }
-    buffer_.append(charactersOf(std::span(piece).first(static_cast<std::size_t>(count))));
+    buffer_ += charactersOf(std::span(piece).first(static_cast<std::size_t>(count)));
   }
   taken_ += line.size();
   nextOffset_ += line.size();
   nextLine_ += line.empty() ? 0 : 1;
-  return line.empty() ? Step::end : Step::text;
+  return !line.empty();
 }
 
-TextStream::Step TextStream::nextDocument() {
+Outcome<bool> TextStream::gatherDocument() {
   BracketDepth depth;
-  startAtNextLine();
   for (std::string line;;) {
-    const Step step = readLine(line);
-    if (step == Step::end && !text_.empty()) return Step::text;
-    if (step != Step::text) return step;
+    const auto isRead = readLine(line);
+    if (!isRead) return isRead;
+    if (!*isRead) return !text_.empty();
     if (text_.empty() && isBlank(line)) {
       startAtNextLine();
       continue;
     }
-    if (line.size() > maximumSize_ - text_.size()) return Step::tooLarge;
-    text_ += line;
+    if (const auto added = add(line); !added) return std::unexpected(added.error());
     depth.take(line);
-    if (depth.isClosed()) return Step::text;
+    if (depth.isClosed()) return true;
   }
 }
 
-TextStream::Step TextStream::nextText() {
+Outcome<bool> TextStream::gatherText() {
   bool isFound = std::exchange(isBehindSeparator_, false);
-  startAtNextLine();
   for (std::string line;;) {
-    const Step step = readLine(line);
-    if (step == Step::end && isFound) return Step::text;
-    if (step != Step::text) return step;
+    const auto isRead = readLine(line);
+    if (!isRead) return isRead;
+    if (!*isRead) return isFound;
     if (line.starts_with(textSeparator)) {
-      if (isFound) {
-        isBehindSeparator_ = true;
-        return Step::text;
-      }
+      isBehindSeparator_ = isFound;
+      if (isFound) return true;
       isFound = true;
       startAtNextLine();
       continue;
     }
     // Before the first separator a message needs something to be seen.
     isFound = isFound || !isBlankOrComment(line);
-    if (line.size() > maximumSize_ - text_.size()) return Step::tooLarge;
-    text_ += line;
+    if (const auto added = add(line); !added) return std::unexpected(added.error());
   }
 }
 

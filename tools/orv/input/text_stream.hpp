@@ -3,9 +3,11 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
+#include "tools/orv/input/frame_reader.hpp"
 #include "tools/orv/input/input_file.hpp"
 #include "tools/orv/options.hpp"
 
@@ -18,38 +20,31 @@ inline constexpr std::string_view textSeparator = "# message";
 // Cuts a stream into the texts of its messages. A JSON document ends with the line in which its last bracket
 // is closed, so one document a line and documents of several lines will both do; a message in the text format
 // ends before a line that begins with textSeparator.
-class TextStream {
+class TextStream final : public FrameReader {
  public:
-  enum class Step : std::uint8_t { text, end, readFailed, tooLarge };
-
   // The file must outlive the stream.
   TextStream(InputFile& file, Format format, std::size_t maximumSize)
-      : file_(file), isJson_(format == Format::json), maximumSize_(maximumSize) {}
+      : FrameReader(file.name(), maximumSize), file_(file), isJson_(format == Format::json) {}
 
-  Step next();
-
-  // After Step::text: the message, valid until the next call, and where in the stream it begins.
-  std::string_view text() const { return text_; }
-  std::uint64_t offset() const { return offset_; }
-  std::size_t line() const { return line_; }
+  Outcome<std::optional<Frame>> next() override;
 
  private:
-  // Puts the next line into line, with its end; empty at the end of the stream.
-  Step readLine(std::string& line);
-  Step nextDocument();
-  Step nextText();
+  // Both gather the lines of the next message; false at the end of the stream.
+  Outcome<bool> gatherDocument();
+  Outcome<bool> gatherText();
+  // Puts the next line into `line`, with its end; false at the end of the stream.
+  Outcome<bool> readLine(std::string& line);
   void startAtNextLine();
+  Outcome<void> add(std::string_view line);
 
   InputFile& file_;
   bool isJson_;
-  std::size_t maximumSize_;
   std::string buffer_;  // read, from taken_ on not yet cut into lines
   std::size_t taken_ = 0;
   std::uint64_t nextOffset_ = 0;  // of the line that is read next
   std::size_t nextLine_ = 1;
+  Frame frame_{};  // the message that is being gathered in text_
   std::string text_;
-  std::uint64_t offset_ = 0;
-  std::size_t line_ = 1;
   bool isBehindSeparator_ = false;  // the separator before the next message has been read
 };
 
