@@ -7,6 +7,7 @@
 #include <vector>
 
 #include <orv/all_messages.hpp>
+#include <orv/byte_view.hpp>
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
 #include "tests/testing/random.hpp"
@@ -56,7 +57,7 @@ TEST(Trace, ShowsAllBytesAndFailsAsParsingDoes) {
       std::string encoding = randomEncoding(M::protoMessageName, random);
       damage(encoding, random);
       SCOPED_TRACE(toHex(encoding));
-      const auto bytes = std::as_bytes(std::span(encoding));
+      const auto bytes = bytesOf(encoding);
       Seamless sink(bytes);
       const auto traced = tool::trace(tool::typeOf<M>(), bytes, sink);
       const auto parsed = M::parse(encoding);
@@ -94,7 +95,7 @@ class Lines final : public tool::TraceSink {
 std::vector<std::string> linesOf(const tool::MessageType& type, std::string_view digits) {
   const std::string encoding = hex(digits);
   Lines lines;
-  EXPECT_TRUE(tool::trace(type, std::as_bytes(std::span(encoding)), lines).has_value());
+  EXPECT_TRUE(tool::trace(type, bytesOf(encoding), lines).has_value());
   return lines.lines();
 }
 
@@ -124,7 +125,7 @@ TEST(Trace, TakesRepeatedOneofMembersInLinearTime) {
     std::size_t count_ = 0;
   } counter;
   const std::string encoding = repeated(hex("0A 02 12 00"), 1'000'000);
-  EXPECT_TRUE(tool::trace(tool::typeOf<Group>(), std::as_bytes(std::span(encoding)), counter).has_value());
+  EXPECT_TRUE(tool::trace(tool::typeOf<Group>(), bytesOf(encoding), counter).has_value());
   EXPECT_EQ(counter.count(), 2'000'000U);
 }
 

@@ -1,31 +1,17 @@
-// Makes the dissector of its template, on standard input: the pairing of types and payloads in place of "@KINDS@".
+// Prints what the dissector must know of the pairing of types and payloads.
 #include <cstdio>
 #include <string>
 
 #include <orv/envelope.hpp>
 
-namespace {
-
-// One line for each type of envelopes: [5] = { name = "groupMessage", payload = "orv.Group" },
-std::string kinds() {
-  std::string lines;
-  for (const auto& kind : orv::VessaSessionMessageType::_protobuf_nameMap().entries()) {
-    lines += "  [" + std::to_string(kind.number) + "] = { name = \"" + std::string(kind.name) + '"';
-    if (const auto* const payload = orv::envelope::payloadOf(orv::VessaSessionMessageType(kind.number)))
-      lines += ", payload = \"" + std::string(payload->fullName) + '"';
-    lines += " },\n";
-  }
-  return lines;
-}
-
-}  // namespace
-
 int main() {
-  std::string text;
-  for (int character; (character = std::getchar()) != EOF;) text += static_cast<char>(character);
-  const std::string place = "@KINDS@";
-  const auto at = text.find(place);
-  if (at == std::string::npos) return 1;
-  text.replace(at, place.size(), kinds());
-  return std::fwrite(text.data(), 1, text.size(), stdout) == text.size() ? 0 : 1;
+  std::string text =
+      "-- What an envelope's type says of its data, made of the table of orv::envelope.\nlocal KINDS = {\n";
+  for (const auto& kind : orv::VessaSessionMessageType::_protobuf_nameMap().entries()) {
+    text += "  [" + std::to_string(kind.number) + "] = { name = \"" + std::string(kind.name) + '"';
+    const auto* const payload = orv::envelope::payloadOf(orv::VessaSessionMessageType(kind.number));
+    if (payload != nullptr) text += ", payload = \"" + std::string(payload->fullName) + '"';
+    text += " },\n";
+  }
+  return std::puts((text + "}\n").c_str()) < 0 ? 1 : 0;
 }

@@ -7,6 +7,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <tuple>
 #include <vector>
 
 #include <orv/byte_view.hpp>
@@ -85,9 +86,6 @@ void lookIntoEnvelope(std::span<const std::byte> bytes, Explanation& explanation
   if (trace(*payload, *outline.data, inner)) explanation.addPayload(inner, outline.data->size());
 }
 
-// What is malformed to a type without fields is malformed to every type.
-bool describesNoFields(const MessageType& type) { return type.descriptor->fields.empty(); }
-
 // The types that the bytes could be, the likeliest first; types that fit alike in the order of the protocol.
 // The error is that of bytes that are no fields at all, whatever the type.
 std::expected<std::vector<Candidate>, DecodeError> rankTypes(std::span<const std::byte> bytes) {
@@ -95,7 +93,8 @@ std::expected<std::vector<Candidate>, DecodeError> rankTypes(std::span<const std
   for (const MessageType& type : allMessageTypes()) {
     Explanation explanation;
     auto traced = trace(type, bytes, explanation);
-    if (!traced && describesNoFields(type)) {
+    // What is malformed to a type without fields is malformed to every type.
+    if (!traced && type.descriptor->fields.empty()) {
       traced.error().path = {};
       return std::unexpected(traced.error());
     }
@@ -103,9 +102,8 @@ std::expected<std::vector<Candidate>, DecodeError> rankTypes(std::span<const std
     if (type.isEnvelope()) lookIntoEnvelope(bytes, explanation);
     candidates.push_back(explanation.candidate(type, bytes.size()));
   }
-  std::ranges::stable_sort(candidates, [](const Candidate& left, const Candidate& right) {
-    if (left.score != right.score) return left.score > right.score;
-    return left.unknownFields < right.unknownFields;
+  std::ranges::sort(candidates, {}, [](const Candidate& candidate) {
+    return std::tuple(-candidate.score, candidate.unknownFields, candidate.type->index);
   });
   return candidates;
 }

@@ -21,19 +21,16 @@ class WholeInput final : public FrameReader {
 
   Outcome<std::optional<Frame>> next() override {
     if (std::exchange(isRead_, true)) return std::nullopt;
-    const Frame empty{.content = {}, .number = 0, .offset = 0, .line = 1};
     std::array<std::byte, 65536> piece;
     for (;;) {
       const std::ptrdiff_t count = source_.read(piece);
       if (count < 0) return std::unexpected(source_.failure());
       if (count == 0) break;
       const auto size = static_cast<std::size_t>(count);
-      if (size > maximumSize() - content_.size()) return failTooLarge(empty);
+      if (size > maximumSize() - content_.size()) return failTooLarge({});
       content_ += charactersOf(std::span(piece).first(size));
     }
-    Frame whole = empty;
-    whole.content = content_;
-    return whole;
+    return Frame{.content = content_};
   }
 
  private:
@@ -55,14 +52,13 @@ class DelimitedInput final : public FrameReader {
     const auto bytes = reader_.next();
     if (!bytes) return std::unexpected(failureOf(bytes.error()));
     if (!bytes->has_value()) return std::nullopt;
-    return Frame{
-        .content = charactersOf(**bytes), .number = number_, .offset = reader_.messageOffset(), .line = 1};
+    return Frame{.content = charactersOf(**bytes), .number = number_, .offset = reader_.messageOffset()};
   }
 
  private:
   Failure failureOf(const StreamError& error) const {
     if (error.cause == StreamError::Cause::readFailed) return source_.failure();
-    const Frame frame{.content = {}, .number = number_, .offset = error.offset, .line = 1};
+    const Frame frame{.number = number_, .offset = error.offset};
     if (error.cause == StreamError::Cause::tooLarge) {
       return malformedBytes(frame, 0,
                             "length " + std::to_string(error.length) + " is above " +

@@ -20,10 +20,10 @@ std::string bytePlace(std::uint64_t offset);
 
 // One message as it stands in the input: its encoding, or its text.
 struct Frame {
-  std::string_view content;  // valid until the next frame is read
-  std::uint64_t number;      // of the message in a stream, from 1; 0 for input that is one message
-  std::uint64_t offset;      // of the content, in bytes of the input (of what it spells, for hex and base64)
-  std::size_t line;          // of the content's beginning, from 1, in text
+  std::string_view content{};  // valid until the next frame is read
+  std::uint64_t number = 0;    // of the message in a stream, from 1; 0 for input that is one message
+  std::uint64_t offset = 0;  // of the content, in bytes of the input (of what it spells, for hex and base64)
+  std::size_t line = 1;      // of the content's beginning, from 1, in text
 };
 
 // Reads frame after frame, and keeps one of them in memory.

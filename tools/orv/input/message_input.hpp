@@ -56,7 +56,7 @@ class MessageInput {
   const Options& options_;
   Format format_;
   std::unique_ptr<FrameReader> reader_;
-  Frame frame_{};
+  Frame frame_;
   std::string encoded_;  // of a message that came as text
   std::string_view encoding_;
 };

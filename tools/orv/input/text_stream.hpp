@@ -43,7 +43,7 @@ class TextStream final : public FrameReader {
   std::size_t taken_ = 0;
   std::uint64_t nextOffset_ = 0;  // of the line that is read next
   std::size_t nextLine_ = 1;
-  Frame frame_{};  // the message that is being gathered in text_
+  Frame frame_;  // the message that is being gathered in text_
   std::string text_;
   bool isBehindSeparator_ = false;  // the separator before the next message has been read
 };

@@ -24,17 +24,27 @@ namespace {
 
 namespace pb = google::protobuf;
 
-class NoErrors final : public pb::io::ErrorCollector {
+// Keeps the first error.
+class FirstError final : public pb::io::ErrorCollector {
  public:
-  void AddError(int, pb::io::ColumnNumber, const std::string&) override {
-    assert(false && "the shipped schema is well-formed");
+  void AddError(int line, pb::io::ColumnNumber column, const std::string& message) override {
+    if (error_.has_value()) return;
+    std::string reason = message;
+    if (reason.ends_with('.')) reason.pop_back();
+    error_ = {std::move(reason), static_cast<std::size_t>(line) + 1, static_cast<std::size_t>(column) + 1};
   }
+  spelling::TextError error() const {
+    return error_.value_or(spelling::TextError{"no message in the text format", 1, 1});
+  }
+
+ private:
+  std::optional<spelling::TextError> error_;
 };
 
 pb::FileDescriptorProto shippedFile() {
   const std::string_view source = schema();
   pb::io::ArrayInputStream input(source.data(), static_cast<int>(source.size()));
-  NoErrors errors;
+  FirstError errors;  // none: the shipped schema is well-formed
   pb::io::Tokenizer tokenizer(&input, &errors);
   pb::FileDescriptorProto file;
   pb::compiler::Parser().Parse(&tokenizer, &file);
@@ -76,23 +86,6 @@ class TextSchema {
 
   pb::DescriptorPool pool_;
   pb::DynamicMessageFactory factory_{&pool_};
-};
-
-// Keeps the first error.
-class FirstError final : public pb::io::ErrorCollector {
- public:
-  void AddError(int line, pb::io::ColumnNumber column, const std::string& message) override {
-    if (error_.has_value()) return;
-    std::string reason = message;
-    if (reason.ends_with('.')) reason.pop_back();
-    error_ = {std::move(reason), static_cast<std::size_t>(line) + 1, static_cast<std::size_t>(column) + 1};
-  }
-  spelling::TextError error() const {
-    return error_.value_or(spelling::TextError{"no message in the text format", 1, 1});
-  }
-
- private:
-  std::optional<spelling::TextError> error_;
 };
 
 struct ParsedText {

@@ -1,12 +1,8 @@
 -- Wireshark: dissects the messages of the invitation protocol, with Wireshark's own Protocol Buffers
 -- dissector and the schema proto/orv.proto. A UDP datagram holds one envelope, a TCP stream envelopes behind
--- their lengths as varints. docs/wireshark.md says how to set it up. Made by the build, of tools/wireshark/orv.lua.in.
+-- their lengths as varints. docs/wireshark.md says how to set it up. The build puts the table KINDS before it.
 
 local ENVELOPE = "orv.SessionMessage"
-
--- What an envelope's type says of its data, as the table of orv::envelope has it.
-local KINDS = {
-@KINDS@}
 
 local TYPE_FIELD, DATA_FIELD = 2, 3
 local VARINT, FIXED64, LENGTH_DELIMITED, FIXED32 = 0, 1, 2, 5
