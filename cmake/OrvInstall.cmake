@@ -1,5 +1,5 @@
-# Installing the library: headers as <orv/…>, and find_package(orv) giving orv::messages. Where
-# orv::json was built, find_package(orv COMPONENTS json) gives it too.
+# Installing the library: headers as <orv/…>, and find_package(orv) giving orv::messages. Its components come
+# with find_package(orv COMPONENTS compare envelope json), those that were built.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
@@ -20,11 +20,13 @@ function(orv_install target exportSet)
   endforeach()
 endfunction()
 
-orv_install(orv_messages orvMessagesTargets
-  runtime messages/core messages/connection messages/join messages/group messages)
-if(TARGET orv_json)
-  orv_install(orv_json orvJsonTargets json)
-endif()
+orv_install(orv_messages orv_messagesTargets
+  runtime runtime/spelling messages/core messages/connection messages/join messages/group messages)
+foreach(component IN ITEMS compare envelope json)
+  if(TARGET orv_${component})
+    orv_install(orv_${component} orv_${component}Targets ${component})
+  endif()
+endforeach()
 
 install(FILES ${PROJECT_SOURCE_DIR}/proto/orv.proto COMPONENT library DESTINATION ${CMAKE_INSTALL_DATADIR}/orv)
 

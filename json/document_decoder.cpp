@@ -3,8 +3,8 @@
 #include <charconv>
 #include <limits>
 
-#include <orv/json/base64.hpp>
-#include <orv/json/nearest_name.hpp>
+#include <orv/spelling/base64.hpp>
+#include <orv/spelling/nearest_name.hpp>
 
 namespace orv::json {
 
@@ -32,41 +32,10 @@ std::expected<std::optional<std::uint32_t>, Error> DocumentDecoder::nextNumber(N
     name_ = member.name;
     value_ = member.value;
     const auto number = names.number(member.name);
-    if (!number) return fail("unknown field" + suggestion(member.name, names));
+    if (!number) return fail("unknown field" + spelling::suggestion(member.name, names));
     if (member.value.kind() != Value::Kind::null) return static_cast<std::uint32_t>(*number);
   }
   return std::nullopt;
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeSingularStringField(Text& value) {
-  auto read = readText();
-  if (!read) return std::unexpected(std::move(read.error()));
-  value = std::move(*read);
-  return {};
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeSingularBytesField(ByteBuffer& value) {
-  auto read = readBytes();
-  if (!read) return std::unexpected(std::move(read.error()));
-  value = std::move(*read);
-  return {};
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeSingularBoolField(bool& value) {
-  const auto read = readBool();
-  if (!read) return std::unexpected(read.error());
-  value = *read;
-  return {};
-}
-
-DocumentDecoder::Result DocumentDecoder::decodeRepeatedStringField(std::vector<Text>& texts) {
-  makeRoom(texts);
-  return forEachItem([&]() -> Result {
-    auto text = readText();
-    if (!text) return std::unexpected(std::move(text.error()));
-    texts.push_back(std::move(*text));
-    return {};
-  });
 }
 
 std::expected<Text, Error> DocumentDecoder::readText() const {
@@ -77,7 +46,7 @@ std::expected<Text, Error> DocumentDecoder::readText() const {
 
 std::expected<ByteBuffer, Error> DocumentDecoder::readBytes() const {
   if (value_->kind() != Value::Kind::text) return failExpecting("a base64 string");
-  const auto bytes = decodeBase64(value_->text());
+  const auto bytes = spelling::decodeBase64(value_->text());
   if (!bytes) return fail("expected base64, found " + quoted(value_->text()));
   return ByteBuffer(*bytes);
 }
@@ -109,7 +78,7 @@ std::expected<std::uint32_t, Error> DocumentDecoder::readUInt32() const {
 std::expected<std::int64_t, Error> DocumentDecoder::readEnum(NameMap names) const {
   if (value_->kind() == Value::Kind::text) {
     if (const auto number = names.number(value_->text())) return *number;
-    return fail("unknown name " + quoted(value_->text()) + suggestion(value_->text(), names));
+    return fail("unknown name " + quoted(value_->text()) + spelling::suggestion(value_->text(), names));
   }
   if (value_->kind() != Value::Kind::number) return failExpecting("a name or a number");
   const auto number = value_->integer();

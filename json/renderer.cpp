@@ -2,7 +2,9 @@
 
 #include <array>
 
-#include <orv/json/base64.hpp>
+#include <orv/byte_view.hpp>
+#include <orv/spelling/base64.hpp>
+#include <orv/spelling/hex.hpp>
 #include <orv/utf8.hpp>
 #include <orv/wire_reader.hpp>
 
@@ -13,11 +15,6 @@ namespace {
 // In the order of WireType.
 constexpr std::array<std::string_view, 6> wireTypeNames{"varint",     "fixed64",  "lengthDelimited",
                                                         "startGroup", "endGroup", "fixed32"};
-
-void appendEscape(char32_t codePoint, std::string& output) {
-  output += "\\u";
-  for (int shift = 12; shift >= 0; shift -= 4) output += "0123456789abcdef"[codePoint >> shift & 0xF];
-}
 
 // Characters that would act on a terminal, or end a line there or in a script, rather than be shown.
 bool isControl(char32_t codePoint) {
@@ -74,7 +71,7 @@ void Renderer::appendText(std::string_view utf8) {
       case '\t': output_ += "\\t"; break;
       default:
         if (isControl(step.codePoint)) {
-          appendEscape(step.codePoint, output_);
+          output_ += "\\u" + spelling::hexNumber(step.codePoint, 4);
         } else {
           output_ += utf8.substr(0, step.length);
         }
@@ -86,7 +83,7 @@ void Renderer::appendText(std::string_view utf8) {
 
 void Renderer::appendBytes(std::string_view bytes) {
   output_ += '"';
-  appendBase64(bytes, output_);
+  spelling::appendBase64(bytes, output_);
   output_ += '"';
 }
 
@@ -113,11 +110,7 @@ void Renderer::renderUnknown(const UnknownField& field) {
     case WireType::varint: appendText(std::to_string(*reader.readVarint())); break;
     case WireType::fixed64: appendText(std::to_string(*reader.readFixed64())); break;
     case WireType::fixed32: output_ += std::to_string(*reader.readFixed32()); break;
-    case WireType::lengthDelimited: {
-      const auto body = *reader.readLengthDelimited();
-      appendBytes({reinterpret_cast<const char*>(body.data()), body.size()});
-      break;
-    }
+    case WireType::lengthDelimited: appendBytes(charactersOf(*reader.readLengthDelimited())); break;
     case WireType::startGroup:
       open('[');
       // The body ends with an end-group tag of its own.

@@ -54,11 +54,11 @@ Outcome<> Conversation::sendMessage(const orv::SessionMessage& message) {
     return failure(std::string(describe(appended.error())));
   }
   auto sent = socket_.write(bytes, deadline());
-  if (!sent) return fault(sent.error().message, "to take a " + nameOf(message.type()));
+  if (!sent) return fault(sent.error().message, "to take a " + orv::envelope::nameOf(message.type()));
   return sent;
 }
 
-Outcome<Payload> Conversation::receivePayload(const std::string& due) {
+Outcome<orv::envelope::Payload> Conversation::receivePayload(const std::string& due) {
   readDeadline_ = deadline();
   const auto message = reader_.read<orv::SessionMessage>();
   if (!message) return fault(message.error(), due);
@@ -66,11 +66,16 @@ Outcome<Payload> Conversation::receivePayload(const std::string& due) {
   if (capture_ != nullptr) {
     if (auto kept = capture_->append(**message); !kept) return std::unexpected(kept.error());
   }
-  auto payload = unpack(**message);
-  if (!payload) return fault(payload.error().message, due);
+  if (const std::uint32_t version = (*message)->version(); version != protocolVersion) {
+    return fault("a message of version " + std::to_string(version) + " where version " +
+                     std::to_string(protocolVersion) + " is spoken",
+                 due);
+  }
+  auto payload = orv::envelope::unpack(**message);
+  if (!payload) return fault(payload.error().message(), due);
   const auto words = std::visit([](const auto& carried) { return inWords(carried); }, *payload);
-  narrator_.tell("receives", nameOf((**message).type()), words);
-  return payload;
+  narrator_.tell("receives", orv::envelope::nameOf((*message)->type()), words);
+  return std::move(*payload);
 }
 
 std::unexpected<Failure> Conversation::fault(std::string_view what, std::string_view due) const {

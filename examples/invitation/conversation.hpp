@@ -2,19 +2,23 @@
 #pragma once
 
 #include <chrono>
+#include <cstdint>
 #include <string>
 #include <string_view>
 #include <utility>
 #include <variant>
 
 #include <orv/delimited_stream.hpp>
+#include <orv/envelope.hpp>
 #include "examples/invitation/capture.hpp"
 #include "examples/invitation/narrator.hpp"
 #include "examples/invitation/outcome.hpp"
-#include "examples/invitation/payload.hpp"
 #include "examples/invitation/socket.hpp"
 
 namespace invitation {
+
+// What the envelopes say, and must say.
+inline constexpr std::uint32_t protocolVersion = 1;
 
 // Session messages over a socket, each behind its length. A message must arrive whole, or be taken by the
 // peer, within the time limit, however many pieces it comes in. Failures name the peer and what was due.
@@ -28,19 +32,21 @@ class Conversation {
 
   template <class M>
   Outcome<> send(const M& payload) {
-    const auto message = pack(payload);
-    if (!message) return std::unexpected(message.error());
-    narrator_.tell("sends", nameOf(message->type()), inWords(payload));
+    auto message = orv::envelope::pack(payload);
+    if (!message) return failure(std::string(describe(message.error())));
+    message->setVersion(protocolVersion);
+    narrator_.tell("sends", orv::envelope::nameOf(message->type()), inWords(payload));
     return sendMessage(*message);
   }
 
   // The next message's payload, which must be an M.
   template <class M>
   Outcome<M> receive() {
-    auto payload = receivePayload(nameOf(kindOf<M>));
+    const std::string due = orv::envelope::nameOf(*orv::envelope::typeCarrying<M>);
+    auto payload = receivePayload(due);
     if (!payload) return std::unexpected(payload.error());
     if (M* const received = std::get_if<M>(&*payload)) return std::move(*received);
-    return fault("something else came", nameOf(kindOf<M>));
+    return fault("something else came", due);
   }
 
   // Receives a payload that must equal this one.
@@ -69,7 +75,7 @@ class Conversation {
  private:
   Deadline deadline() const { return std::chrono::steady_clock::now() + timeLimit_; }
   Outcome<> sendMessage(const orv::SessionMessage& message);
-  Outcome<Payload> receivePayload(const std::string& due);
+  Outcome<orv::envelope::Payload> receivePayload(const std::string& due);
   Outcome<> receiveEnd(Deadline deadline);
   std::unexpected<Failure> fault(std::string_view what, std::string_view due) const;
   std::unexpected<Failure> fault(const orv::StreamError& error, std::string_view due) const;

@@ -5,7 +5,7 @@
 #include <string_view>
 #include <utility>
 
-#include "examples/invitation/payload.hpp"
+#include <orv/envelope.hpp>
 
 namespace invitation {
 

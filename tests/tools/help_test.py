@@ -7,7 +7,6 @@ import subprocess
 
 from tool import COMMAND, delimited, expect, in_scratch_directory, run, write
 
-COMPLETION = os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../tools/orv/completion.bash")
 ENVELOPE = bytes.fromhex("08 01 10 05 1A 04 22 02 10 01")
 
 
@@ -24,7 +23,7 @@ def options(help_text):
 
 def completed(*words):
     """What completion offers for the last of the words."""
-    script = f'source "{COMPLETION}"; COMP_WORDS=("$@"); COMP_CWORD=$(($# - 1)); _orv'
+    script = 'source completion.bash; COMP_WORDS=("$@"); COMP_CWORD=$(($# - 1)); _orv'
     script += '; printf "%s\\n" "${COMPREPLY[@]}"'
     done = subprocess.run(["bash", "-c", script, "bash", *words], capture_output=True, timeout=60)
     expect(f"completion of {words}: standard error", done.stderr, b"")
@@ -32,6 +31,7 @@ def completed(*words):
 
 
 def completion(helps):
+    write("completion.bash", run("--bash-completion").stdout)
     expect("completion of commands", completed(COMMAND, ""), set(helps))
     for name, text in helps.items():
         expect(f"completion of {name}'s options", completed(COMMAND, name, "--"), options(text))

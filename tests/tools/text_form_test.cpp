@@ -1,5 +1,5 @@
 // The text format against the Protocol Buffers runtime, over random messages of every type.
-#include "tools/orv/text_form.hpp"
+#include "tools/orv/messages/text_form.hpp"
 
 #include <google/protobuf/text_format.h>
 #include <gtest/gtest.h>
@@ -44,8 +44,8 @@ TEST(TextForm, IsWrittenAndReadAsByTheOtherRuntime) {
 std::string outcome(const tool::MessageType& type, std::string_view text) {
   const auto encoding = tool::encodeTextForm(type, text, usualPairing);
   if (encoding) return toHex(*encoding);
-  const tool::TextFault& fault = encoding.error();
-  return std::to_string(fault.line) + ':' + std::to_string(fault.column) + ": " + fault.reason;
+  const auto& error = encoding.error();
+  return std::to_string(error.line) + ':' + std::to_string(error.column) + ": " + error.reason;
 }
 
 TEST(TextForm, HasThePayloadInItsEnvelope) {

@@ -1,5 +1,5 @@
 // The tracing decoder, over random and damaged messages of every type.
-#include "tools/orv/trace.hpp"
+#include "tools/orv/inspect/trace.hpp"
 
 #include <gtest/gtest.h>
 
@@ -7,6 +7,7 @@
 #include <vector>
 
 #include <orv/all_messages.hpp>
+#include <orv/byte_view.hpp>
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
 #include "tests/testing/random.hpp"
@@ -26,17 +27,14 @@ class Seamless final : public tool::TraceSink {
     EXPECT_EQ(record.header.data(), shownUpTo_) << record.path;
     EXPECT_EQ(record.header.data() + record.header.size(), record.value.data()) << record.path;
     shownUpTo_ = record.value.data();
-    if (record.use != tool::FieldUse::message) shownUpTo_ += record.value.size();
-    hasUnknown_ = hasUnknown_ || record.use == tool::FieldUse::unknown;
+    if (record.type != ValueType::message) shownUpTo_ += record.value.size();
     return true;
   }
 
   const std::byte* shownUpTo() const { return shownUpTo_; }
-  bool hasUnknown() const { return hasUnknown_; }
 
  private:
   const std::byte* shownUpTo_;
-  bool hasUnknown_ = false;
 };
 
 void damage(std::string& bytes, Random& random) {
@@ -59,7 +57,7 @@ TEST(Trace, ShowsAllBytesAndFailsAsParsingDoes) {
       std::string encoding = randomEncoding(M::protoMessageName, random);
       damage(encoding, random);
       SCOPED_TRACE(toHex(encoding));
-      const auto bytes = std::as_bytes(std::span(encoding));
+      const auto bytes = bytesOf(encoding);
       Seamless sink(bytes);
       const auto traced = tool::trace(tool::typeOf<M>(), bytes, sink);
       const auto parsed = M::parse(encoding);
@@ -74,13 +72,18 @@ TEST(Trace, ShowsAllBytesAndFailsAsParsingDoes) {
   });
 }
 
-// Path, use and value of each record, in a line.
+// Path, type, value and what there is to say of it, in a line.
 class Lines final : public tool::TraceSink {
  public:
   bool record(const tool::TracedRecord& record) override {
-    lines_.push_back(std::string(record.path) + ' ' + std::to_string(static_cast<int>(record.use)) + ' ' +
-                     std::to_string(record.number) + (record.isDefined ? " defined " : " undefined ") +
-                     std::string(record.name));
+    constexpr std::string_view types[] = {"string", "bytes", "boolean", "uint32", "enumeration", "message"};
+    std::string line(record.path);
+    line += ' ';
+    line += record.type ? types[static_cast<std::size_t>(*record.type)] : "unknown";
+    line += ' ' + std::to_string(record.number);
+    if (record.field == nullptr) line += " undefined";
+    if (record.type == ValueType::enumeration) line += " " + std::string(record.caseName());
+    lines_.push_back(line);
     return lines_.size() < 5;
   }
   const std::vector<std::string>& lines() const { return lines_; }
@@ -92,23 +95,21 @@ class Lines final : public tool::TraceSink {
 std::vector<std::string> linesOf(const tool::MessageType& type, std::string_view digits) {
   const std::string encoding = hex(digits);
   Lines lines;
-  EXPECT_TRUE(tool::trace(type, std::as_bytes(std::span(encoding)), lines).has_value());
+  EXPECT_TRUE(tool::trace(type, bytesOf(encoding), lines).has_value());
   return lines.lines();
 }
 
 TEST(Trace, TellsPathsKindsAndValues) {
   using Strings = std::vector<std::string>;
-  EXPECT_EQ(
-      linesOf(tool::typeOf<Group>(), "0A 0C 12 00 12 08 0A 01 61 10 05 1A 01 62"),
-      (Strings{"initialize 5 0 defined orv.Group.Initialization",
-               "initialize.members[0] 5 0 defined orv.Member", "initialize.members[1] 5 0 defined orv.Member",
-               "initialize.members[1].handle 0 0 defined ",
-               // A token that is a number.
-               "initialize.members[1].tokenID 6 5 defined "}));
+  EXPECT_EQ(linesOf(tool::typeOf<Group>(), "0A 0C 12 00 12 08 0A 01 61 10 05 1A 01 62"),
+            (Strings{"initialize message 0", "initialize.members[0] message 0",
+                     "initialize.members[1] message 0", "initialize.members[1].handle string 0",
+                     // A token that is a number.
+                     "initialize.members[1].tokenID unknown 5"}));
   EXPECT_EQ(
       linesOf(tool::typeOf<SessionMessage>(), "10 05 10 09 10 FF FF FF FF FF FF FF FF FF 01 25 01 00 00 00"),
-      (Strings{"type 4 5 defined groupMessage", "type 4 9 defined ", "type 4 18446744073709551615 defined ",
-               "4 6 1 undefined "}));
+      (Strings{"type enumeration 5 groupMessage", "type enumeration 9 ",
+               "type enumeration 18446744073709551615 ", "4 unknown 1 undefined"}));
 }
 
 TEST(Trace, TakesRepeatedOneofMembersInLinearTime) {
@@ -124,7 +125,7 @@ TEST(Trace, TakesRepeatedOneofMembersInLinearTime) {
     std::size_t count_ = 0;
   } counter;
   const std::string encoding = repeated(hex("0A 02 12 00"), 1'000'000);
-  EXPECT_TRUE(tool::trace(tool::typeOf<Group>(), std::as_bytes(std::span(encoding)), counter).has_value());
+  EXPECT_TRUE(tool::trace(tool::typeOf<Group>(), bytesOf(encoding), counter).has_value());
   EXPECT_EQ(counter.count(), 2'000'000U);
 }
 

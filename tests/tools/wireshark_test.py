@@ -9,6 +9,7 @@ import sys
 
 from tool import SKIPPED, delimited, expect, in_scratch_directory, record
 
+DISSECTOR = os.path.abspath(sys.argv[2])
 TREE = os.path.realpath(os.path.join(os.path.dirname(__file__), "../.."))
 PORT = 4711
 
@@ -83,7 +84,7 @@ def dissected(path, *arguments):
         [
             "tshark",
             "-X",
-            f"lua_script:{TREE}/tools/wireshark/orv.lua",
+            f"lua_script:{DISSECTOR}",
             "-o",
             f'uat:protobuf_search_paths:"{TREE}/proto","TRUE"',
             "-o",

@@ -2,21 +2,16 @@
 #include <fcntl.h>
 #include <unistd.h>
 
-#include <array>
 #include <csignal>
 #include <new>
-#include <utility>
+#include <optional>
+#include <variant>
 
-#include "tools/orv/commands.hpp"
-#include "tools/orv/options.hpp"
-#include "tools/orv/output_file.hpp"
+#include "tools/orv/command_line/command_line.hpp"
+#include "tools/orv/output/output_file.hpp"
 
 namespace orv::tool {
 namespace {
-
-// In the order of Command.
-constexpr std::array run{runConvert, runConvert,  runInspect, runConvert,
-                         runDiff,    runIdentify, runTypes,   runSchema};
 
 // A file that is opened must not take the place of a standard descriptor that was closed.
 void occupyStandardDescriptors() {
@@ -27,24 +22,13 @@ void occupyStandardDescriptors() {
   }
 }
 
-ExitStatus answer(const Answer& given) {
-  OutputFile output(std::nullopt);
-  auto written = output.write(given.text);
-  if (written) written = output.finish();
-  if (written) return ExitStatus::done;
-  report(written.error());
-  return written.error().status;
-}
-
 ExitStatus runCommandLine(int argumentCount, const char* const* arguments) {
-  const auto request = parseCommandLine(argumentCount, arguments);
-  if (const auto* const failure = std::get_if<Failure>(&request)) {
-    report(*failure);
-    return failure->status;
-  }
-  if (const auto* const text = std::get_if<Answer>(&request)) return answer(*text);
-  const auto& options = std::get<Options>(request);
-  return run[static_cast<std::size_t>(options.command)](options);
+  const auto parsed = parseCommandLine(argumentCount, arguments);
+  if (const auto* const request = std::get_if<Request>(&parsed))
+    return request->command->run(request->options);
+  if (const auto* const answer = std::get_if<Answer>(&parsed)) return writeWhole(std::nullopt, answer->text);
+  report(std::get<Failure>(parsed));
+  return std::get<Failure>(parsed).status;
 }
 
 }  // namespace

@@ -1,29 +1,34 @@
 // What the command line asks for.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <string>
-#include <variant>
+#include <string_view>
 #include <vector>
 
-#include "tools/orv/failure.hpp"
-#include "tools/orv/format.hpp"
-#include "tools/orv/message_type.hpp"
-#include "tools/orv/payload.hpp"
-#include "tools/orv/terminal.hpp"
+#include "tools/orv/messages/payload_pairing.hpp"
 
 namespace orv::tool {
 
-enum class Command : std::uint8_t { decode, encode, inspect, convert, diff, identify, types, schema };
+// The forms that a message can be given in.
+enum class Format : std::uint8_t { binary, hex, base64, text, json };
+
+// In the order of Format, as the options spell them.
+inline constexpr std::array<std::string_view, 5> formatNames{"binary", "hex", "base64", "text", "json"};
+
+// Whether the format spells out the binary encoding, byte by byte.
+constexpr bool isBytes(Format format) { return format <= Format::base64; }
+
+enum class ColourChoice : std::uint8_t { automatic, always, never };
 
 struct Options {
-  Command command = Command::decode;
   const MessageType* type = &typeOf<SessionMessage>();
   PayloadPairing payloads;
-  std::optional<Format> from;  // none: the command's default
-  std::optional<Format> to;
+  std::optional<Format> from;  // none: to be seen from the input
+  std::optional<Format> to;    // none: the command writes no messages
   bool isDelimited = false;
   bool showsUnknownFields = false;
   bool comparesEncodings = false;
@@ -35,12 +40,5 @@ struct Options {
   std::vector<std::string> files;  // or the names of message types, for the command types
   std::optional<std::string> output;
 };
-
-// Text that was asked for in place of work: help, the version, the manual page.
-struct Answer {
-  std::string text;
-};
-
-std::variant<Options, Answer, Failure> parseCommandLine(int argumentCount, const char* const* arguments);
 
 }  // namespace orv::tool

@@ -35,23 +35,31 @@ class DocumentDecoder {
     return nextNumber(M::_protobuf_nameMap());
   }
 
-  Result decodeSingularStringField(Text& value);
+  Result decodeSingularStringField(Text& value) { return take(value, &DocumentDecoder::readText); }
   Result decodeSingularStringField(std::optional<Text>& value) {
-    return present(value, &DocumentDecoder::readText);
+    return take(value, &DocumentDecoder::readText);
   }
-  Result decodeSingularBytesField(ByteBuffer& value);
+  Result decodeSingularBytesField(ByteBuffer& value) { return take(value, &DocumentDecoder::readBytes); }
   Result decodeSingularBytesField(std::optional<ByteBuffer>& value) {
-    return present(value, &DocumentDecoder::readBytes);
+    return take(value, &DocumentDecoder::readBytes);
   }
-  Result decodeSingularBoolField(bool& value);
+  Result decodeSingularBoolField(bool& value) { return take(value, &DocumentDecoder::readBool); }
   Result decodeSingularBoolField(std::optional<bool>& value) {
-    return present(value, &DocumentDecoder::readBool);
+    return take(value, &DocumentDecoder::readBool);
   }
   // A number without a fraction, or a string of digits.
   Result decodeSingularUInt32Field(std::optional<std::uint32_t>& value) {
-    return present(value, &DocumentDecoder::readUInt32);
+    return take(value, &DocumentDecoder::readUInt32);
   }
-  Result decodeRepeatedStringField(std::vector<Text>& texts);
+  Result decodeRepeatedStringField(std::vector<Text>& texts) {
+    makeRoom(texts);
+    return forEachItem([&]() -> Result {
+      Text text;
+      if (auto taken = take(text, &DocumentDecoder::readText); !taken) return taken;
+      texts.push_back(std::move(text));
+      return {};
+    });
+  }
 
   // By name or by number.
   template <class Enumeration>
@@ -92,8 +100,9 @@ class DocumentDecoder {
     return message.decodeMessage(nested);
   }
 
-  template <class T>
-  Result present(std::optional<T>& slot, std::expected<T, Error> (DocumentDecoder::*read)() const) {
+  // Into a value or an optional one.
+  template <class Slot, class T>
+  Result take(Slot& slot, std::expected<T, Error> (DocumentDecoder::*read)() const) {
     auto value = (this->*read)();
     if (!value) return std::unexpected(std::move(value.error()));
     slot = std::move(*value);

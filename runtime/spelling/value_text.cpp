@@ -1,0 +1,76 @@
+#include <orv/spelling/value_text.hpp>
+
+#include <orv/spelling/hex.hpp>
+#include <orv/utf8.hpp>
+
+namespace orv::spelling {
+
+namespace {
+
+bool isShown(const utf8::Step& step) {
+  const bool isControl = step.codePoint < 0x20 || (step.codePoint >= 0x7F && step.codePoint < 0xA0);
+  return step.isWellFormed && !isControl;
+}
+
+// What stands at the start of the text, as it is or in escapes. Answers how many bytes it takes.
+std::size_t appendCharacter(std::string_view text, std::string& output) {
+  if (const char first = text.front(); first >= 0x20 && first < 0x7F) {
+    output += first;
+    return 1;
+  }
+  const utf8::Step step = utf8::step(text);
+  const std::string_view character = text.substr(0, step.length);
+  if (isShown(step)) {
+    output += character;
+  } else {
+    output += "\\x";
+    appendHex(character, output, "\\x");
+  }
+  return step.length;
+}
+
+std::string sizeNote(std::size_t size) { return " (" + std::to_string(size) + " bytes)"; }
+
+}  // namespace
+
+bool isReadable(std::string_view bytes) {
+  while (!bytes.empty()) {
+    const utf8::Step step = utf8::step(bytes);
+    if (!isShown(step)) return false;
+    bytes.remove_prefix(step.length);
+  }
+  return true;
+}
+
+std::string printable(std::string_view text) {
+  std::string output;
+  while (!text.empty()) text.remove_prefix(appendCharacter(text, output));
+  return output;
+}
+
+std::string quotedText(std::string_view utf8, std::size_t from) {
+  constexpr std::size_t longest = 60;  // bytes
+  const std::size_t size = utf8.size();
+  std::string output = from == 0 ? "\"" : "…\"";
+  utf8.remove_prefix(from);
+  std::size_t taken = 0;
+  while (taken < utf8.size() && taken < longest) {
+    if (utf8[taken] == '"' || utf8[taken] == '\\') output += '\\';
+    taken += appendCharacter(utf8.substr(taken), output);
+  }
+  const bool isCut = taken < utf8.size();
+  output += isCut ? "\"…" : "\"";
+  return from != 0 || isCut ? output + sizeNote(size) : output;
+}
+
+std::string hexText(std::string_view bytes, std::size_t from) {
+  constexpr std::size_t longest = 24;  // bytes
+  if (bytes.empty()) return "no bytes";
+  std::string output = from == 0 ? "" : "… ";
+  appendHex(bytes.substr(from, longest), output, " ");
+  const bool isCut = bytes.size() - from > longest;
+  if (isCut) output += " …";
+  return from != 0 || isCut ? output + sizeNote(bytes.size()) : output;
+}
+
+}  // namespace orv::spelling

@@ -1,0 +1,89 @@
+// The subcommands and their options, in one table: parsing, help, manual page and completion are made of it.
+#pragma once
+
+#include <cstdint>
+#include <expected>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "tools/orv/failure.hpp"
+#include "tools/orv/options.hpp"
+
+namespace orv::tool {
+
+// The formats that a command takes on one side.
+struct FormatChoice {
+  std::span<const Format> allowed{};
+  std::optional<Format> byDefault{};
+  bool isGuessed = false;  // where it is not said; without this and a default it must be said
+};
+
+struct Command;
+
+struct OptionDescription {
+  char letter;                 // '\0' for none
+  std::string_view name;       // "--type"
+  std::string_view valueName;  // "TYPE"; empty for a flag
+  std::string_view text;       // a sentence without its full stop; formats are added to it
+  // Enters the option, with the value unless it is a flag. The error says what is wrong with the value.
+  std::expected<void, std::string> (*take)(Options&, const Command&, std::string_view value);
+  // For options that name a format: the ones to choose from.
+  FormatChoice Command::*formats = nullptr;
+  // The words that the value can be, if they are few.
+  std::string_view words = {};
+};
+
+struct Example {
+  std::string_view line;
+  std::string_view text;
+};
+
+// What stands behind the options.
+enum class Operands : std::uint8_t { none, files, twoFiles, types };
+
+struct Command {
+  std::string_view name;
+  // Reports what fails and answers the status to exit with.
+  ExitStatus (*run)(const Options&);
+  std::string_view summary;  // a few words
+  std::string_view text;     // sentences
+  Operands operands;
+  FormatChoice from;
+  FormatChoice to;
+  std::span<const OptionDescription* const> options;
+  std::span<const Example> examples;
+};
+
+struct StatusDescription {
+  ExitStatus status;
+  std::string_view meaning;
+};
+
+struct CommandTable {
+  std::string_view summary;
+  std::string_view text;                              // sentences
+  std::string_view formats;                           // sentences about them
+  std::span<const OptionDescription* const> options;  // outside of the commands
+  std::span<const Command> commands;                  // the first is the one that is run if none is named
+  std::span<const StatusDescription> statuses;
+};
+
+extern const CommandTable commandTable;
+
+// decode, encode and convert.
+ExitStatus runConvert(const Options& options);
+ExitStatus runInspect(const Options& options);
+ExitStatus runDiff(const Options& options);
+ExitStatus runIdentify(const Options& options);
+ExitStatus runTypes(const Options& options);
+ExitStatus runSchema(const Options& options);
+
+// "binary (default), hex, base64"
+std::string listed(const FormatChoice& formats);
+
+// The option's text with the formats that the command takes.
+std::string textOf(const OptionDescription& option, const Command& command);
+
+}  // namespace orv::tool

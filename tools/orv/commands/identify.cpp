@@ -1,0 +1,162 @@
+// identify.
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <cstdio>
+#include <expected>
+#include <span>
+#include <string>
+#include <string_view>
+#include <tuple>
+#include <vector>
+
+#include <orv/byte_view.hpp>
+#include <orv/spelling/value_text.hpp>
+#include "tools/orv/command_line/command.hpp"
+#include "tools/orv/commands/message_loop.hpp"
+#include "tools/orv/inspect/trace.hpp"
+
+namespace orv::tool {
+
+namespace {
+
+// A type that the bytes could be.
+struct Candidate {
+  const MessageType* type;
+  // From 0 to 1: the share of the bytes that the type explains. Fields that are checked while they are read,
+  // as messages and texts are, explain their bytes fully, bytes of any content half of theirs, unknown fields
+  // nothing.
+  double score;
+  std::size_t knownFields;
+  std::size_t unknownFields;
+};
+
+// How much of a value's bytes is explained by the field that takes it.
+double explainedShare(const TracedRecord& record) {
+  constexpr double opaque = 0.5;
+  constexpr double unlikely = 0.2;
+  switch (*record.type) {
+    case ValueType::string: return spelling::isReadable(charactersOf(record.value)) ? 1 : unlikely;
+    case ValueType::bytes: return opaque;
+    case ValueType::boolean: return record.number <= 1 ? 1 : unlikely;
+    case ValueType::uint32: return record.number <= 0xFFFFFFFF ? 1 : unlikely;
+    case ValueType::enumeration: return record.caseName().empty() ? unlikely : 1;
+    case ValueType::message: break;  // what it holds is reported on its own
+  }
+  return 0;
+}
+
+class Explanation final : public TraceSink {
+ public:
+  bool record(const TracedRecord& record) override {
+    if (!record.type) {
+      ++unknownFields_;
+      return true;
+    }
+    ++knownFields_;
+    explained_ += static_cast<double>(record.header.size());
+    explained_ += explainedShare(record) * static_cast<double>(record.value.size());
+    return true;
+  }
+
+  void addPayload(const Explanation& payload, std::size_t size) {
+    // The envelope had explained it as bytes of any content.
+    explained_ += payload.explained_ - 0.5 * static_cast<double>(size);
+    knownFields_ += payload.knownFields_;
+    unknownFields_ += payload.unknownFields_;
+  }
+
+  Candidate candidate(const MessageType& type, std::size_t size) const {
+    const double score = size == 0 ? 1 : explained_ / static_cast<double>(size);
+    return {&type, score, knownFields_, unknownFields_};
+  }
+
+ private:
+  double explained_ = 0;
+  std::size_t knownFields_ = 0;
+  std::size_t unknownFields_ = 0;
+};
+
+// An envelope is the likelier when its data is the message that its type says.
+void lookIntoEnvelope(std::span<const std::byte> bytes, Explanation& explanation) {
+  const EnvelopeOutline outline = outlineOf(bytes);
+  const MessageType* const payload = outline.data ? PayloadPairing().payloadOf(outline.type) : nullptr;
+  if (payload == nullptr) return;
+  Explanation inner;
+  if (trace(*payload, *outline.data, inner)) explanation.addPayload(inner, outline.data->size());
+}
+
+// The types that the bytes could be, the likeliest first; types that fit alike in the order of the protocol.
+// The error is that of bytes that are no fields at all, whatever the type.
+std::expected<std::vector<Candidate>, DecodeError> rankTypes(std::span<const std::byte> bytes) {
+  std::vector<Candidate> candidates;
+  for (const MessageType& type : allMessageTypes()) {
+    Explanation explanation;
+    auto traced = trace(type, bytes, explanation);
+    // What is malformed to a type without fields is malformed to every type.
+    if (!traced && type.descriptor->fields.empty()) {
+      traced.error().path = {};
+      return std::unexpected(traced.error());
+    }
+    if (!traced) continue;
+    if (type.isEnvelope()) lookIntoEnvelope(bytes, explanation);
+    candidates.push_back(explanation.candidate(type, bytes.size()));
+  }
+  std::ranges::sort(candidates, {}, [](const Candidate& candidate) {
+    return std::tuple(-candidate.score, candidate.unknownFields, candidate.type->index);
+  });
+  return candidates;
+}
+
+std::string count(std::size_t number, std::string_view thing) {
+  return std::to_string(number) + " " + std::string(thing) + (number == 1 ? "" : "s");
+}
+
+// The likeliest first; of the types that explain nothing, none.
+std::string describe(std::vector<Candidate> candidates) {
+  std::erase_if(candidates, [](const Candidate& candidate) { return candidate.score <= 0; });
+  if (candidates.empty()) return "no type has any of these fields\n";
+  std::size_t nameWidth = 0;
+  for (const Candidate& candidate : candidates)
+    nameWidth = std::max(nameWidth, candidate.type->fullName().size());
+  std::string text;
+  for (const Candidate& candidate : candidates) {
+    std::array<char, 16> share;
+    std::snprintf(share.data(), share.size(), "%3.0f %%  ", 100 * candidate.score);
+    text += share.data();
+    text += candidate.type->fullName();
+    text.append(nameWidth + 2 - candidate.type->fullName().size(), ' ');
+    text += count(candidate.knownFields, "field");
+    if (candidate.unknownFields != 0) text += ", " + std::to_string(candidate.unknownFields) + " unknown";
+    text += '\n';
+  }
+  return text;
+}
+
+class Identification final : public MessageWork {
+ public:
+  Identification(const Options& options, OutputFile& output) : options_(options), output_(output) {}
+
+  Outcome<void> take(const MessageInput& message) override {
+    const auto ranked = rankTypes(bytesOf(message.encoding()));
+    if (!ranked) return std::unexpected(message.failureOf(ranked.error()));
+    std::string text = message.frame().number > 1 ? "\n" : "";
+    if (options_.files.size() > 1) text += message.path() + ":\n";
+    if (options_.isDelimited) text += "message " + std::to_string(message.frame().number) + ":\n";
+    return output_.write(text + describe(*ranked));
+  }
+
+ private:
+  const Options& options_;
+  OutputFile& output_;
+};
+
+}  // namespace
+
+ExitStatus runIdentify(const Options& options) {
+  OutputFile output(options.output);
+  Identification identification(options, output);
+  return forEachMessage(options, output, identification);
+}
+
+}  // namespace orv::tool

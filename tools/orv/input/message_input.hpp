@@ -1,0 +1,64 @@
+// Messages out of files of any format.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "tools/orv/failure.hpp"
+#include "tools/orv/input/frame_reader.hpp"
+#include "tools/orv/input/input_file.hpp"
+#include "tools/orv/messages/message_value.hpp"
+#include "tools/orv/options.hpp"
+
+namespace orv::tool {
+
+// Reads the messages of one input file, one after the other.
+class MessageInput {
+ public:
+  // The options, which must outlive the input, say type, payloads and format; without a format it is guessed
+  // from the input's first character, text or JSON.
+  static Outcome<std::unique_ptr<MessageInput>> open(const std::string& path, const Options& options);
+
+  // The next message; false at the end of the input.
+  Outcome<bool> next();
+
+  // As the command line names the file.
+  const std::string& path() const { return path_; }
+  const Frame& frame() const { return frame_; }
+
+  // The message's binary encoding: as it came if it came as bytes, and then not yet checked.
+  std::string_view encoding() const { return encoding_; }
+  // Where it begins in the input; 0 for the encoding of a message that came as text.
+  std::uint64_t encodingOffset() const { return isBytes(format_) ? frame_.offset : 0; }
+
+  // Fails unless the encoding is a message, which is in doubt where it came as bytes. What an envelope holds
+  // is not looked at.
+  Outcome<void> check() const;
+
+  // The message with its envelope opened. Where an envelope in text or JSON has its data as a string of bytes
+  // that are not the payload they should be, it stays closed.
+  Outcome<OwnedMessage> message() const;
+
+  // The failure for an error in the encoding.
+  Failure failureOf(const DecodeError& error) const;
+
+ private:
+  MessageInput(InputFile file, const std::string& path, const Options& options);
+  Outcome<std::string> encodeText() const;
+  Outcome<std::string> encodeJson() const;
+
+  InputFile file_;
+  const std::string& path_;
+  const Options& options_;
+  Format format_;
+  std::unique_ptr<FrameReader> reader_;
+  Frame frame_;
+  std::string encoded_;  // of a message that came as text
+  std::string_view encoding_;
+};
+
+}  // namespace orv::tool

@@ -1,0 +1,67 @@
+// How an annotated dump is set, for a given width.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "tools/orv/output/palette.hpp"
+
+namespace orv::tool {
+
+// Sets the rows of a dump: offset, bytes, and beside the bytes' first row what they are. A value that would
+// be cut there stands beside the second.
+class DumpLayout {
+ public:
+  // A width of 0 is that of no terminal: rows are as long as they are.
+  DumpLayout(std::size_t width, Palette palette);
+
+  // What stands beside bytes.
+  struct Note {
+    std::size_t depth = 0;  // of payloads
+    std::string_view path;
+    std::string_view kind;
+    std::string value;
+    Palette::Colour colour = Palette::Colour::value;
+  };
+
+  // Bytes that are one record, or part of it: first those of tag and length, then those of the value.
+  struct Bytes {
+    std::uint64_t offset;
+    std::span<const std::byte> header;
+    std::span<const std::byte> value;
+    Palette::Colour valueColour = Palette::Colour::value;
+  };
+
+  void appendHeading(std::string& output, std::string_view text) const;
+  void appendRecord(std::string& output, const Bytes& bytes, const Note& note) const;
+  // A line in the notes' place, or from the left where it is too long for that.
+  void appendError(std::string& output, std::string_view text) const;
+
+ private:
+  void appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const;
+  // Path and kind.
+  void appendNote(std::string& output, const Note& note) const;
+  void appendValue(std::string& output, const Note& note, bool isBelow) const;
+  // The text in so many columns, with an ellipsis where it is cut.
+  void appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
+                     std::size_t room) const;
+
+  // Places and widths in columns.
+  std::size_t noteColumn() const;
+  static std::size_t indentation(const Note& note);
+  std::size_t pathWidth(const Note& note) const;
+  std::size_t kindWidth(const Note& note) const;
+  std::size_t roomBehind(std::size_t column) const;
+  // Whether the value has room on the row of path and kind.
+  bool fitsBeside(const Note& note) const;
+
+  std::size_t width_;
+  std::size_t bytesPerRow_;
+  bool isAligned_;  // whether paths and kinds are set in columns
+  Palette palette_;
+};
+
+}  // namespace orv::tool
