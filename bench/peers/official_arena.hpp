@@ -12,14 +12,26 @@ namespace bench {
 template <class Message>
 class ArenaMessage {
  public:
-  ArenaMessage()
-      : arena_(block_, sizeof block_), message_(google::protobuf::Arena::CreateMessage<Message>(&arena_)) {}
+  ArenaMessage() : arena_(options()), message_(google::protobuf::Arena::CreateMessage<Message>(&arena_)) {}
   ArenaMessage(const ArenaMessage& other) : ArenaMessage() { message_->CopyFrom(*other.message_); }
+
+  // Begins anew with the memory that the arena has.
+  void reset() {
+    arena_.Reset();
+    message_ = google::protobuf::Arena::CreateMessage<Message>(&arena_);
+  }
 
   Message& operator*() { return *message_; }
   const Message& operator*() const { return *message_; }
 
  private:
+  google::protobuf::ArenaOptions options() {
+    google::protobuf::ArenaOptions options;
+    options.initial_block = block_;
+    options.initial_block_size = sizeof block_;
+    return options;
+  }
+
   alignas(8) char block_[4096];
   google::protobuf::Arena arena_;
   Message* message_;
@@ -32,13 +44,18 @@ struct OfficialArena : Official {
   using Value = ArenaMessage<Official::Value<kind>>;
 
   static bool decode(auto& value, std::string_view bytes) { return Official::decode(*value, bytes); }
-  static bool decodeAgain(auto& value, std::string_view bytes) { return decode(value, bytes); }
+  static bool decodeAgain(auto& value, std::string_view bytes) {
+    value.reset();
+    return decode(value, bytes);
+  }
   static std::string encode(const auto& value) { return Official::encode(*value); }
   static std::size_t encodeInto(const auto& value, std::span<char> buffer) {
     return Official::encodeInto(*value, buffer);
   }
   static bool equal(const auto& left, const auto& right) { return Official::equal(*left, *right); }
   static std::string text(const auto& value) { return Official::text(*value); }
+  static void build(auto& value, const auto& source) { Official::build(*value, source); }
+  static std::size_t weigh(const auto& value) { return Official::weigh(*value); }
 };
 
 }  // namespace bench
