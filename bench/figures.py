@@ -34,7 +34,10 @@ ROWS = [
 MORE_ROWS = [
     Row("two threads at once", ("two-threads",)),
     Row("equality, but for normal form", ("equal-normal-form",)),
-    Row("refuse, last text ill-formed", ("refuse-last-text",)),
+    Row("refuse, cut", ("refuse-truncated", "refuse-cut-middle", "refuse-cut-end")),
+    Row("refuse, first text ill-formed", ("refuse-text",)),
+    Row("refuse, last text ill-formed", ("refuse-last-text", "refuse-text-end")),
+    Row("refuse, garbage", ("refuse-garbage",)),
     Row("render as text", ("text",)),
 ]
 PER_MEMBER = "per-member"

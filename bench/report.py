@@ -135,12 +135,13 @@ def per_member_table(results):
 
 def steadiness(results):
     """How far the cost per member moves between the smallest group of 100 and the largest."""
-    times = [results.time(PER_MEMBER, name, OURS) / members_of(name)
-             for name in results.workloads(PER_MEMBER, SCALING)
-             if members_of(name) >= 100 and results.time(PER_MEMBER, name, OURS)]
-    if not times:
-        return ""
-    return f"From 100 members on, `{OURS}` needs at most {max(times) / min(times) - 1:.0%} more time than at best."
+    names = [name for name in results.workloads(PER_MEMBER, SCALING) if members_of(name) >= 100]
+    times = [results.time(PER_MEMBER, name, OURS) / members_of(name) for name in names]
+    sizes = [(held["sizeof"] + held["heap"]) / members_of(name)
+             for name in names if (held := results.held(name, OURS))]
+    parts = [f"at most {max(values) / min(values) - 1:.0%} more {what}"
+             for values, what in ((times, "time"), (sizes, "memory")) if values]
+    return f"From 100 members on, `{OURS}` needs {' and '.join(parts)} per member than at best." if parts else ""
 
 
 def start_up_times(programs, rounds=300):
