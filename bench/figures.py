@@ -40,6 +40,7 @@ MORE_ROWS = [
     Row("refuse, garbage", ("refuse-garbage",)),
     Row("render as text", ("text",)),
 ]
+OPERATIONS = list(dict.fromkeys(operation for row in ROWS + MORE_ROWS for operation in row.operations))
 PER_MEMBER = "per-member"
 
 

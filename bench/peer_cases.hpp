@@ -9,6 +9,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -92,14 +93,7 @@ class PeerCases {
     if (workload_.set == Set::scaling) return addDecoding("per-member", workload_.bytes);
     addDecoding("decode-fresh", workload_.bytes);
     if constexpr (Peer::reusesMemory) addReuse();
-    addEncoding();
-    if constexpr (std::copy_constructible<Value>) {
-      addForValues("copy", [](const Value& value) {
-        const Value copy = value;
-        keep(copy);
-      });
-    }
-    if constexpr (hasEqual) addComparison("equal", workload_.bytes);
+    workload_.bytes.size() == 1 ? addForHeld<Value>() : addForHeld<OneOfMany>();
     if constexpr (isBuilt) addBuilding();
     for (const Refused& refused : workload_.refused) {
       if (refusesAll(refused)) addDecoding(refused.operation, refused.bytes);
@@ -110,6 +104,13 @@ class PeerCases {
 
  private:
   using Value = typename Peer::template Value<kind>;
+  // How values are kept where there are thousands of them.
+  using OneOfMany = typename decltype([] {
+    if constexpr (requires { typename Peer::template OneOfMany<kind>; })
+      return std::type_identity<typename Peer::template OneOfMany<kind>>();
+    else
+      return std::type_identity<Value>();
+  }())::type;
   using Plain = plain::Message<kind>;
   static constexpr bool hasEqual = requires(const Value& value) { Peer::equal(value, value); };
   static constexpr bool isBuilt = requires(Value & value, const Plain& source) {
@@ -155,8 +156,9 @@ class PeerCases {
                                 });
   }
 
-  static std::unique_ptr<Value> decoded(std::string_view bytes) {
-    auto value = std::make_unique<Value>();
+  template <class Held = Value>
+  static std::unique_ptr<Held> decoded(std::string_view bytes) {
+    auto value = std::make_unique<Held>();
     Peer::decode(*value, bytes);
     return value;
   }
@@ -219,34 +221,43 @@ class PeerCases {
     });
   }
 
-  template <class Use>
+  template <class Held = Value, class Use>
   void addForValues(std::string operation, Use use) {
     addCase(std::move(operation), workload_.bytes.size(), [w = &workload_, use] {
-      return [values = objectsFor<Value>(w->bytes, decoded), use](std::size_t at) {
+      return [values = objectsFor<Held>(w->bytes, decoded<Held>), use](std::size_t at) {
         keep(values[at]);
         use(values[at]);
       };
     });
   }
 
-  void addEncoding() {
-    addForValues("encode-fresh", [](const Value& value) { keep(Peer::encode(value)); });
+  template <class Held>
+  void addForHeld() {
+    addForValues<Held>("encode-fresh", [](const Held& value) { keep(Peer::encode(value)); });
     addCase("encode-buffer", workload_.bytes.size(), [w = &workload_] {
       const PageBuffer buffer(std::ranges::max(w->bytes, {}, &std::pmr::string::size).size() + bufferSlack);
-      return [values = objectsFor<Value>(w->bytes, decoded), buffer](std::size_t at) {
+      return [values = objectsFor<Held>(w->bytes, decoded<Held>), buffer](std::size_t at) {
         keep(values[at]);
         keep(Peer::encodeInto(values[at], buffer));
       };
     });
+    if constexpr (std::copy_constructible<Value>) {
+      addForValues<Held>("copy", [](const Held& value) {
+        const Value copy(value);
+        keep(copy);
+      });
+    }
+    if constexpr (hasEqual) addComparison<Held>("equal", workload_.bytes);
   }
 
   // The two that are compared are decoded anew, so that no peer profits from sharing.
+  template <class Held = Value>
   void addComparison(std::string operation, const ByteStrings& others) {
-    using Pair = std::pair<std::unique_ptr<Value>, std::unique_ptr<Value>>;
+    using Pair = std::pair<std::unique_ptr<Held>, std::unique_ptr<Held>>;
     addCase(std::move(operation), others.size(), [w = &workload_, &others] {
       auto other = others.begin();
       const auto pairs = objectsFor<Pair>(w->bytes, [&](std::string_view bytes) {
-        return std::make_unique<Pair>(decoded(bytes), decoded(*other++));
+        return std::make_unique<Pair>(decoded<Held>(bytes), decoded<Held>(*other++));
       });
       return [pairs](std::size_t at) {
         const auto& [left, right] = pairs[at];

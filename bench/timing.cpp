@@ -3,10 +3,10 @@
 //   bench_timing <filter> <samples> <milliseconds> <seed> [<peer>...]
 //
 // The filter is a regular expression for operation/workload/peer. Every case gets so many samples of about so
-// many milliseconds, each with new objects in other places. They are taken in rounds: in each, the rows
-// (operation and workload) come in an order left to chance, and so do the peers of a row, one after the other,
-// so that a sample is best compared with those of the same round. They are processor time, so that other
-// programs disturb them less.
+// many milliseconds, those with very many messages three; each has new objects in other places. They are taken
+// in rounds: in each, the rows (operation and workload) come in an order left to chance, and so do the peers of
+// a row, one after the other, so that a sample is best compared with those of the same round. They are
+// processor time, so that other programs disturb them less.
 
 #include <alloca.h>
 #include <malloc.h>
@@ -29,7 +29,11 @@
 
 namespace {
 
+// Of how many parts of a sample the fastest counts.
 constexpr int parts = 3;
+// More messages than these take long to make, so that fewer samples must do.
+constexpr std::size_t veryMany = 10'000;
+constexpr std::size_t samplesOfVeryMany = 3;
 
 double threadNanoseconds() {
   timespec time;
@@ -75,12 +79,14 @@ double sample(const bench::Case& measured, std::size_t iterations) {
 
 struct Measurement {
   const bench::Case* measured;
-  std::vector<double> samples;
   std::size_t iterations = 1;
+  std::vector<double> samples{};
 };
 
-// So many iterations as fill the time, and whole turns of all messages.
+// So many iterations for each part as fill the time, and whole turns of all messages; of very many messages one
+// turn for all parts together.
 std::size_t iterationsFor(const bench::Case& measured, double nanoseconds) {
+  if (measured.messages > veryMany) return measured.messages / parts;
   std::size_t iterations = measured.messages;
   double time = sample(measured, iterations);
   if (time * static_cast<double>(iterations) < nanoseconds / 10) {
@@ -101,8 +107,9 @@ void takeSamples(std::map<std::string, std::vector<Measurement>>& rows, std::siz
   for (std::size_t round = 0; round < samples; ++round) {
     std::ranges::shuffle(order, bench::placementChance());
     for (std::vector<Measurement>* const row : order) {
+      if (row->front().measured->messages > veryMany && round >= samplesOfVeryMany) continue;
       std::ranges::shuffle(*row, bench::placementChance());
-      for (Measurement& each : *row) each.samples[round] = sample(*each.measured, each.iterations);
+      for (Measurement& each : *row) each.samples.push_back(sample(*each.measured, each.iterations));
     }
   }
 }
@@ -137,7 +144,7 @@ int main(int argumentCount, char** arguments) {
   for (const bench::Case& measured : catalogue.cases) {
     const std::string row = measured.operation + "/" + measured.workload;
     if (!std::regex_search(row + "/" + std::string(measured.peer), filter)) continue;
-    rows[measured.threads][row].push_back({&measured, std::vector<double>(samples)});
+    rows[measured.threads][row].push_back({&measured});
   }
   for (auto& [threads, rowsOfThreads] : rows) takeSamples(rowsOfThreads, samples, nanoseconds);
 

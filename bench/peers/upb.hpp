@@ -20,7 +20,8 @@
 
 namespace bench {
 
-// An arena whose first 4 KiB are part of it.
+// An arena whose first block is part of it.
+template <std::size_t blockSize = 4096>
 class UpbArena {
  public:
   UpbArena() { begin(); }
@@ -37,19 +38,23 @@ class UpbArena {
  private:
   void begin() { arena_ = upb_Arena_Init(block_, sizeof block_, &upb_alloc_global); }
 
-  alignas(16) char block_[4096];
+  alignas(16) char block_[blockSize];
   upb_Arena* arena_;
 };
 
 // A message on an arena of its own.
-template <class Message, const upb_MiniTable* descriptionOfMessage>
+template <class Message, const upb_MiniTable* descriptionOfMessage, std::size_t blockSize = 4096>
 class UpbMessage {
  public:
   static constexpr const upb_MiniTable* description = descriptionOfMessage;
+  template <std::size_t size>
+  using Sized = UpbMessage<Message, descriptionOfMessage, size>;
 
   UpbMessage() : message_(upb_Message_New(description, arena())) {}
-  UpbMessage(const UpbMessage& other)
-      : message_(upb_Message_DeepClone(other.message_, description, arena())) {}
+  UpbMessage(const UpbMessage& other) : message_(upb_Message_DeepClone(other.base(), description, arena())) {}
+  template <std::size_t otherSize>
+  explicit UpbMessage(const UpbMessage<Message, description, otherSize>& other)
+      : message_(upb_Message_DeepClone(other.base(), description, arena())) {}
 
   void reset() {
     arena_.reset();
@@ -62,7 +67,7 @@ class UpbMessage {
   const Message* operator*() const { return reinterpret_cast<const Message*>(message_); }
 
  private:
-  UpbArena arena_;
+  UpbArena<blockSize> arena_;
   upb_Message* message_;
 };
 
@@ -80,6 +85,9 @@ struct Upb : EqualWork {
                  UpbMessage<orv_JoinRequest_Content, &orv__JoinRequest__Content_msg_init>,
                  UpbMessage<orv_JoinResponse_Content, &orv__JoinResponse__Content_msg_init>,
                  UpbMessage<orv_Group, &orv__Group_msg_init>>>;
+  // Where thousands are held at once: 4 KiB of each would fill the caches with next to nothing.
+  template <Kind kind>
+  using OneOfMany = typename Value<kind>::template Sized<256>;
 
   static bool decode(auto& value, std::string_view bytes) {
     return upb_Decode(bytes.data(), bytes.size(), value.base(), value.description, nullptr, 0,
@@ -91,11 +99,11 @@ struct Upb : EqualWork {
   }
   // upb encodes onto an arena only; whoever wants the bytes elsewhere copies them.
   static std::string encode(const auto& value) {
-    const UpbArena arena;
+    const UpbArena<> arena;
     return std::string(encoded(value, arena));
   }
   static std::size_t encodeInto(const auto& value, std::span<char> buffer) {
-    const UpbArena arena;
+    const UpbArena<> arena;
     const std::string_view bytes = encoded(value, arena);
     std::memcpy(buffer.data(), bytes.data(), bytes.size());
     return bytes.size();
@@ -236,7 +244,7 @@ struct Upb : EqualWork {
   }
 
  private:
-  static std::string_view encoded(const auto& value, const UpbArena& arena) {
+  static std::string_view encoded(const auto& value, const UpbArena<>& arena) {
     char* bytes = nullptr;
     std::size_t size = 0;
     if (upb_Encode(value.base(), value.description, 0, arena.get(), &bytes, &size) != kUpb_EncodeStatus_Ok)
