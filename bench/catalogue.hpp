@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -7,12 +8,21 @@
 
 namespace bench {
 
-// One operation of one peer on one workload, to be run as often as wanted.
+// Runs an operation so many times, on objects of its own; where a workload has many messages they take turns.
+using Loop = std::function<void(std::size_t iterations)>;
+
+// One operation of one peer on one workload.
 struct Case {
   std::string operation;
   std::string workload;
   std::string_view peer;
-  std::function<void(std::size_t iterations)> run;
+  std::string_view set;
+  // After how many iterations all messages of the workload have had their turn.
+  std::size_t messages;
+  // How many threads run it at once.
+  int threads;
+  // Makes the objects anew, wherever the heap puts them now.
+  std::function<Loop()> prepare;
 };
 
 // One decoded value of one peer: calls back while it holds the value.
@@ -38,6 +48,7 @@ struct OfficialLite;
 struct Protozero;
 struct Nanopb;
 struct ProtobufC;
+struct Upb;
 struct Floor;
 struct Orv;
 
@@ -46,7 +57,8 @@ struct Orv;
 template <class Peer>
 void addPeer(Catalogue& catalogue);
 
-// Adds every peer that is linked.
-Catalogue allPeers();
+// Adds every peer that is linked and is one of `names`; all where there are none. From then on the official
+// code logs nothing: it would log every ill-formed text that it refuses.
+Catalogue allPeers(const std::vector<std::string_view>& names = {});
 
 }  // namespace bench

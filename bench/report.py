@@ -10,7 +10,7 @@ import subprocess
 import time
 
 import plot
-from figures import BASELINE, EQUAL_WORK, OURS, PEERS, PER_MEMBER, ROWS, Results
+from figures import BASELINE, FIRST, LATER, MORE_ROWS, OPERATIONS, OURS, PER_MEMBER, ROWS, SCALING, Results
 
 ROOT = pathlib.Path(__file__).resolve().parent.parent
 DOCUMENT = ROOT / "docs" / "performance.md"
@@ -19,14 +19,18 @@ BEGIN, END = "<!-- measured: begin -->", "<!-- measured: end -->"
 
 def table(header, rows):
     """A table of Markdown, without the rows that hold nothing."""
-    rows = [row for row in rows if set(row[1:]) != {"–"}]
+    rows = [row for row in rows if not set(row[1:]) <= {"–", "– / –"}]
+    if not rows:
+        return ""
     lines = [header, ["---"] + ["---:"] * (len(header) - 1), *rows]
     return "\n".join("| " + " | ".join(map(str, line)) + " |" for line in lines)
 
 
-def ratio(value):
+def ratio(value, places=2):
     if value is None:
         return "–"
+    if places == 3:
+        return f"{value:.3f}"
     return f"{value:.2f}" if value >= 0.1 else f"{value:.2g}" if value >= 0.0095 else f"{value:.1g}"
 
 
@@ -36,60 +40,71 @@ def nanoseconds(value):
     return f"{value:.1f}" if value < 100 else f"{value:,.0f}"
 
 
-def reached_table(results):
-    """Our ratios to the baseline beside the figures to reach."""
-    runs = len(results.runs)
+def mean_worst_table(results):
+    """Our ratios to the baseline: of each run, and their medians."""
+    runs = results.runs if len(results.runs) > 1 else []
     rows = []
-    for row in ROWS:
-        mean = results.mean(row, OURS)
-        if mean is None:
-            continue
-        worst, workload = max(run.worst(row, OURS) for run in results.runs)
-        cells = [row.title, f"{mean:.3f}", f"{worst:.3f} ({workload})"]
-        if row.mean is None:
-            cells += ["–", "–", "–", "–"]
-        else:
-            good_mean = results.holds(lambda run: run.mean(row, OURS) <= row.mean)
-            good_worst = results.holds(lambda run: run.worst(row, OURS)[0] <= row.worst)
-            ahead = results.holds(lambda run: run.ahead_of_equals(row))
-            cells.append(f"{row.mean} / {row.worst}")
-            cells += [f"{count} of {runs}" for count in (good_mean, good_worst, ahead)]
-        rows.append(cells)
-    return table(["operation", "geometric mean", "worst", "to reach", "mean reached", "worst reached",
-                  "ahead of equal work"], rows)
+    for row in ROWS + MORE_ROWS:
+        cells = []
+        for chosen in (FIRST, LATER):
+            means = [ratio(run.mean(row, OURS, chosen), 3) for run in runs]
+            worst = max(filter(None, (run.worst(row, OURS, chosen) for run in results.runs)), default=None)
+            cells += [ratio(results.mean(row, OURS, chosen), 3) + (f" ({', '.join(means)})" if means else ""),
+                      f"{ratio(worst[0])} ({worst[1][1]})" if worst else "–"]
+        rows.append([row.title] + cells)
+    return table(["operation", "first workloads, mean", "worst", "later workloads, mean", "worst"], rows)
 
 
-def peer_table(results):
-    """The geometric mean of every peer."""
-    rows = [[row.title] + [ratio(results.mean(row, peer)) for peer in PEERS] for row in ROWS]
-    return table(["operation"] + [f"**{peer}**" if peer == OURS else peer for peer in PEERS], rows)
+def peer_table(results, chosen):
+    """The geometric mean of every peer, and its worst workload."""
+    rows = []
+    for row in ROWS + MORE_ROWS:
+        cells = []
+        for peer in results.peers:
+            mean = results.mean(row, peer, chosen)
+            worst = max(filter(None, (run.worst(row, peer, chosen) for run in results.runs)), default=None)
+            cells.append("–" if mean is None else ratio(mean) + (f" ({ratio(worst[0])})" if peer != BASELINE else ""))
+        rows.append([row.title] + cells)
+    return table(["operation"] + [f"**{peer}**" if peer == OURS else peer for peer in results.peers], rows)
 
 
-def workload_table(results):
+def slower_table(results):
+    """Where we are slower than the baseline."""
+    rows = [[operation, workload, with_quartiles(results, operation, workload)]
+            for operation in OPERATIONS for chosen in (FIRST, LATER)
+            for workload in results.workloads(operation, chosen)
+            if (results.ratio(operation, workload, OURS) or 0) > 1]
+    return table(["operation", "workload", "ratio"], rows) or "None."
+
+
+def workload_table(results, chosen):
     """Our ratio for every workload."""
-    names = results.workloads("decode-fresh")
-    rows = []
-    for operation in dict.fromkeys(operation for row in ROWS for operation in row.operations):
-        cells = [ratio(results.ratio(operation, name, OURS)) for name in names]
-        rows.append([operation] + cells)
-    return table(["operation"] + names, rows)
+    operations = [operation for operation in OPERATIONS if results.workloads(operation, chosen)]
+    names = dict.fromkeys(name for operation in operations for name in results.workloads(operation, chosen))
+    rows = [[name] + [with_quartiles(results, operation, name) for operation in operations] for name in names]
+    return table(["workload"] + operations, rows)
 
 
-def time_table(results):
-    """Nanoseconds, ours and the baseline's."""
-    names = results.workloads("decode-fresh")
-    rows = []
-    for operation in ["decode-fresh", "encode-buffer", "copy", "equal", "equal-normal-form", "hash", "text"]:
-        for peer in (OURS, BASELINE):
-            rows.append([f"{operation}, {peer}"] +
-                        [nanoseconds(results.time(operation, name, peer)) for name in names])
-    return table(["operation"] + names, rows)
+def with_quartiles(results, operation, name):
+    value, quartiles = results.ratio(operation, name, OURS), results.quartiles(operation, name, OURS)
+    return ratio(value) + (f" ({ratio(quartiles[0])}–{ratio(quartiles[1])})" if quartiles else "")
+
+
+def time_table(results, chosen):
+    """Nanoseconds, ours and the baseline's; of many messages, for one."""
+    operations = ["decode-fresh", "decode-reused", "encode-buffer", "copy", "equal", "equal-normal-form",
+                  "hash", "text"]
+    operations = [operation for operation in operations if results.workloads(operation, chosen)]
+    names = dict.fromkeys(name for operation in operations for name in results.workloads(operation, chosen))
+    rows = [[name] + [" / ".join(nanoseconds(results.time(operation, name, peer)) for peer in (OURS, BASELINE))
+                      for operation in operations] for name in names]
+    return table(["workload"] + operations, rows)
 
 
 def memory_table(results):
-    peers = [peer for peer in PEERS if results.held("envelope", peer)]
+    peers = [peer for peer in results.peers if results.held("envelope", peer)]
     rows = []
-    for name in results.workloads("decode-fresh"):
+    for name in results.workloads("decode-fresh", FIRST):
         cells = []
         for peer in peers:
             held = results.held(name, peer)
@@ -99,32 +114,33 @@ def memory_table(results):
     return table(["allocations / bytes"] + peers, rows)
 
 
+def members_of(group):
+    return int(group.partition("-")[2])
+
+
 def per_member_table(results):
     """Nanoseconds to decode and bytes to hold, per member."""
     rows = []
-    for name in results.workloads(PER_MEMBER):
-        members = results.held(name, OURS)["members"]
+    for name in results.workloads(PER_MEMBER, SCALING):
+        members = members_of(name)
         cells = []
-        for peer in PEERS:
+        for peer in results.peers:
             spent, held = results.time(PER_MEMBER, name, peer), results.held(name, peer)
             cells.append("–" if spent is None else f"{spent / members:.1f} ns" +
                          (f", {(held['sizeof'] + held['heap']) / members:.0f} B" if held else ""))
         rows.append([f"{members:,}"] + cells)
-    return table(["members"] + PEERS, rows)
+    return table(["members"] + results.peers, rows)
 
 
 def steadiness(results):
     """How far the cost per member moves between the smallest group of 100 and the largest."""
-    times, sizes = [], []
-    for name in results.workloads(PER_MEMBER):
-        held, spent = results.held(name, OURS), results.time(PER_MEMBER, name, OURS)
-        if spent is not None and held["members"] >= 100:
-            times.append(spent / held["members"])
-            sizes.append((held["sizeof"] + held["heap"]) / held["members"])
-    if not times:
-        return ""
-    return (f"From 100 members on, `{OURS}` needs at most {max(times) / min(times) - 1:.0%} more time and "
-            f"{max(sizes) / min(sizes) - 1:.0%} more memory per member than at best.")
+    names = [name for name in results.workloads(PER_MEMBER, SCALING) if members_of(name) >= 100]
+    times = [results.time(PER_MEMBER, name, OURS) / members_of(name) for name in names]
+    sizes = [(held["sizeof"] + held["heap"]) / members_of(name)
+             for name in names if (held := results.held(name, OURS))]
+    parts = [f"at most {max(values) / min(values) - 1:.0%} more {what}"
+             for values, what in ((times, "time"), (sizes, "memory")) if values]
+    return f"From 100 members on, `{OURS}` needs {' and '.join(parts)} per member than at best." if parts else ""
 
 
 def start_up_times(programs, rounds=300):
@@ -138,8 +154,8 @@ def start_up_times(programs, rounds=300):
     return {program: statistics.median(values) for program, values in times.items()}
 
 
-def program_table(build):
-    names = ["empty"] + [peer for peer in PEERS if peer != "floor"]
+def program_table(results, build):
+    names = ["empty"] + [peer for peer in results.peers if peer != "floor"]
     programs = {name: str(build / "bench" / ("bench_minimal_" + name.replace("-", "_"))) for name in names}
     times = start_up_times(list(programs.values()))
     rows = [[name, f"{os.path.getsize(program) / 1024:,.0f} KiB", f"{times[program]:,.0f} µs"]
@@ -153,31 +169,43 @@ def machine(build):
     flags = re.search(r"^CMAKE_CXX_FLAGS_RELEASE:\w+=(.*)$", cache, re.MULTILINE)[1]
     version = subprocess.run([compiler, "--version"], capture_output=True, text=True, check=True).stdout
     model = re.search(r"^model name\s*: (.*)$", pathlib.Path("/proc/cpuinfo").read_text(), re.MULTILINE)
-    linked = "statically" if re.search(r"^ORV_BENCH_STATIC:BOOL=ON$", cache, re.MULTILINE) else "shared"
     return (f"{model[1] if model else 'unknown processor'}, {os.cpu_count()} cores; "
-            f"{version.splitlines()[0]}, `{flags}`, the official runtime linked {linked}.")
+            f"{version.splitlines()[0]}, `{flags}`, the official runtime linked statically.")
 
 
-def report(results, build):
+def report(results, build, all_measured):
     runs = len(results.runs)
     sections = [
         f"Measured on {machine(build)} Ratios to the code that protoc generates, with heap objects "
-        f"(`{BASELINE}`): below 1 is faster. Medians of interleaved repetitions, then of {runs} "
-        f"run{'s' * (runs > 1)}; the worst is the worst of all runs.",
-        "### Against the figures to reach", reached_table(results),
-        f"Equal work means {', '.join(EQUAL_WORK)}: text checked, unknown fields kept, real presence.",
-        "![Ratios of every peer](performance.svg)",
-        "### Geometric mean of every peer", peer_table(results),
-        "### Every workload, ratios", workload_table(results),
-        "### Every workload, nanoseconds", time_table(results),
-        "### Groups of many members, per member", per_member_table(results), steadiness(results),
-        "### Memory of a decoded value",
-        "Allocations, and bytes held: the object itself and the heap's blocks at their usable size.",
-        memory_table(results),
-        "### The smallest program", "Decodes an envelope and encodes it again; `empty` does nothing at all.",
-        program_table(build),
+        f"(`{BASELINE}`): below 1 is faster. Medians of interleaved samples"
+        + (f", then of {runs} runs, whose figures stand in brackets" if runs > 1 else "")
+        + "; the worst is the worst of any run. In brackets after a single ratio stand its quartiles.",
+        "### Geometric mean and worst workload", mean_worst_table(results),
+        "### Slower than the baseline", slower_table(results),
     ]
-    return "\n\n".join(sections)
+    if all_measured:
+        sections += [
+            "![Ratios of every peer](performance.svg)",
+            "### Every peer, first workloads", "Geometric mean and, in brackets, the worst workload.",
+            peer_table(results, FIRST),
+            "### Every peer, later workloads", peer_table(results, LATER),
+        ]
+    sections += [
+        "### Every workload, ratios", workload_table(results, FIRST), workload_table(results, LATER),
+        f"### Every workload, nanoseconds of `{OURS}` and of `{BASELINE}`", time_table(results, FIRST),
+        time_table(results, LATER),
+        "### Groups of many members, per member", per_member_table(results), steadiness(results),
+    ]
+    if all_measured:
+        sections += [
+            "### Memory of a decoded value",
+            "Allocations, and bytes held: the object itself and the heap's blocks at their usable size.",
+            memory_table(results),
+            "### The smallest program",
+            "Decodes an envelope and encodes it again; `empty` does nothing at all. All are linked statically.",
+            program_table(results, build),
+        ]
+    return "\n\n".join(section for section in sections if section)
 
 
 def write(text):
@@ -190,11 +218,11 @@ def write(text):
 
 def main():
     parser = argparse.ArgumentParser(description=__doc__)
-    parser.add_argument("--write", action="store_true", help="also write docs/performance.md and its plot")
+    parser.add_argument("--write", action="store_true", help="all was measured: also write docs/performance.md and its plot")
     parser.add_argument("build", type=pathlib.Path, help="where bench/compare built and put its results")
     options = parser.parse_args()
     results = Results(options.build / "results")
-    text = report(results, options.build)
+    text = report(results, options.build, options.write)
     print(text)
     if options.write:
         write(text)

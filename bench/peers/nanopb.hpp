@@ -29,13 +29,13 @@ class NanopbMessage {
 };
 
 // Less than equal work: unknown fields are dropped, and the packaged library is built without its check of
-// text. It copies no message and holds lists of at most 65,535 elements.
+// text. It copies no message; its lists and contents have at most 65,535 elements and bytes.
 struct Nanopb {
   static constexpr std::string_view name = "nanopb";
   static constexpr bool checksText = false;
   static constexpr bool keepsUnknownFields = false;
   static constexpr bool reusesMemory = false;
-  static constexpr std::size_t mostMembers = 65'535;
+  static constexpr std::size_t largest = 65'535;
 
   template <Kind kind>
   using Value = NanopbMessage<std::tuple_element_t<

@@ -2,11 +2,11 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <limits>
 #include <span>
 #include <string>
 #include <string_view>
 
+#include "bench/peers/equal_work.hpp"
 #include "bench/workloads/workloads.hpp"
 #include "orv_c.pb-c.h"
 
@@ -30,12 +30,10 @@ class ProtobufCMessageOwner {
 };
 
 // Less than equal work: text is not checked. It copies no message and decodes into fresh ones only.
-struct ProtobufC {
+struct ProtobufC : EqualWork {
   static constexpr std::string_view name = "protobuf-c";
   static constexpr bool checksText = false;
-  static constexpr bool keepsUnknownFields = true;
   static constexpr bool reusesMemory = false;
-  static constexpr std::size_t mostMembers = std::numeric_limits<std::size_t>::max();
 
   static constexpr const ProtobufCMessageDescriptor* descriptions[] = {
       &orv_c__session_message__descriptor,
