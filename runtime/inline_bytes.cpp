@@ -1,6 +1,8 @@
 #include <orv/internal/inline_bytes.hpp>
 
 #include <algorithm>
+#include <array>
+#include <cstdint>
 #include <new>
 #include <string>
 
@@ -10,6 +12,32 @@ namespace {
 
 // Unlike memmove and memcpy, these take a null pointer where there is nothing to copy.
 using std::char_traits;
+
+// Copies up to objectSize bytes, which may overlap, without a call: in two pieces of a fixed size, or three.
+void copyShort(char* target, const char* source, std::size_t size) {
+  const auto copyEnds = [&]<class Piece>(Piece) {
+    Piece first, last;
+    std::memcpy(&first, source, sizeof first);
+    std::memcpy(&last, source + size - sizeof last, sizeof last);
+    std::memcpy(target, &first, sizeof first);
+    std::memcpy(target + size - sizeof last, &last, sizeof last);
+  };
+  using Sixteen = std::array<std::uint64_t, 2>;
+  if (size > 32) {
+    Sixteen middle;
+    std::memcpy(&middle, source + sizeof middle, sizeof middle);
+    copyEnds(Sixteen());
+    std::memcpy(target + sizeof middle, &middle, sizeof middle);
+  } else if (size >= 16) {
+    copyEnds(Sixteen());
+  } else if (size >= 8) {
+    copyEnds(std::uint64_t());
+  } else if (size >= 4) {
+    copyEnds(std::uint32_t());
+  } else {
+    char_traits<char>::move(target, source, size);
+  }
+}
 
 char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size)); }
 
@@ -24,7 +52,7 @@ void InlineBytes::assign(std::string_view bytes) {
       return;
     }
   } else if (bytes.size() <= inlineCapacity) {
-    char_traits<char>::move(inlineData(), bytes.data(), bytes.size());
+    copyShort(inlineData(), bytes.data(), bytes.size());
     raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
     return;
   }

@@ -10,9 +10,13 @@
 namespace orv {
 
 Text::Text(std::string_view utf8) {
+  std::size_t wellFormed = utf8::wellFormedPrefix(utf8);
+  if (wellFormed == utf8.size()) [[likely]] {
+    bytes_.assign(utf8);
+    return;
+  }
   constexpr std::string_view replacement = "\xEF\xBF\xBD";
-  while (!utf8.empty()) {
-    const std::size_t wellFormed = utf8::wellFormedPrefix(utf8);
+  for (;; wellFormed = utf8::wellFormedPrefix(utf8)) {
     bytes_.append(utf8.substr(0, wellFormed));
     utf8.remove_prefix(wellFormed);
     if (utf8.empty()) break;

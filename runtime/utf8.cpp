@@ -70,16 +70,13 @@ std::uint32_t fourBytesAt(const char* bytes) {
 }  // namespace
 
 std::size_t wellFormedPrefix(std::string_view text) {
+  if (isAscii(text)) [[likely]]
+    return text.size();
   const char* const bytes = text.data();
   const std::size_t size = text.size();
   std::size_t at = 0;
   while (at < size) {
-    // ASCII is passed up to sixteen bytes at a time.
-    while (size - at >= 16) {
-      const std::uint64_t both = internal::wordAt(bytes + at) | internal::wordAt(bytes + at + 8);
-      if ((both & internal::highBits) != 0) break;
-      at += 16;
-    }
+    // ASCII is passed eight bytes at a time.
     while (size - at >= 8) {
       const std::uint64_t bits = internal::wordAt(bytes + at) & internal::highBits;
       const int ascii =
@@ -87,13 +84,16 @@ std::size_t wellFormedPrefix(std::string_view text) {
       at += static_cast<std::size_t>(ascii) / 8;
       if (bits != 0) break;
     }
-    const std::size_t start = at;
     while (size - at >= 4) {
       const std::size_t length = letterLength(fourBytesAt(bytes + at));
       if (length == 0) break;
       at += length;
     }
-    if (at != start || at == size) continue;
+    if (at == size) break;
+    if (static_cast<unsigned char>(bytes[at]) < 0x80) {
+      ++at;
+      continue;
+    }
     const Step next = step(text.substr(at));
     if (!next.isWellFormed) return at;
     at += next.length;

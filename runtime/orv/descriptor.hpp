@@ -47,6 +47,11 @@ struct MessageDescriptor {
     });
   }
 
+  constexpr bool nestsMessages() const {
+    return std::ranges::any_of(fields,
+                               [](const FieldDescriptor& field) { return field.type == ValueType::message; });
+  }
+
   // None for a number that the message does not define.
   constexpr const FieldDescriptor* field(std::uint32_t number) const {
     const auto found = std::ranges::find(fields, number, &FieldDescriptor::number);

@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <string_view>
 
-#include <orv/internal/words.hpp>
+#include <orv/internal/inline_bytes.hpp>
 
 namespace orv::utf8 {
 

@@ -7,27 +7,24 @@
 #include <utility>
 #include <variant>
 
+#include <orv/empty_message.hpp>
 #include <orv/message.hpp>
 
 namespace orv {
 
 // The host's answer to a ConnectionRequest. It has no fields and gives its parts their names: the answer is a
 // Content, which is encoded as a message of its own.
-class ConnectionResponse final : public Message<ConnectionResponse> {
+class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
  public:
   // The answer itself: whom it is for, and the decision.
   class Content final : public Message<Content> {
    public:
     // The payload of a denial, which has no fields.
-    class DeniedContent final : public Message<DeniedContent> {
+    class DeniedContent final : public EmptyMessage<DeniedContent> {
      public:
       static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content.DeniedContent";
 
       DeniedContent() noexcept {}
-
-     private:
-      friend Message;  // the rules read the table
-      static constexpr std::tuple<> fields{};
     };
 
     // The payload of an approval.
@@ -95,10 +92,6 @@ class ConnectionResponse final : public Message<ConnectionResponse> {
   static constexpr std::string_view protoMessageName = "orv.ConnectionResponse";
 
   ConnectionResponse() noexcept {}
-
- private:
-  friend Message;  // the rules read the table
-  static constexpr std::tuple<> fields{};
 };
 
 }  // namespace orv

@@ -124,9 +124,9 @@ std::expected<void, DecodeError> Message<M>::reparse(std::span<const std::byte> 
 
 template <class M>
 template <class Reader>
-[[gnu::always_inline]] inline internal::Step Message<M>::replaceMessage(Reader& reader) {
-  unknownFields_.clear();
-  return internal::Replacing<Table<M>, M>(self()).read(reader);
+[[gnu::always_inline]] inline internal::Step Message<M>::replaceMessage(M& message, Reader& reader) {
+  message.mutableUnknownFields().clear();
+  return internal::Replacing<Table<M>, M>(message).read(reader);
 }
 
 template <class M>
@@ -136,16 +136,18 @@ std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> by
 
 template <class M>
 std::expected<std::string, EncodeError> Message<M>::serialize() const {
-  // Most messages fit here, and then their string is allocated once, at its final size.
+  // Most messages are written here first, and then their string is allocated once, at its final size. Where
+  // much of a message is long contents, counting it costs less than copying it once more.
   std::array<char, 16 << 10> buffer;
-  if (likelyEncodedSize() < buffer.size()) [[likely]] {
+  constexpr std::size_t most = M::descriptor().nestsMessages() ? std::tuple_size_v<decltype(buffer)> : 192;
+  if (likelyEncodedSize() < most) [[likely]] {
     internal::Target target{.begin = buffer.data()};
     if (const std::size_t size = internal::writeAll(self(), buffer, target); size != internal::doesNotFit)
         [[likely]]
-      return std::string(buffer.data(), size);
+      return std::expected<std::string, EncodeError>(std::in_place, buffer.data(), size);
   }
-  // Larger ones are counted first. Bold guesses need some room beyond the encoding.
-  constexpr std::size_t slack = 128;
+  // Bold guesses need some room beyond the encoding.
+  constexpr std::size_t slack = 8;
   const std::size_t size = encodedSize();
   if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
   std::string bytes;

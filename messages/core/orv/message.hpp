@@ -16,8 +16,8 @@
 #include <orv/encode_error.hpp>
 #include <orv/field.hpp>
 #include <orv/hasher.hpp>
+#include <orv/internal/presence.hpp>
 #include <orv/internal/rules.hpp>
-#include <orv/internal/storage.hpp>
 #include <orv/internal/table.hpp>
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
@@ -139,9 +139,9 @@ class Message {
   }
 
   // As decodeMessage, into a message whose old contents go and whose memory is used again: what reparse does,
-  // for the messages nested in it.
+  // for the messages nested in one.
   template <class Reader>
-  internal::Step replaceMessage(Reader& reader);
+  static internal::Step replaceMessage(M& message, Reader& reader);
 
  protected:
   Message() = default;

@@ -43,58 +43,47 @@ class Group final : public Message<Group> {
     };
   };
 
+  // What the events about one member hold.
+  template <class Event>
+  class MemberEvent : public Message<Event> {
+   public:
+    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
+
+    const Member& member() const { return internal::valueOrDefault(member_); }
+    Member& mutableMember() { return internal::presentValue(member_); }
+    void setMember(Member value) { member_ = std::move(value); }
+    bool hasMember() const { return member_.has_value(); }
+    void clearMember() { member_.reset(); }
+
+   protected:
+    MemberEvent() noexcept {}
+
+   private:
+    friend Message<Event>;  // the rules read the table
+    ByteBuffer groupUuid_;
+    std::optional<Member> member_;
+
+    static constexpr std::tuple fields{
+        field<&MemberEvent::groupUuid_>(1, "groupUUID"),
+        field<&MemberEvent::member_>(2, "member"),
+    };
+  };
+
   // A member was added to the group.
-  class MemberAdded final : public Message<MemberAdded> {
+  class MemberAdded final : public MemberEvent<MemberAdded> {
    public:
     static constexpr std::string_view protoMessageName = "orv.Group.MemberAdded";
 
     MemberAdded() noexcept {}
-
-    const ByteBuffer& groupUuid() const { return groupUuid_; }
-    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
-
-    const Member& member() const { return internal::valueOrDefault(member_); }
-    Member& mutableMember() { return internal::presentValue(member_); }
-    void setMember(Member value) { member_ = std::move(value); }
-    bool hasMember() const { return member_.has_value(); }
-    void clearMember() { member_.reset(); }
-
-   private:
-    friend Message;  // the rules read the table
-    ByteBuffer groupUuid_;
-    std::optional<Member> member_;
-
-    static constexpr std::tuple fields{
-        field<&MemberAdded::groupUuid_>(1, "groupUUID"),
-        field<&MemberAdded::member_>(2, "member"),
-    };
   };
 
   // A member was removed from the group.
-  class MemberRemoved final : public Message<MemberRemoved> {
+  class MemberRemoved final : public MemberEvent<MemberRemoved> {
    public:
     static constexpr std::string_view protoMessageName = "orv.Group.MemberRemoved";
 
     MemberRemoved() noexcept {}
-
-    const ByteBuffer& groupUuid() const { return groupUuid_; }
-    void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
-
-    const Member& member() const { return internal::valueOrDefault(member_); }
-    Member& mutableMember() { return internal::presentValue(member_); }
-    void setMember(Member value) { member_ = std::move(value); }
-    bool hasMember() const { return member_.has_value(); }
-    void clearMember() { member_.reset(); }
-
-   private:
-    friend Message;  // the rules read the table
-    ByteBuffer groupUuid_;
-    std::optional<Member> member_;
-
-    static constexpr std::tuple fields{
-        field<&MemberRemoved::groupUuid_>(1, "groupUUID"),
-        field<&MemberRemoved::member_>(2, "member"),
-    };
   };
 
   // A member left the group of its own accord. The event does not name the member.

@@ -8,6 +8,7 @@
 #include <variant>
 #include <vector>
 
+#include <orv/empty_message.hpp>
 #include <orv/message.hpp>
 
 namespace orv {
@@ -19,15 +20,11 @@ class JoinResponse final : public Message<JoinResponse> {
   class Content final : public Message<Content> {
    public:
     // The payload of a denial, which has no fields.
-    class DeniedContent final : public Message<DeniedContent> {
+    class DeniedContent final : public EmptyMessage<DeniedContent> {
      public:
       static constexpr std::string_view protoMessageName = "orv.JoinResponse.Content.DeniedContent";
 
       DeniedContent() noexcept {}
-
-     private:
-      friend Message;  // the rules read the table
-      static constexpr std::tuple<> fields{};
     };
 
     // The payload of an approval: the session that the device now belongs to.

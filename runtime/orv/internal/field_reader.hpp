@@ -195,13 +195,21 @@ class FieldReader {
   // Whether the field whose number was given last was taken.
   bool hasTakenField() const { return isTaken_; }
 
-  // Reads the field, a message, by `read`, which is given a reader for it.
+  // Reads the field, a message, by `read`, which is given a reader for it: inside the loop of the enclosing
+  // message if it nests none, else by a call.
   template <class M, class Read>
   [[gnu::always_inline]] Step readMessageBy(M& message, Frame::Mode mode, Read read) {
-    if constexpr (nestsNone<M>) {
-      return readInPlace(message, mode, read);
+    const std::span<const std::byte> body = takeBody();
+    if (body.data() == nullptr) [[unlikely]]
+      return std::unexpected(Failed());
+    if (frame_->nesting == maximumNesting) [[unlikely]]
+      return failTooDeep(recordStart_, *frame_, tag_);
+    Frame frame{frame_, tag_.fieldNumber(), static_cast<std::uint8_t>(frame_->nesting + 1), mode};
+    if constexpr (M::descriptor().nestsMessages()) {
+      return readByCall(message, body, readableEnd_, frame, read);
     } else {
-      return continueAt(readByCall(message, parts(), mode, read));
+      FieldReader nested(body, readableEnd_, frame);
+      return read(message, nested);
     }
   }
   Frame::Mode mode() const { return frame_->mode; }
@@ -239,12 +247,6 @@ class FieldReader {
         tag_(parts.tag),
         isTaken_(false) {}
 
-  // Such a message is read inside the loop of the one that holds it; others by a call.
-  template <class M>
-  static constexpr bool nestsNone = std::ranges::none_of(M::descriptor().fields, [](const auto& field) {
-    return field.message != nullptr;
-  });
-
   // A position that stands still means that the field was not taken.
   [[gnu::always_inline]] Step continueAt(const std::byte* after) {
     if (after == nullptr) [[unlikely]]
@@ -255,6 +257,11 @@ class FieldReader {
   }
 
   static bool isShortTag(std::uint32_t first) { return first - 8 < 0x80 - 8; }
+
+  // Whether there are as many bytes of input from here on as fit inside an object.
+  bool isReadableWithin(const std::byte* start) const {
+    return readableEnd_ - start >= static_cast<std::ptrdiff_t>(InlineBytes::objectSize);
+  }
 
   // The bytes behind a length that takes one byte, and all of them there: none otherwise.
   [[gnu::always_inline]] const std::byte* bodyEndIfShort() const {
@@ -287,22 +294,10 @@ class FieldReader {
   }
 
   template <class M, class Read>
-  [[gnu::always_inline]] Step readInPlace(M& message, Frame::Mode mode, Read read) {
-    const std::span<const std::byte> body = takeBody();
-    if (body.data() == nullptr) [[unlikely]]
-      return std::unexpected(Failed());
-    if (frame_->nesting == maximumNesting) [[unlikely]]
-      return failTooDeep(recordStart_, *frame_, tag_);
-    Frame frame{frame_, tag_.fieldNumber(), static_cast<std::uint8_t>(frame_->nesting + 1), mode};
-    FieldReader nested(body, readableEnd_, frame);
-    return read(message, nested);
-  }
-
-  template <class M, class Read>
-  [[gnu::noinline]] static const std::byte* readByCall(M& message, Parts parts, Frame::Mode mode, Read read) {
-    FieldReader reader(parts);
-    if (!reader.readInPlace(message, mode, read)) return nullptr;
-    return reader.at_;
+  [[gnu::noinline]] static Step readByCall(M& message, std::span<const std::byte> body,
+                                           const std::byte* readableEnd, Frame& frame, Read read) {
+    FieldReader reader(body, readableEnd, frame);
+    return read(message, reader);
   }
 
   // Whether a message is checked before it is merged. Inside one that is dropped there is no need, but for a
@@ -354,13 +349,12 @@ class FieldReader {
   template <class Slot>
   [[gnu::always_inline]] Step readText(Slot& slot) {
     if (!isAtLengthDelimited()) return {};
-    const std::byte* const bodyEnd = bodyEndIfShort();
-    // The common case: a short text with more input behind it is checked and copied in fixed-size steps.
-    if (bodyEnd != nullptr && readableEnd_ - at_ > static_cast<std::ptrdiff_t>(InlineBytes::objectSize))
-        [[likely]] {
+    if (const std::byte* const bodyEnd = bodyEndIfShort(); bodyEnd != nullptr) [[likely]] {
       const std::byte* const start = at_ + 1;
       const auto size = static_cast<std::size_t>(bodyEnd - start);
-      if (size <= InlineBytes::inlineCapacity &&
+      // The common case: a short text with more input behind it is checked and copied in steps of a fixed
+      // size.
+      if (size <= InlineBytes::inlineCapacity && isReadableWithin(start) &&
           (InlineBytes::isAsciiWithin(start, size) || isWellFormed(start, size))) [[likely]] {
         presentValue(slot).bytes_.assignWithin(start, size);
         at_ = bodyEnd;
@@ -384,8 +378,7 @@ class FieldReader {
     if (body.data() == nullptr) [[unlikely]]
       return std::unexpected(Failed());
     InlineBytes& bytes = presentValue(slot).bytes_;
-    if (body.size() <= InlineBytes::inlineCapacity &&
-        readableEnd_ - body.data() >= static_cast<std::ptrdiff_t>(InlineBytes::objectSize)) [[likely]] {
+    if (body.size() <= InlineBytes::inlineCapacity && isReadableWithin(body.data())) [[likely]] {
       bytes.assignWithin(body.data(), body.size());
     } else {
       bytes.assign({reinterpret_cast<const char*>(body.data()), body.size()});

@@ -78,7 +78,7 @@ class FieldWriter {
     std::size_t lengthBytes = 1;
     if (likelySize >= shortVarints && target_->guessing == Target::Guesses::bold) [[unlikely]]
       lengthBytes = varintSize(likelySize);
-    if constexpr (nestsNone<M>) {
+    if constexpr (!M::descriptor().nestsMessages()) {
       return writeInPlace(message, number, lengthBytes);
     } else {
       return continueAt(writeByCall(message, number, lengthBytes, at_, limit_, *target_));
@@ -128,11 +128,6 @@ class FieldWriter {
     char* at;
     char* limit;
   };
-
-  template <class M>
-  static constexpr bool nestsNone = std::ranges::none_of(M::descriptor().fields, [](const auto& field) {
-    return field.message != nullptr;
-  });
 
   // Tags of the field numbers 1 to 15 and varints below 128 take one byte, varints below 2^14 two.
   static constexpr std::uint32_t shortNumbers = 16;

@@ -1,16 +1,29 @@
 // The storage that texts and byte buffers share.
 #pragma once
 
+#ifdef __SSE2__
+#include <emmintrin.h>
+#endif
+
 #include <array>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
 #include <string_view>
+#include <type_traits>
 #include <utility>
 
-#include <orv/internal/words.hpp>
-
 namespace orv::internal {
+
+// Eight bytes, which need not be aligned.
+inline std::uint64_t wordAt(const void* bytes) {
+  std::uint64_t word;
+  std::memcpy(&word, bytes, sizeof word);
+  return word;
+}
+
+// Set in each byte of a word that is not ASCII.
+inline constexpr std::uint64_t highBits = 0x8080808080808080;
 
 // Owned bytes. Up to 39 of them live inside the object, which covers a 36-character identifier, a 16-byte
 // UUID and a typical handle without an allocation; longer contents live in one heap block of their own.
@@ -20,8 +33,19 @@ class InlineBytes {
   static constexpr std::size_t inlineCapacity = 39;
   static constexpr std::size_t objectSize = 40;
 
-  // All bytes are set, so that whole words may be read from then on.
-  constexpr InlineBytes() noexcept : raw_{} {}
+  // All bytes are set, so that whole words may be read from then on; at run time word by word, which the
+  // compiler drops where others are written at once (docs/decisions/inline-bytes.md).
+  constexpr InlineBytes() noexcept {
+    if (std::is_constant_evaluated()) {
+      for (unsigned char& byte : raw_) byte = 0;
+    } else {
+      const std::uint64_t zero = 0;
+      [&]<std::size_t... words>(std::index_sequence<words...>) {
+        (std::memcpy(raw_ + words * sizeof zero, &zero, sizeof zero), ...);
+      }
+      (std::make_index_sequence<objectSize / sizeof(std::uint64_t)>());
+    }
+  }
   InlineBytes(const InlineBytes& other) {
     if (other.isOnHeap()) [[unlikely]]
       copyBlock(other.view());
@@ -63,36 +87,23 @@ class InlineBytes {
   }
   std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
 
-  // Compares all words: what is behind the contents is masked away.
+  // Compares all of the objects; what is behind the contents does not count.
   friend bool operator==(const InlineBytes& left, const InlineBytes& right) {
     if (left.isOnHeap() || right.isOnHeap()) [[unlikely]]
       return left.view() == right.view();
     const std::size_t size = left.raw_[tagOffset];
-    if (size != right.raw_[tagOffset]) return false;
-    const char* const mask = contentMask(size);
-    return anyWord([&](std::size_t at) {
-             return (wordAt(left.raw_ + at) ^ wordAt(right.raw_ + at)) & wordAt(mask + at);
-           }) == 0;
+    return size == right.raw_[tagOffset] && areEqualWithin(left.raw_, right.raw_, size);
   }
 
   // Whether the first `size` bytes are ASCII, of objectSize that may be read; `size` is what fits inside.
   static bool isAsciiWithin(const std::byte* bytes, std::size_t size) {
-    const char* const mask = contentMask(size);
-    return (anyWord([&](std::size_t at) { return wordAt(bytes + at) & wordAt(mask + at); }) & highBits) == 0;
+#ifdef __SSE2__
+    return (signs(part<0>(bytes), part<16>(bytes), lastPart(bytes)) & lowBits(size)) == 0;
+#else
+    const auto nonAscii = [&](std::size_t at) { return wordAt(bytes + at) & highBits; };
+    return anyBit(nonAscii, size) == 0;
+#endif
   }
-
-  // All bits of what a function gives for the places of an object's words, without a loop.
-  template <class WordOf>
-  static std::uint64_t anyWord(WordOf wordOf) {
-    return [&]<std::size_t... words>(std::index_sequence<words...>) {
-      return (wordOf(words * sizeof(std::uint64_t)) | ...);
-    }
-    (std::make_index_sequence<objectSize / sizeof(std::uint64_t)>());
-  }
-
-  // objectSize bytes: `size` of them with all bits set, then zeros. With them, short contents are compared
-  // and checked in words without a branch for their length.
-  static const char* contentMask(std::size_t size) { return masks.data() + (objectSize - size); }
 
   // Whether the bytes live outside the object. If not, all objectSize bytes from view().data() on may be
   // read.
@@ -117,11 +128,53 @@ class InlineBytes {
   static constexpr std::size_t tagOffset = objectSize - 1;
   static constexpr unsigned char heapTag = 0xFF;
 
+  static bool areEqualWithin(const unsigned char* left, const unsigned char* right, std::size_t size) {
+#ifdef __SSE2__
+    const std::uint64_t same =
+        signs(_mm_cmpeq_epi8(part<0>(left), part<0>(right)), _mm_cmpeq_epi8(part<16>(left), part<16>(right)),
+              _mm_cmpeq_epi8(lastPart(left), lastPart(right)));
+    return (~same & lowBits(size)) == 0;
+#else
+    const auto difference = [&](std::size_t at) { return wordAt(left + at) ^ wordAt(right + at); };
+    return anyBit(difference, size) == 0;
+#endif
+  }
+
+#ifdef __SSE2__
+  template <std::size_t at>
+  static __m128i part(const void* bytes) {
+    return _mm_loadu_si128(reinterpret_cast<const __m128i*>(static_cast<const char*>(bytes) + at));
+  }
+  // The last eight bytes.
+  static __m128i lastPart(const void* bytes) {
+    return _mm_loadl_epi64(reinterpret_cast<const __m128i*>(static_cast<const char*>(bytes) + 32));
+  }
+  // The highest bit of each byte of an object, that of the first byte lowest.
+  static std::uint64_t signs(__m128i first, __m128i second, __m128i last) {
+    const auto gather = [](__m128i bytes) {
+      return static_cast<std::uint64_t>(static_cast<std::uint32_t>(_mm_movemask_epi8(bytes)));
+    };
+    return gather(first) | gather(second) << 16 | gather(last) << 32;
+  }
+  static std::uint64_t lowBits(std::size_t count) { return (std::uint64_t{1} << count) - 1; }
+#else
+  // All bits of what a function gives for the words of an object, of its first `size` bytes, without a branch
+  // for the size.
+  template <class WordOf>
+  static std::uint64_t anyBit(WordOf wordOf, std::size_t size) {
+    const char* const mask = masks.data() + (objectSize - size);
+    std::uint64_t bits = 0;
+    for (std::size_t at = 0; at < objectSize; at += sizeof bits) bits |= wordOf(at) & wordAt(mask + at);
+    return bits;
+  }
+
+  // From objectSize minus a size on: as many bytes with all bits set, then zeros.
   static constexpr auto masks = [] {
     std::array<char, 2 * objectSize> bytes{};
     for (std::size_t at = 0; at < objectSize; ++at) bytes[at] = static_cast<char>(0xFF);
     return bytes;
   }();
+#endif
 
   struct Block {
     char* data;

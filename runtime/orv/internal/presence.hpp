@@ -1,7 +1,10 @@
-// Values that may be absent.
+// How fields that may be absent are read and changed.
 #pragma once
 
+#include <cstddef>
+#include <new>
 #include <optional>
+#include <variant>
 
 namespace orv::internal {
 
@@ -13,6 +16,38 @@ T& presentValue(T& value) {
 template <class T>
 T& presentValue(std::optional<T>& value) {
   return value.has_value() ? *value : value.emplace();
+}
+
+// What a getter gives for an absent field: one default value per type, made on first use, which allocates
+// nothing, and never destroyed.
+template <class T>
+const T& defaultInstance() {
+  alignas(T) static std::byte storage[sizeof(T)];
+  static const T& instance = *::new (static_cast<void*>(storage)) T();
+  return instance;
+}
+
+// Lives as long as the field is unchanged, or forever.
+template <class T>
+const T& valueOrDefault(const std::optional<T>& field) {
+  return field.has_value() ? *field : defaultInstance<T>();
+}
+
+// The payload if the oneof group holds this case, else the default.
+template <class Case, class... Cases>
+const Case& caseOrDefault(const std::optional<std::variant<Cases...>>& group) {
+  const Case* const held = group.has_value() ? std::get_if<Case>(&*group) : nullptr;
+  return held != nullptr ? *held : defaultInstance<Case>();
+}
+
+// The payload for change in place; a group that holds another case, or none, is switched to a default payload
+// of this.
+template <class Case, class... Cases>
+Case& presentCase(std::optional<std::variant<Cases...>>& group) {
+  if (group.has_value()) {
+    if (Case* const held = std::get_if<Case>(&*group)) return *held;
+  }
+  return std::get<Case>(group.emplace(std::in_place_type<Case>));
 }
 
 }  // namespace orv::internal

@@ -16,7 +16,7 @@ namespace orv::internal {
 struct Replace {
   template <class M>
   [[gnu::always_inline]] Step operator()(M& message, FieldReader& reader) const {
-    return message.replaceMessage(reader);
+    return M::replaceMessage(message, reader);
   }
 };
 
@@ -41,21 +41,18 @@ class Replacing {
   template <std::size_t index>
   [[gnu::always_inline]] Step readRow(FieldReader& reader) {
     auto& storage = Table::template storage<index>(message_);
-    using Storage = typename Table::template Storage<index>;
+    constexpr FieldKind kind = StorageTraits<typename Table::template Storage<index>>::kind;
     std::size_t& countRead = countsRead_[Table::template firstRow<index>];
     Step result;
-    if constexpr (StorageTraits<Storage>::kind == FieldKind::repeated) {
+    if constexpr (kind == FieldKind::repeated) {
       result = readElement(reader, storage, countRead);
-    } else if (countRead != 0) {
-      result = decodeRow<Table, index>(message_, reader);
-    } else if constexpr (Table::template isCase<index>) {
-      result = replaceCase<index>(reader, storage);
-    } else if constexpr (StorageTraits<Storage>::kind == FieldKind::singularMessage) {
-      if (storage.has_value() && reader.isAtLengthDelimited()) {
-        result = reader.readMessageBy(*storage, reader.mode(), Replace());
-      } else {
-        result = decodeRow<Table, index>(message_, reader);
-      }
+    } else if constexpr (kind == FieldKind::oneofMember) {
+      result =
+          countRead == 0 ? replaceCase<index>(reader, storage) : decodeRow<Table, index>(message_, reader);
+    } else if constexpr (kind == FieldKind::singularMessage) {
+      const bool isReplacing = countRead == 0 && storage.has_value() && reader.isAtLengthDelimited();
+      result = isReplacing ? reader.readMessageBy(*storage, reader.mode(), Replace())
+                           : decodeRow<Table, index>(message_, reader);
     } else {
       result = decodeRow<Table, index>(message_, reader);
     }
@@ -84,7 +81,7 @@ class Replacing {
         return reader.readMessageBy(*held, reader.mode(), Replace());
       group.reset();
     }
-    return decodeRow<Table, index>(message_, reader);
+    return reader.template decodeCase<Case>(group);
   }
 
   template <std::size_t index>
