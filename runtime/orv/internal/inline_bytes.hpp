@@ -53,7 +53,7 @@ class InlineBytes {
       freeBlock();
   }
 
-  // Valid until the object changes or goes.
+  // Valid until the object is changed or destroyed.
   std::string_view view() const {
     if (isOnHeap()) [[unlikely]] {
       const Block block = heapBlock();
