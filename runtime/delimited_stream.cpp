@@ -79,14 +79,14 @@ class DelimitedReader::Source {
   std::uint64_t messageOffset_ = 0;
   std::uint64_t nextOffset_ = 0;
   std::vector<std::byte> message_;
-  std::optional<StreamError> error_;  // the first, which is the last
+  std::optional<StreamError> error_;  // after it no more is read
 };
 
 std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::Source::next() {
   if (error_.has_value()) return std::unexpected(*error_);
   messageOffset_ = nextOffset_;
 
-  // One for the length and one for the message: it counts what it reads in an int.
+  // One stream for the length and one for the message: each counts what it reads in an int.
   std::optional<io::CodedInputStream> input(std::in_place, &buffered_);
   constexpr int longestLength = 5;
   std::uint64_t length = 0;
@@ -103,9 +103,9 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   if (length > maximumSize_) return fail(StreamError::Cause::tooLarge, length);
 
   message_.clear();
-  // It reads ahead as soon as it is made, and nothing need follow an empty message.
+  // The constructor reads ahead, which would wait for ever where nothing follows an empty message.
   if (length != 0) input.emplace(&buffered_);
-  // What is announced is made room for as it arrives.
+  // Room is made for what arrives, piece by piece, not for all that is announced.
   while (message_.size() < length) {
     constexpr std::size_t firstPiece = std::size_t{64} << 10;
     const std::size_t had = message_.size();

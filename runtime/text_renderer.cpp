@@ -62,9 +62,9 @@ std::string hexadecimal(Number value) {
 
 }  // namespace
 
-// Unknown fields, read as the official printer reads them. What is kept is well-formed; bytes that only may
-// be a message are one in the library's own opinion, which is laxer than this one's: it is what makes the
-// text the same.
+// Unknown fields, read as the official printer reads them. Whether the bytes of a length-delimited one are
+// shown as a message is decided by libprotobuf's reader, which takes more than ours: only so is the text the
+// same.
 class TextRenderer::UnknownFieldsRenderer {
  public:
   explicit UnknownFieldsRenderer(TextRenderer& renderer) : renderer_(renderer) {}

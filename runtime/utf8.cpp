@@ -43,8 +43,8 @@ Step step(std::string_view text) {
 
 namespace {
 
-// The length of the letter at the start of these four bytes, the first in the lowest place: 2 to 4, or 0 if it
-// is ASCII or ill-formed. Each length is a pattern of its lead and continuation bytes (table 3-6), and a few
+// The length of the code point at the start of these four bytes, the first in the lowest place: 2 to 4, or 0 if
+// it is ASCII or ill-formed. Each length is a pattern of its lead and continuation bytes (table 3-6), and a few
 // bits of lead and second byte that tell overlong forms, surrogates and what is above U+10FFFF (table 3-7).
 std::size_t letterLength(std::uint32_t bytes) {
   if ((bytes & 0xC0F0) == 0x80E0 && (bytes & 0xC00000) == 0x800000) {

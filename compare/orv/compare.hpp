@@ -10,18 +10,19 @@
 
 namespace orv::compare {
 
+// One value that is not the same in both messages.
 struct Difference {
   enum class Kind : std::uint8_t { changed, removed, added };
 
   Kind kind;
   std::string path;  // "initialize.members[1].handle"
-  // As people read it; empty on the side that has nothing there. Long values are shown from where they
-  // differ.
+  // The values as text for people; empty on the side that has none. Long values are shown from a little
+  // before where they differ.
   std::string before;
   std::string after;
 };
 
-// Between two messages that were taken apart. In the order of the fields.
+// Between two messages that were taken apart, in the order of the fields.
 std::vector<Difference> differencesOfLeaves(std::span<const Leaf> before, std::span<const Leaf> after);
 
 // By the messages' own equality: no differences when the messages are equal, and at least one when they are

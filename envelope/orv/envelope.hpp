@@ -28,7 +28,7 @@ struct Pairing {
   VessaSessionMessageType type;
 };
 
-// The protocol leaves it to the peers what an envelope carries. This pairing goes by the names; that a
+// The protocol leaves it to the peers what an envelope carries. This pairing follows the names; that a
 // connectionResponse carries a ConnectionResponse.Content, which holds the answer, is this component's reading.
 inline constexpr std::tuple pairings{
     Pairing<JoinRequest>{VessaSessionMessageType::joinRequest},

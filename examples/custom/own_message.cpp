@@ -32,8 +32,8 @@ class Talk final : public orv::Message<Talk> {
   };
 };
 
-// What a room is booked for. The storage says how a field is kept: always, perhaps, many times, or as one case
-// of a oneof. The rows give the numbers and the names.
+// What a room is booked for. The type of the storage says how a field is kept: with implicit or explicit
+// presence, as a list, or as one case of a oneof. The rows give the numbers and the names.
 class Booking final : public orv::Message<Booking> {
  public:
   static constexpr std::string_view protoMessageName = "example.Booking";

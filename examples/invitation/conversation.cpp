@@ -7,7 +7,7 @@ namespace invitation {
 
 namespace {
 
-// No message of an invitation comes near it. What announces more is refused before it arrives.
+// Far above every message of an invitation. A message that announces more is refused before it arrives.
 constexpr std::size_t maximumMessageSize = std::size_t{64} << 10;
 
 }  // namespace

@@ -17,7 +17,7 @@
 
 namespace invitation {
 
-// What the envelopes say, and must say.
+// The version in every envelope that is sent, and the only one that is accepted.
 inline constexpr std::uint32_t protocolVersion = 1;
 
 // Session messages over a socket, each behind its length. A message must arrive whole, or be taken by the

@@ -37,7 +37,7 @@ Outcome<> join(const story::Person& guest, const orv::ByteBuffer& hostKey, const
   return conversation.expectEqual(*answer, story::joinApproval(guest));
 }
 
-// Does its worst and waits for the host to hang up.
+// Misbehaves as asked and waits for the host to close the connection.
 Outcome<> misbehave(Misbehaviour misbehaviour, Conversation& conversation) {
   // A message of seven bytes whose field 3 announces five bytes, where one is left.
   constexpr auto malformedMessage = "\x07\x08\x01\x10\x01\x1A\x05\x41"sv;

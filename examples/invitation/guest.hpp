@@ -10,7 +10,7 @@
 
 namespace invitation {
 
-// What a guest does instead of asking to join, to show that the host does not mind.
+// What a guest does instead of asking to join, to show that the host copes with it.
 enum class Misbehaviour : std::uint8_t {
   none,
   garbage,  // sends bytes that are no message

@@ -11,7 +11,7 @@ namespace invitation {
 
 namespace {
 
-// The events of a group come one by one, as in life, so that a reader can follow.
+// The events of a group are sent with a pause between them, so that the narration can be followed.
 constexpr std::chrono::milliseconds betweenEvents{30};
 
 class Host {

@@ -20,9 +20,9 @@ from framing import delimited, read_delimited
 
 INVITATION, PROTOC, SCHEMA = sys.argv[1:4]
 
-# Long enough for a healthy step on a busy machine, short enough to wait for.
+# Seconds for one step: enough on a busy machine, and short enough for a test to wait.
 TIME_LIMIT = 1.5
-# By then a process that hangs has been found out.
+# Seconds after which a process is taken to hang.
 PATIENCE = 60
 
 ANNAS_REQUEST = 'identifier: "2C8E91B7" handle: "anna@tablet" displayName: "Anna\'s tablet"'

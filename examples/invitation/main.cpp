@@ -13,7 +13,8 @@
 
 namespace {
 
-// A signal ends whatever wait it meets with a failure, so that whoever is interrupted leaves nothing behind.
+// A signal makes the wait under way fail, so that an interrupted program removes its files like any other
+// that fails.
 void failOnSignals() {
   struct sigaction action {};
   action.sa_handler = [](int) {};

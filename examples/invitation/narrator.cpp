@@ -28,7 +28,7 @@ std::string padded(std::string_view text, std::size_t width) {
 void writeAll(int descriptor, std::string_view text) {
   while (!text.empty()) {
     const ssize_t count = ::write(descriptor, text.data(), text.size());
-    // A narration that nobody reads is no reason to break off the invitation.
+    // Where nobody reads the narration, the invitation goes on.
     if (count <= 0) return;
     text.remove_prefix(static_cast<std::size_t>(count));
   }

@@ -1,4 +1,4 @@
-// What a side tells of its work.
+// The lines that a side prints of its work.
 #pragma once
 
 #include <string>
@@ -22,7 +22,7 @@ class Narrator {
 
   const std::string& who() const { return who_; }
   void tell(std::string_view action, std::string_view subject, std::string_view details) const;
-  // A complaint, on standard error.
+  // What went wrong, on standard error.
   void complain(std::string_view what) const;
 
  private:

@@ -39,7 +39,7 @@ Outcome<> playHostAlone(const Options& options) {
   return playHost(std::move(*listener), *capture, options.timeLimit);
 }
 
-// The host and the guests in processes of their own; the second guest comes when the first has gone.
+// The host and the guests in processes of their own; the second guest comes when the first has ended.
 Outcome<> playAll(const Options& options) {
   auto capture = Capture::create(options.capturePath);
   if (!capture) return std::unexpected(capture.error());
@@ -50,7 +50,7 @@ Outcome<> playAll(const Options& options) {
   if (!listener) return std::unexpected(listener.error());
   const SocketFileRemover remover(socketPath);
 
-  // No side waits more often than this, nor longer than the time limit.
+  // More waits than any side has; each ends within the time limit.
   constexpr int waits = 40;
   const Deadline deadline = std::chrono::steady_clock::now() + waits * options.timeLimit;
   Processes processes(3 * options.timeLimit);
@@ -58,7 +58,7 @@ Outcome<> playAll(const Options& options) {
     return conclude(story::host.name, playHost(std::move(*listener), *capture, options.timeLimit));
   });
   if (!host) return std::unexpected(host.error());
-  // Only the host's process listens now: where it ends early, guests find nobody.
+  // Only the host's process listens now: if it ends early, guests are refused instead of left waiting.
   *listener = Listener();
   for (const story::Person& guest : {story::anna, story::ben}) {
     const auto process = processes.start([&] { return playGuestToTheEnd(socketPath, guest, options); });

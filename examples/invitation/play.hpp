@@ -1,4 +1,4 @@
-// Who plays which part, in which process.
+// The invitation's parts, each in its process.
 #pragma once
 
 #include "examples/invitation/options.hpp"
@@ -6,7 +6,7 @@
 
 namespace invitation {
 
-// Does what the options ask for. Whoever fails says so on standard error; the answer is the exit status.
+// Does what the options ask for. A failure is reported on standard error; the answer is the exit status.
 int play(const Options& options);
 
 }  // namespace invitation

@@ -1,4 +1,4 @@
-// Where the socket file lies, and how it goes away again.
+// A directory for the socket file, and the removal of both.
 #pragma once
 
 #include <string>

@@ -1,4 +1,4 @@
-// Child processes that never outlive their parent's interest.
+// Child processes that end with the object that holds them.
 #pragma once
 
 #include <sys/types.h>
@@ -26,7 +26,8 @@ class Processes {
   // Runs `work` in a new process, which ends with the status that it returns. Answers the process's index.
   Outcome<std::size_t> start(const std::function<int()>& work);
 
-  // Waits until this process has ended; at most until the deadline, or until a failed one's grace is over.
+  // Waits until this process has ended; at most until the deadline, or until the grace period
+  // after a failure is over.
   Outcome<> awaitEnd(std::size_t index, Deadline deadline);
 
   // Whether every process that has ended did so with status 0.

@@ -13,7 +13,7 @@
 
 namespace invitation {
 
-// A key pair for one invitation. The secret half is wiped when the pair goes.
+// A key pair for one invitation. The secret half is wiped when the pair is destroyed.
 class KeyPair {
  public:
   KeyPair() { crypto_kx_keypair(publicKey_.data(), secretKey_.data()); }

@@ -1,4 +1,4 @@
-// Stream sockets in the Unix domain, whose every wait has an end.
+// Stream sockets in the Unix domain. Every wait has a deadline.
 #pragma once
 
 #include <chrono>
@@ -58,7 +58,7 @@ class Socket {
   Descriptor descriptor_;
 };
 
-// Where connections arrive.
+// A socket that accepts connections.
 class Listener {
  public:
   Listener() = default;

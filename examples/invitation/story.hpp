@@ -34,7 +34,7 @@ orv::JoinResponse::Content joinApproval(const Person& guest);
 
 // What the host tells a guest that has joined.
 std::vector<orv::Group> membershipEvents(const Person& guest);
-// With what the guest takes its leave.
+// The event by which the guest leaves.
 orv::Group farewell();
 
 }  // namespace invitation::story

@@ -25,14 +25,15 @@ class ByteBuffer {
   ByteBuffer(std::span<const std::byte> bytes) {
     bytes_.assign({reinterpret_cast<const char*>(bytes.data()), bytes.size()});
   }
-  // The characters' bytes as they stand.
+  // Takes the characters as bytes, whatever they spell.
   explicit ByteBuffer(std::string_view characters) { bytes_.assign(characters); }
 
   std::size_t size() const { return bytes_.size(); }
   bool isEmpty() const { return size() == 0; }
-  // Valid until the buffer is assigned to or goes, as are the characters.
+  // Both views are valid until the buffer is assigned to or destroyed.
   std::span<const std::byte> bytes() const { return std::as_bytes(std::span(characters())); }
   std::string_view characters() const { return bytes_.view(); }
+  // `index` is less than size().
   std::byte operator[](std::size_t index) const { return static_cast<std::byte>(characters()[index]); }
 
   friend ByteBuffer operator+(const ByteBuffer& left, const ByteBuffer& right) {

@@ -7,7 +7,7 @@
 
 namespace orv {
 
-// Both are valid as long as what they are given.
+// Both views are valid as long as the one they are made of.
 inline std::span<const std::byte> bytesOf(std::string_view characters) {
   return std::as_bytes(std::span(characters));
 }

@@ -1,4 +1,4 @@
-// Who decides when a second member of a oneof arrives.
+// The decision on a second member of a oneof.
 #pragma once
 
 #include <concepts>
@@ -23,13 +23,13 @@ class ConflictHook {
   requires(std::is_object_v<Callable> && !std::same_as<std::remove_const_t<Callable>, ConflictHook> &&
            std::is_invocable_r_v<std::expected<void, DecodeError>, Callable&>)
       ConflictHook(Callable& callable)  // NOLINT(google-explicit-constructor): a callable is a hook
-      // NOLINTNEXTLINE(cppcoreguidelines-pro-type-const-cast): it is given back its type
+      // NOLINTNEXTLINE(cppcoreguidelines-pro-type-const-cast): the call gives it back its type
       : callable_(const_cast<std::remove_const_t<Callable>*>(std::addressof(callable))),
         call_([](void* target) -> std::expected<void, DecodeError> {
           return (*static_cast<Callable*>(target))();
         }) {}
 
-  // Whether there is anybody to ask.
+  // Whether there is a callable to ask; without one every member is accepted.
   bool isSet() const { return call_ != nullptr; }
 
   std::expected<void, DecodeError> operator()() const {

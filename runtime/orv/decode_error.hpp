@@ -12,6 +12,7 @@
 
 namespace orv {
 
+// What can be wrong with bytes.
 enum class DecodeCause : std::uint8_t {
   truncated,           // the input, or the enclosing message, ends inside a record
   lengthOverrun,       // a length runs past the end of the input or of the enclosing message

@@ -25,7 +25,7 @@ using ReadFunction = std::move_only_function<std::ptrdiff_t(std::span<std::byte>
 // Why no message could be read from a stream.
 struct StreamError {
   enum class Cause : std::uint8_t {
-    readFailed,        // the read function said so
+    readFailed,        // the read function answered a negative number
     truncated,         // the stream ends inside a length or a message
     malformedLength,   // a length of 2^31 or more, or spelled in more than five bytes
     tooLarge,          // a length above the reader's limit
@@ -49,12 +49,13 @@ struct StreamError {
 };
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
-// are announced. A malformed message is passed over; after any other error the stream ends with that error,
-// again and again.
+// are announced. After a malformed message the next one can be read; after any other error every further call
+// answers that error. A reader that was moved from may only be assigned to or destroyed.
 class DelimitedReader {
  public:
   static constexpr std::size_t defaultMaximumSize = std::size_t{64} << 20;
 
+  // A message that is announced with more bytes than `maximumSizeInBytes` is an error, tooLarge.
   explicit DelimitedReader(ReadFunction read, std::size_t maximumSizeInBytes = defaultMaximumSize);
   DelimitedReader(DelimitedReader&&) noexcept;
   DelimitedReader& operator=(DelimitedReader&&) noexcept;
@@ -64,7 +65,7 @@ class DelimitedReader {
   // messages.
   [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
 
-  // As next, decoded.
+  // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>
   [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
     const auto bytes = next();
@@ -86,10 +87,10 @@ class DelimitedReader {
   std::unique_ptr<Source> source_;
 };
 
-// Appends a length and as many bytes.
+// Appends the number of bytes as a varint, and the bytes.
 void appendDelimited(std::string_view bytes, std::string& output);
 
-// Appends a message behind its length.
+// Appends a message behind its length. After an error nothing is appended.
 template <class M>
 requires requires(const M& message) { message.serialize(); }
 [[nodiscard]] std::expected<void, EncodeError> appendDelimited(const M& message, std::string& output) {

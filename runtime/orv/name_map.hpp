@@ -23,6 +23,7 @@ class NameMap {
 
   constexpr std::span<const Entry> entries() const { return entries_; }
 
+  // Both answer none for what the map does not hold, in time linear in its size.
   constexpr std::optional<std::string_view> name(std::int64_t number) const {
     for (const Entry& entry : entries_) {
       if (entry.number == number) return entry.name;

@@ -36,10 +36,11 @@ class Text {
   Text(const char* utf8) : Text(std::string_view(utf8)) {}         // NOLINT(google-explicit-constructor)
   Text(const std::string& utf8) : Text(std::string_view(utf8)) {}  // NOLINT(google-explicit-constructor)
 
-  // Takes well-formed bytes only.
+  // Takes well-formed bytes only; the error says where the first ill-formed part begins.
   [[nodiscard]] static std::expected<Text, IllFormedText> checked(std::string_view utf8);
 
-  // The UTF-8 bytes as they were given. The view is valid until the text changes or goes.
+  // The UTF-8 bytes as they were given. The view is valid until the text is changed or
+  // destroyed.
   std::string_view utf8() const { return bytes_.view(); }
   std::size_t sizeInBytes() const { return bytes_.size(); }
   bool isEmpty() const { return sizeInBytes() == 0; }

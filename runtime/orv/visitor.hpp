@@ -17,7 +17,7 @@ namespace orv {
 template <class V>
 using VisitResult = internal::ResultOf<V>;
 
-// The error of visitors that cannot fail: nobody makes one.
+// The error of visitors that cannot fail: no value of it is ever made.
 enum class NeverFails : std::uint8_t {};
 
 // Takes the fields of a message from its traverse, in ascending order of their numbers, the unknown fields

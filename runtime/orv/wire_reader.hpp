@@ -12,7 +12,7 @@ namespace orv {
 
 namespace internal {
 
-// Nesting of messages and groups that is still read.
+// How deep messages and groups may be nested.
 inline constexpr int maximumNesting = 100;
 
 }  // namespace internal
@@ -34,7 +34,7 @@ struct Tag {
   constexpr WireType wireType() const { return static_cast<WireType>(value & 7); }
 };
 
-// What a reader stumbled over. The pointer is into its input.
+// What was wrong, and where: the pointer is into the reader's input.
 struct WireFault {
   DecodeCause cause;
   const std::byte* at;
@@ -87,8 +87,8 @@ class WireReader {
   // included. `nesting` is how many messages and groups the value is already in.
   [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
 
-  // How many whole length-delimited records with this tag, of one byte, follow, one behind the other, the
-  // length-delimited value that is next; at most `most`. Consumes nothing.
+  // What is next is a length-delimited value: counts the whole length-delimited records with this tag that
+  // follow it without a gap, up to `most`. Consumes nothing.
   std::size_t countFollowing(Tag tag, std::size_t most) const;
 
  private:

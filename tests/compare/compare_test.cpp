@@ -43,7 +43,7 @@ TEST(Difference, IsFoundWhereMessagesAreUnequal) {
       const M right = M::parse(after).value();
       EXPECT_EQ(compare::differences(left, right).empty(), left == right) << toHex(before) << '\n'
                                                                           << toHex(after);
-      // Also when nobody asked whether they are equal.
+      // Also without the messages' own equality before.
       EXPECT_EQ(compare::differencesOfLeaves(compare::LeafCollector::collect(right),
                                              compare::LeafCollector::collect(left))
                     .empty(),

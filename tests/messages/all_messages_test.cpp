@@ -92,7 +92,7 @@ TEST(AllMessages, AreReplacedWhenTheirMemoryIsUsedAgain) {
     const MessagePointer reused = type.parse(left).value();
     ASSERT_TRUE(reused->reparse(right));
     EXPECT_EQ(encoded(*reused), encoded(*type.parse(right).value()));
-    // Cut anywhere, and so refused as a rule, it leaves what it leaves in a new message.
+    // Cut somewhere, and then mostly refused, an encoding leaves the same as in a new message.
     for (std::size_t cut = left.size(); cut > 0; cut -= (cut + 2) / 3) {
       const MessagePointer fresh = type.copied();
       const auto result = fresh->merge(left.substr(0, cut) + hex("78"));
@@ -104,7 +104,7 @@ TEST(AllMessages, AreReplacedWhenTheirMemoryIsUsedAgain) {
 }
 
 TEST(AllMessages, AreReadByManyThreadsAtOnce) {
-  // Only a build that watches threads can fail here.
+  // Only a build with the thread sanitizer can fail here.
   Random random;
   for (const MessagePointer& type : allMessages()) {
     const std::string bytes = randomEncoding(type->fullName(), random);
@@ -163,7 +163,7 @@ TEST(AllMessages, AreValuesThatShareNothing) {
     EXPECT_EQ(encoded(*moved), kept);
     copy->assignMoved(*moved);
     EXPECT_EQ(encoded(*copy), kept);
-    moved->assign(*original);  // what was moved from can be assigned to
+    moved->assign(*original);  // a moved-from message can be assigned to
     EXPECT_EQ(encoded(*moved), changed);
   });
 }

@@ -153,7 +153,7 @@ TEST(Encodings, FillExactlyTheBufferTheyNeed) {
   for (const std::string& input : inputs) {
     const Group group = Group::parse(input).value();
     for (std::size_t size = 0; size <= input.size() + 50; ++size) {
-      // Its end is watched in sanitized builds.
+      // Sanitizers see writes behind its end.
       std::vector<std::byte> buffer(size, std::byte{0xEE});
       const auto written = group.serializeInto(buffer);
       if (size < input.size()) {

@@ -45,7 +45,7 @@ TEST(InlineBytes, AreCopiedMovedAndAssignedWhateverBothHeldBefore) {
 
       internal::InlineBytes moved = std::move(target);
       EXPECT_EQ(moved.view(), contents(from));
-      target.assign(contents(to));  // what was moved from can be assigned to
+      target.assign(contents(to));  // a moved-from object can be assigned to
       target = std::move(moved);
       EXPECT_EQ(target.view(), contents(from));
       moved = make(to);
@@ -81,7 +81,7 @@ TEST(InlineBytes, TakeWhatFitsInsideFromReadableBytes) {
   for (std::size_t size = 0; size <= internal::InlineBytes::inlineCapacity; ++size) {
     std::string input(size, 'a');
     input.resize(internal::InlineBytes::objectSize, '\xFF');
-    const std::vector<char> exact(input.begin(), input.end());  // its end is watched in sanitized builds
+    const std::vector<char> exact(input.begin(), input.end());  // sanitizers see reads behind its end
     const auto* const start = reinterpret_cast<const std::byte*>(exact.data());
     EXPECT_TRUE(internal::InlineBytes::isAsciiWithin(start, size));
     EXPECT_FALSE(internal::InlineBytes::isAsciiWithin(start, size + 1));

@@ -86,7 +86,7 @@ TEST(DelimitedStream, SaysWhatIsWrongAndWhere) {
       EXPECT_EQ(message.error().cause, row.cause);
       EXPECT_EQ(message.error().offset, row.offset);
       EXPECT_EQ(message.error().message(), row.message);
-      if (row.cause == Cause::malformedMessage) continue;  // its end is known
+      if (row.cause == Cause::malformedMessage) continue;  // the next message can be read
       const auto again = reader.next();
       ASSERT_FALSE(again);
       EXPECT_EQ(again.error().message(), row.message);

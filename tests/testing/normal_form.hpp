@@ -1,4 +1,4 @@
-// Canonical equivalence by another road: a library's own normalisation, whose time is quadratic.
+// Canonical equivalence by another library's normalisation, whose time is quadratic.
 #pragma once
 
 #include <utf8proc.h>

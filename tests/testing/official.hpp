@@ -15,7 +15,7 @@ namespace orv::test {
 // An empty message of the type that has this full name in the schema.
 std::unique_ptr<google::protobuf::Message> newOfficial(std::string_view fullName);
 
-// Sets fields as chance has it, edges and unknown fields included.
+// Sets random fields to random values, edge values and unknown fields among them.
 void fillRandomly(google::protobuf::Message& message, Random& random);
 
 // The encoding of a random message. No two texts in it are canonically equivalent unless they are the same.

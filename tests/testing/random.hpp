@@ -1,4 +1,4 @@
-// Random choices that can be had again.
+// Random choices that can be repeated.
 #pragma once
 
 #include <cstddef>
@@ -10,7 +10,7 @@
 
 namespace orv::test {
 
-// Starts from the environment's ORV_TEST_SEED, or else from a seed of its own, and says which.
+// Starts from the environment's ORV_TEST_SEED, or else from a new seed, and prints which.
 class Random {
  public:
   Random() : Random(fromEnvironment("ORV_TEST_SEED", std::random_device()())) {}
@@ -18,7 +18,7 @@ class Random {
     std::cout << "random choices of ORV_TEST_SEED=" << seed << '\n';
   }
 
-  // How often a random test tries what it tries: ORV_TEST_ROUNDS, or what the test thinks enough.
+  // How many rounds a random test runs: ORV_TEST_ROUNDS, or what the test gives.
   static std::size_t rounds(std::size_t enough) { return fromEnvironment("ORV_TEST_ROUNDS", enough); }
 
   std::uint64_t number() { return engine_(); }

@@ -24,7 +24,7 @@ struct ScriptedField {
   std::variant<std::monostate, std::string, std::int64_t, std::vector<ScriptedField>> value{};
 };
 
-// An error of the double's own. Two are equal when they are one and the same.
+// An error type of its own. An error equals itself alone, so a test sees that it came back as it was made.
 using ScriptedError = std::shared_ptr<const int>;
 
 // What a decoder and those of its nested messages share.

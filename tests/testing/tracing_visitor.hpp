@@ -1,4 +1,4 @@
-// A visitor that is none of the library's: it notes what it is handed, and stops when told to.
+// A visitor that is not the library's: it notes what it is handed, and stops when told to.
 #pragma once
 
 #include <cstddef>

@@ -1,4 +1,4 @@
-// A parsed JSON document, without a word of the library that holds it.
+// A parsed JSON document, whose interface shows nothing of the library that parses it.
 #pragma once
 
 #include <cstddef>
@@ -23,17 +23,17 @@ class Value {
   // "a number", "null" and so on, for messages.
   std::string_view kindName() const;
 
-  // What the kind allows: each asserts it.
+  // Each is for values of one kind, which it asserts.
   bool boolean() const;
   std::string_view text() const;
   // None for a number with a fraction or beyond 64 bits; 5, 5.0 and 50e-1 are the same integer.
   std::optional<std::int64_t> integer() const;
 
-  // How many items a list or members an object has, and which they are, in the document's order.
+  // The items of a list and the members of an object, in the document's order; asserts the kind.
   std::size_t size() const;
   Value item(std::size_t index) const;
   Member member(std::size_t index) const;
-  // None if the object has no such member. Looks at one after the other.
+  // None if the object has no such member. Takes time in proportion to the number of members.
   std::optional<Value> find(std::string_view name) const;
 
  private:

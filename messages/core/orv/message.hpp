@@ -36,8 +36,8 @@ class Step;
 
 // The base of every message type M: a regular value that owns all that it holds. M adds its full name, its
 // accessors, its storage and, in a private table `fields`, one row per field in ascending order of the
-// numbers; everything here derives from that table. M's constructor is empty rather than defaulted: a
-// defaulted one makes M() fill all of its memory with zeros first.
+// numbers; everything here derives from that table. M's constructor is best written empty, `M() noexcept {}`:
+// a defaulted one takes longer (docs/decisions/inline-bytes.md).
 //
 // What is only declared here is compiled once for each type, by the line `template class orv::Message<M>;` in
 // a source that includes <orv/instantiate.hpp>.

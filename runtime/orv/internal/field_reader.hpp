@@ -188,8 +188,7 @@ class FieldReader {
     return continueAt(after);
   }
 
-  // What only the replacing of a message needs, which takes its first occurrence of each field as if there
-  // had been none.
+  // What only reparse needs, which takes the first occurrence of each field as if the message were empty.
 
   bool isAtLengthDelimited() const { return tag_.wireType() == WireType::lengthDelimited; }
   // Whether the field whose number was given last was taken.

@@ -31,7 +31,7 @@ struct Target {
 
   // How the number of a nested message's length bytes is guessed before the message is written.
   enum class Guesses : std::uint8_t {
-    bold,     // right more often; while it is being written an encoding may need a few bytes more than it has
+    bold,     // right more often, but an unfinished encoding may take some bytes more than a finished one
     careful,  // one: an encoding fits where it fits exactly
   };
 
@@ -111,8 +111,8 @@ class FieldWriter {
   char* position() const { return at_; }
   std::size_t room() const { return static_cast<std::size_t>(limit_ - at_); }
 
-  // Clears what steps of a fixed size left behind the encoding in a caller's buffer: parts of other contents,
-  // it may be.
+  // Clears what steps of a fixed size left behind the encoding in a caller's buffer, which may be parts of
+  // other contents.
   void wipeOverrun() {
     constexpr std::size_t longest = InlineBytes::objectSize;
     if (room() >= longest) [[likely]] {

@@ -77,7 +77,7 @@ class InlineBytes {
       freeBlock();
   }
 
-  // Valid until the object changes or goes.
+  // Valid until the object is changed or destroyed.
   std::string_view view() const {
     if (isOnHeap()) [[unlikely]] {
       const Block block = heapBlock();
@@ -183,8 +183,7 @@ class InlineBytes {
   };
 
   char* inlineData() { return reinterpret_cast<char*>(raw_); }
-  // Member by member, as below: as one piece, g++ 12 takes a detour through memory and waits for it there,
-  // 5 ns each time.
+  // Member by member, as below, and not as one piece: docs/decisions/inline-bytes.md.
   Block heapBlock() const {
     Block block;
     std::memcpy(&block.data, raw_ + offsetof(Block, data), sizeof block.data);

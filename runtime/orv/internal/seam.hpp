@@ -9,8 +9,8 @@
 
 namespace orv::internal {
 
-// What the operations of a decoder or visitor answer: its own Result where it names one, which then is the
-// like of std::expected<void, Error>.
+// What the operations of a decoder or visitor answer: its own Result where it names one, which then can
+// do what std::expected<void, Error> can.
 template <class Seam>
 struct ResultOfSeam {
   using Type = std::expected<void, typename Seam::Error>;

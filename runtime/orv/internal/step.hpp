@@ -6,7 +6,8 @@
 
 namespace orv::internal {
 
-// The error of such a step, an empty sign: what was wrong stands elsewhere, once. docs/decisions/error-sign.md.
+// The error of such a step, an empty sign: what was wrong stands elsewhere, once. Why these are not
+// std::expected: docs/decisions/error-sign.md.
 struct Failed {};
 
 // What std::expected<void, Failed> says.

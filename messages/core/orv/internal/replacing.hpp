@@ -12,7 +12,7 @@
 
 namespace orv::internal {
 
-// Reads a message of any type in place of one. A message offers it under this name to whoever holds one.
+// Reads a message of any type in place of one: what a reader is given to read a nested message by.
 struct Replace {
   template <class M>
   [[gnu::always_inline]] Step operator()(M& message, FieldReader& reader) const {
@@ -20,9 +20,9 @@ struct Replace {
   }
 };
 
-// What decodeFields does to a default message, in the memory of what this one holds. The first occurrence of
-// a field takes its old value's place, and those of a list the places of its old elements; what was not read
-// goes in the end.
+// What decodeMessage does to a default message, in the memory of what this one holds. The first occurrence of
+// a field takes its old value's place, and those of a list the places of its old elements; old values that
+// nothing took the place of are removed in the end.
 template <class Table, class M>
 class Replacing {
  public:

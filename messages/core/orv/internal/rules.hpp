@@ -1,5 +1,5 @@
-// The rules of all messages, over a message's field table: decode loop, encode walk, equality. A rule that a
-// small message's whole time goes into is inlined into the loop of the decoder or visitor.
+// The rules of all messages, over a message's field table: decode loop, encode walk, equality. Rules
+// that stand in the loops of decoding and encoding are inlined: docs/decisions/position-in-registers.md.
 #pragma once
 
 #include <concepts>

@@ -136,7 +136,7 @@ class UncheckedTable {
   using Value = typename TraitsOf<index>::Value;
 };
 
-// M's table, which obeys the rules of tables, and what M tells of itself.
+// M's table, checked against the rules of tables, and the descriptor made of it.
 template <class M, class Rows>
 class Table : public UncheckedTable<M, Rows> {
   using Base = UncheckedTable<M, Rows>;
