@@ -32,7 +32,9 @@ std::expected<std::optional<std::uint32_t>, Error> DocumentDecoder::nextNumber(N
     name_ = member.name;
     value_ = member.value;
     const auto number = names.number(member.name);
-    if (!number) return fail("unknown field" + spelling::suggestion(member.name, names));
+    if (!number)
+      return fail("unknown field" +
+                  spelling::suggestion(member.name, names.entries(), &NameMap::Entry::name));
     if (member.value.kind() != Value::Kind::null) return static_cast<std::uint32_t>(*number);
   }
   return std::nullopt;
@@ -78,7 +80,8 @@ std::expected<std::uint32_t, Error> DocumentDecoder::readUInt32() const {
 std::expected<std::int64_t, Error> DocumentDecoder::readEnum(NameMap names) const {
   if (value_->kind() == Value::Kind::text) {
     if (const auto number = names.number(value_->text())) return *number;
-    return fail("unknown name " + quoted(value_->text()) + spelling::suggestion(value_->text(), names));
+    return fail("unknown name " + quoted(value_->text()) +
+                spelling::suggestion(value_->text(), names.entries(), &NameMap::Entry::name));
   }
   if (value_->kind() != Value::Kind::number) return failExpecting("a name or a number");
   const auto number = value_->integer();

@@ -31,16 +31,15 @@ const MessageType& typeOf(const MessageDescriptor& descriptor) {
 
 std::expected<const MessageType*, std::string> findMessageType(std::string_view name) {
   std::vector<const MessageType*> sameLastWord;
-  std::vector<std::string_view> names;
   for (const MessageType& type : types) {
     if (name == type.fullName() || name == type.shortName()) return &type;
     if (name == lastWord(type.fullName())) sameLastWord.push_back(&type);
-    names.push_back(type.shortName());
   }
   if (sameLastWord.size() == 1) return sameLastWord.front();
   const std::string quoted = "\"" + std::string(name) + "\"";
   if (sameLastWord.empty()) {
-    return std::unexpected("unknown message type " + quoted + spelling::suggestion(name, names));
+    return std::unexpected("unknown message type " + quoted +
+                           spelling::suggestion(name, types, &MessageType::shortName));
   }
   std::string error = quoted + " could be ";
   for (const MessageType* type : sameLastWord) {

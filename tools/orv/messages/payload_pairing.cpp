@@ -45,7 +45,7 @@ std::expected<void, std::string> PayloadPairing::override(std::string_view pairi
   const auto number = kindNumber(kind);
   if (!number) {
     return std::unexpected("unknown envelope type \"" + std::string(kind) + "\"" +
-                           spelling::suggestion(kind, kindNames));
+                           spelling::suggestion(kind, kindNames.entries(), &NameMap::Entry::name));
   }
   forKind_[*number] = *payload;
   return {};
