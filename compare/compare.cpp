@@ -6,6 +6,7 @@
 #include <variant>
 
 #include <orv/byte_view.hpp>
+#include <orv/spelling/text_position.hpp>
 #include <orv/spelling/value_text.hpp>
 
 namespace orv::compare {
@@ -34,15 +35,12 @@ struct ValueReader {
 };
 
 // The bytes of a value that may be long.
-struct ContentReader {
-  std::string_view operator()(const Text& text) const { return text.utf8(); }
-  std::string_view operator()(const ByteBuffer& bytes) const { return bytes.characters(); }
-  std::string_view operator()(const UnknownRecord& record) const { return record.bytes; }
-  template <class Other>
-  std::string_view operator()(const Other&) const {
-    return {};
-  }
-};
+std::string_view contentOf(const Leaf& leaf) {
+  if (const auto* const text = std::get_if<Text>(&leaf.value)) return text->utf8();
+  if (const auto* const bytes = std::get_if<ByteBuffer>(&leaf.value)) return bytes->characters();
+  if (const auto* const record = std::get_if<UnknownRecord>(&leaf.value)) return record->bytes;
+  return {};
+}
 
 // From where on two values are to be shown: their beginning, or a little before they differ.
 std::size_t interestingFrom(std::string_view before, std::string_view after) {
@@ -51,10 +49,7 @@ std::size_t interestingFrom(std::string_view before, std::string_view after) {
   const auto mismatch = std::ranges::mismatch(before, after);
   const auto common = static_cast<std::size_t>(mismatch.in1 - before.begin());
   if (common < short_) return 0;
-  std::size_t from = common - context;
-  while (from > 0 && (static_cast<unsigned char>(before[from]) & 0xC0) == 0x80)
-    --from;  // between two characters
-  return from;
+  return spelling::characterStart(before, common - context);
 }
 
 std::string textOf(const Leaf& leaf, std::size_t from = 0) {
@@ -62,8 +57,7 @@ std::string textOf(const Leaf& leaf, std::size_t from = 0) {
 }
 
 Difference changed(const Leaf& before, const Leaf& after) {
-  const std::size_t from =
-      interestingFrom(std::visit(ContentReader(), before.value), std::visit(ContentReader(), after.value));
+  const std::size_t from = interestingFrom(contentOf(before), contentOf(after));
   return {Difference::Kind::changed, before.path(), textOf(before, from), textOf(after, from)};
 }
 
@@ -77,7 +71,7 @@ std::string Leaf::path() const {
   for (const Step& step : place) {
     if (!path.empty()) path += '.';
     path += step.name;
-    if (step.isInList) path += '[' + std::to_string(step.index) + ']';
+    if (step.index) path += '[' + std::to_string(*step.index) + ']';
   }
   return path;
 }
@@ -88,12 +82,9 @@ bool Leaf::isIn(const Leaf& message) const {
 }
 
 LeafCollector::Result LeafCollector::visitUnknownFields(const UnknownStorage& unknownFields) {
-  std::size_t index = 0;
-  for (const UnknownField& field : unknownFields) {
-    const std::string bytes(charactersOf(field.record));
-    addAt({Step::unknownFields, index++, true, "unknownFields"}, UnknownRecord{bytes});
-  }
-  return {};
+  return visitItems(unknownFields, [&](const UnknownField& field) {
+    return add(Step::unknownFields, UnknownRecord{std::string(charactersOf(field.record))});
+  });
 }
 
 std::vector<Difference> differencesOfLeaves(std::span<const Leaf> left, std::span<const Leaf> right) {

@@ -1,16 +1,125 @@
 #include <orv/json/document.hpp>
 
+#include <algorithm>
 #include <array>
 #include <cassert>
 #include <cmath>
 #include <limits>
+#include <nlohmann/json.hpp>
+#include <unordered_set>
 #include <utility>
+#include <vector>
 
-#include "document_builder.hpp"
+#include <orv/spelling/text_position.hpp>
 
 namespace orv::json {
 
 namespace {
+
+// Members in the document's order.
+using Node = nlohmann::ordered_json;
+
+// The library's sentence without its prefix, which ends with the position, and without the token that was
+// read, which may be as long as the input.
+std::string reasonOf(std::string_view what) {
+  if (const auto prefix = what.find(": "); prefix != std::string_view::npos) what.remove_prefix(prefix + 2);
+  std::string reason(what);
+  constexpr std::size_t longestToken = 40;
+  const auto token = reason.find("; last read: '");
+  if (token == std::string::npos) return reason;
+  const auto end = reason.rfind('\'');
+  if (end - token > longestToken) reason.erase(token, end + 1 - token);
+  return reason;
+}
+
+// Builds a document from the parser's events. The library's own builder would keep one of two members of the
+// same name; this refuses them, and nesting that is too deep, while the text is read.
+class DocumentBuilder final : public nlohmann::json_sax<Node> {
+ public:
+  explicit DocumentBuilder(std::string_view text) : text_(text) {}
+
+  Node takeRoot() { return std::move(root_); }
+  // What ended the parsing early.
+  const std::optional<Error>& error() const { return error_; }
+
+  bool null() override { return add(nullptr) != nullptr; }
+  bool boolean(bool value) override { return add(value) != nullptr; }
+  bool number_integer(std::int64_t value) override { return add(value) != nullptr; }
+  bool number_unsigned(std::uint64_t value) override { return add(value) != nullptr; }
+  bool number_float(double value, const std::string&) override { return add(value) != nullptr; }
+  bool string(std::string& value) override { return add(std::move(value)) != nullptr; }
+  bool binary(Node::binary_t&) override { return false; }
+  bool start_object(std::size_t) override { return open(Node::object()); }
+  bool end_object() override { return close(); }
+  bool start_array(std::size_t) override { return open(Node::array()); }
+  bool end_array() override { return close(); }
+  bool key(std::string& name) override {
+    Open& innermost = open_.back();
+    innermost.memberName = name;
+    return innermost.names.insert(std::move(name)).second || fail("the object has this member twice");
+  }
+  // The position counts the bytes that were read, the offending one included.
+  bool parse_error(std::size_t position, const std::string&,
+                   const nlohmann::detail::exception& cause) override {
+    spelling::TextPosition place;
+    for (std::size_t at = 0; at + 1 < std::min(position, text_.size()); ++at) place.advance(text_[at]);
+    const auto [reason, line, column] = place.error(reasonOf(cause.what()));
+    error_ = Error{.reason = reason, .path = {}, .line = line, .column = column};
+    return false;
+  }
+
+ private:
+  // An object or a list that is not at its end yet.
+  struct Open {
+    Node* node;
+    std::string memberName;
+    std::unordered_set<std::string> names;
+  };
+
+  // Lists and objects grow at the end of what is open, so a pointer to an open one stays good.
+  Node* add(Node value) {
+    if (open_.empty()) {
+      root_ = std::move(value);
+      return &root_;
+    }
+    Open& innermost = open_.back();
+    if (innermost.node->is_array()) {
+      auto& items = innermost.node->get_ref<Node::array_t&>();
+      return &items.emplace_back(std::move(value));
+    }
+    // Not the map's own emplace, which looks through all members for the name each time.
+    auto& members = static_cast<Node::object_t::Container&>(innermost.node->get_ref<Node::object_t&>());
+    return &members.emplace_back(innermost.memberName, std::move(value)).second;
+  }
+
+  bool open(Node empty) {
+    if (open_.size() == Document::maximumNesting)
+      return fail("nested deeper than " + std::to_string(Document::maximumNesting));
+    open_.push_back({add(std::move(empty)), {}, {}});
+    return true;
+  }
+
+  bool close() {
+    open_.pop_back();
+    return true;
+  }
+
+  // About the member or item that is being read.
+  bool fail(std::string reason) {
+    std::string path = "$";
+    for (const Open& step : open_) {
+      const std::size_t finished = step.node->size() - (&step == &open_.back() ? 0 : 1);
+      path += step.node->is_array() ? '[' + std::to_string(finished) + ']' : memberStep(step.memberName);
+    }
+    error_ = Error{.reason = std::move(reason), .path = std::move(path)};
+    return false;
+  }
+
+  std::string_view text_;
+  Node root_;
+  std::vector<Open> open_;
+  std::optional<Error> error_;
+};
 
 // In the order of Value::Kind.
 constexpr std::array<std::string_view, 6> kindNames{"null",     "a boolean", "a number",

@@ -1,7 +1,7 @@
 #include <orv/json/document_decoder.hpp>
 
 #include <charconv>
-#include <limits>
+#include <utility>
 
 #include <orv/spelling/base64.hpp>
 #include <orv/spelling/nearest_name.hpp>
@@ -32,61 +32,62 @@ std::expected<std::optional<std::uint32_t>, Error> DocumentDecoder::nextNumber(N
     name_ = member.name;
     value_ = member.value;
     const auto number = names.number(member.name);
-    if (!number) return fail("unknown field" + spelling::suggestion(member.name, names));
+    if (!number)
+      return fail("unknown field" +
+                  spelling::suggestion(member.name, names.entries(), &NameMap::Entry::name));
     if (member.value.kind() != Value::Kind::null) return static_cast<std::uint32_t>(*number);
   }
   return std::nullopt;
 }
 
-std::expected<Text, Error> DocumentDecoder::readText() const {
+std::expected<bool, Error> DocumentDecoder::readAnyValue(Text& value) const {
   if (value_->kind() != Value::Kind::text) return failExpecting("a string");
   // The parser lets well-formed text through only.
-  return Text(value_->text());
+  value = Text(value_->text());
+  return true;
 }
 
-std::expected<ByteBuffer, Error> DocumentDecoder::readBytes() const {
+std::expected<bool, Error> DocumentDecoder::readAnyValue(ByteBuffer& value) const {
   if (value_->kind() != Value::Kind::text) return failExpecting("a base64 string");
   const auto bytes = spelling::decodeBase64(value_->text());
   if (!bytes) return fail("expected base64, found " + quoted(value_->text()));
-  return ByteBuffer(*bytes);
+  value = ByteBuffer(*bytes);
+  return true;
 }
 
-std::expected<bool, Error> DocumentDecoder::readBool() const {
+std::expected<bool, Error> DocumentDecoder::readAnyValue(bool& value) const {
   if (value_->kind() != Value::Kind::boolean) return failExpecting("true or false");
-  return value_->boolean();
+  value = value_->boolean();
+  return true;
 }
 
-std::expected<std::uint32_t, Error> DocumentDecoder::readUInt32() const {
+std::expected<bool, Error> DocumentDecoder::readAnyValue(std::uint32_t& value) const {
   constexpr std::string_view expected = "a whole number from 0 to 4294967295";
   if (value_->kind() == Value::Kind::text) {
     const std::string_view digits = value_->text();
-    std::uint32_t number = 0;
-    const auto [end, status] = std::from_chars(digits.data(), digits.data() + digits.size(), number);
-    if (status != std::errc() || end != digits.data() + digits.size()) {
-      return fail("expected " + std::string(expected) + ", found " + quoted(digits));
-    }
-    return number;
+    const auto [end, status] = std::from_chars(digits.data(), digits.data() + digits.size(), value);
+    if (status == std::errc() && end == digits.data() + digits.size()) return true;
+    return fail("expected " + std::string(expected) + ", found " + quoted(digits));
   }
   if (value_->kind() != Value::Kind::number) return failExpecting(expected);
   const auto number = value_->integer();
-  if (!number || *number < 0 || *number > std::numeric_limits<std::uint32_t>::max()) {
+  if (!number || !std::in_range<std::uint32_t>(*number))
     return fail("expected " + std::string(expected) + ", found another number");
-  }
-  return static_cast<std::uint32_t>(*number);
+  value = static_cast<std::uint32_t>(*number);
+  return true;
 }
 
 std::expected<std::int64_t, Error> DocumentDecoder::readEnum(NameMap names) const {
   if (value_->kind() == Value::Kind::text) {
     if (const auto number = names.number(value_->text())) return *number;
-    return fail("unknown name " + quoted(value_->text()) + spelling::suggestion(value_->text(), names));
+    return fail("unknown name " + quoted(value_->text()) +
+                spelling::suggestion(value_->text(), names.entries(), &NameMap::Entry::name));
   }
   if (value_->kind() != Value::Kind::number) return failExpecting("a name or a number");
   const auto number = value_->integer();
   // What is above would be cut on the wire.
-  if (!number || *number < std::numeric_limits<std::int32_t>::min() ||
-      *number > std::numeric_limits<std::int32_t>::max()) {
+  if (!number || !std::in_range<std::int32_t>(*number))
     return fail("expected a name or a whole number of 32 bits, found another number");
-  }
   return *number;
 }
 

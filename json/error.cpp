@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include <orv/spelling/text_position.hpp>
+
 namespace orv::json {
 
 namespace {
@@ -19,14 +21,12 @@ bool isPlain(std::string_view name) {
 std::string memberStep(std::string_view name) {
   if (isPlain(name)) return "." + std::string(name);
   if (name.size() <= longestName) return "[\"" + std::string(name) + "\"]";
-  std::size_t end = longestName;
-  while (end > 0 && (static_cast<unsigned char>(name[end]) & 0xC0) == 0x80) --end;  // between two characters
-  return "[\"" + std::string(name.substr(0, end)) + "…\"]";
+  return "[\"" + std::string(name.substr(0, spelling::characterStart(name, longestName))) + "…\"]";
 }
 
 std::string Error::message() const {
   if (!path.empty()) return path + ": " + reason;
-  return "line " + std::to_string(line) + ", column " + std::to_string(column) + ": " + reason;
+  return spelling::TextError{reason, line, column}.message();
 }
 
 }  // namespace orv::json

@@ -32,10 +32,7 @@ void Renderer::open(char bracket) {
 
 void Renderer::close(char bracket) {
   --depth_;
-  if (options_.isIndented && !isAtFirst_) {
-    output_ += '\n';
-    output_.append(2 * depth_, ' ');
-  }
+  if (!isAtFirst_) startLine();
   output_ += bracket;
   isAtFirst_ = false;
 }
@@ -43,6 +40,10 @@ void Renderer::close(char bracket) {
 void Renderer::startItem() {
   if (!isAtFirst_) output_ += ',';
   isAtFirst_ = false;
+  startLine();
+}
+
+void Renderer::startLine() {
   if (!options_.isIndented) return;
   output_ += '\n';
   output_.append(2 * depth_, ' ');
@@ -50,16 +51,11 @@ void Renderer::startItem() {
 
 void Renderer::startMember(std::string_view name) {
   startItem();
-  appendText(name);
+  appendQuoted(name);
   output_ += options_.isIndented ? ": " : ":";
 }
 
-void Renderer::startMember(std::uint32_t number) {
-  const auto name = names_.name(number);
-  startMember(name ? std::string(*name) : std::to_string(number));
-}
-
-void Renderer::appendText(std::string_view utf8) {
+void Renderer::appendQuoted(std::string_view utf8) {
   output_ += '"';
   while (!utf8.empty()) {
     const utf8::Step step = utf8::step(utf8);
@@ -81,7 +77,7 @@ void Renderer::appendText(std::string_view utf8) {
   output_ += '"';
 }
 
-void Renderer::appendBytes(std::string_view bytes) {
+void Renderer::appendBase64(std::string_view bytes) {
   output_ += '"';
   spelling::appendBase64(bytes, output_);
   output_ += '"';
@@ -91,32 +87,32 @@ Renderer::Result Renderer::visitUnknownFields(const UnknownStorage& unknownField
   if (!options_.showsUnknownFields) return {};
   startMember("unknownFields");
   open('[');
-  for (const UnknownField& field : unknownFields) renderUnknown(field);
+  for (const UnknownField& field : unknownFields) appendUnknown(field);
   close(']');
   return {};
 }
 
-void Renderer::renderUnknown(const UnknownField& field) {
+void Renderer::appendUnknown(const UnknownField& field) {
   startItem();
   open('{');
   startMember("number");
   output_ += std::to_string(field.tag.fieldNumber());
   startMember("wireType");
-  appendText(wireTypeNames[static_cast<std::size_t>(field.tag.wireType())]);
+  appendQuoted(wireTypeNames[static_cast<std::size_t>(field.tag.wireType())]);
   startMember("value");
   // What is kept is well-formed.
   WireReader reader(field.value);
   switch (field.tag.wireType()) {
-    case WireType::varint: appendText(std::to_string(*reader.readVarint())); break;
-    case WireType::fixed64: appendText(std::to_string(*reader.readFixed64())); break;
+    case WireType::varint: appendQuoted(std::to_string(*reader.readVarint())); break;
+    case WireType::fixed64: appendQuoted(std::to_string(*reader.readFixed64())); break;
     case WireType::fixed32: output_ += std::to_string(*reader.readFixed32()); break;
-    case WireType::lengthDelimited: appendBytes(charactersOf(*reader.readLengthDelimited())); break;
+    case WireType::lengthDelimited: appendBase64(charactersOf(*reader.readLengthDelimited())); break;
     case WireType::startGroup:
       open('[');
       // The body ends with an end-group tag of its own.
       for (auto inner = UnknownStorage::Iterator(field.value); inner->tag.wireType() != WireType::endGroup;
            ++inner) {
-        renderUnknown(*inner);
+        appendUnknown(*inner);
       }
       close(']');
       break;

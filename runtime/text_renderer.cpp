@@ -6,6 +6,8 @@
 #include <array>
 #include <limits>
 
+#include <orv/internal/hex_digits.hpp>
+
 namespace orv {
 
 namespace {
@@ -55,9 +57,7 @@ char* writeEscaped(std::string_view bytes, char* target) {
 
 template <class Number>
 std::string hexadecimal(Number value) {
-  std::string digits(2 * sizeof value, '0');
-  for (std::size_t at = digits.size(); at-- > 0; value >>= 4) digits[at] = "0123456789abcdef"[value & 0xF];
-  return "0x" + digits;
+  return "0x" + internal::hexNumber(value, 2 * sizeof value);
 }
 
 }  // namespace

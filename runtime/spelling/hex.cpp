@@ -1,13 +1,10 @@
 #include <orv/spelling/hex.hpp>
 
 #include <algorithm>
-#include <bit>
 
 namespace orv::spelling {
 
 namespace {
-
-constexpr std::string_view digits = "0123456789abcdef";
 
 int digitValue(char c) {
   if (c >= '0' && c <= '9') return c - '0';
@@ -31,16 +28,9 @@ void appendHex(std::string_view bytes, std::string& output, std::string_view bet
   for (std::size_t at = 0; at < bytes.size(); ++at) {
     if (at != 0) target = std::ranges::copy(between, target).out;
     const auto byte = static_cast<unsigned char>(bytes[at]);
-    *target++ = digits[byte >> 4];
-    *target++ = digits[byte & 0xF];
+    *target++ = internal::hexDigits[byte >> 4];
+    *target++ = internal::hexDigits[byte & 0xF];
   }
-}
-
-std::string hexNumber(std::uint64_t number, std::size_t fewestDigits) {
-  const std::size_t needed = (static_cast<std::size_t>(std::bit_width(number)) + 3) / 4;
-  std::string text(std::max(needed, fewestDigits), '0');
-  for (std::size_t at = text.size(); number != 0; number >>= 4) text[--at] = digits[number & 0xF];
-  return text;
 }
 
 std::expected<void, TextError> HexReader::take(std::string_view piece, std::string& bytes) {

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <vector>
 
 namespace orv::spelling {
 
@@ -28,7 +27,7 @@ std::size_t distance(std::string_view from, std::string_view to) {
 
 }  // namespace
 
-std::string_view nearestName(std::string_view name, std::span<const std::string_view> candidates) {
+std::string suggestion(std::string_view name, std::span<const std::string_view> candidates) {
   constexpr std::size_t longestName = 100;
   if (name.size() > longestName) return {};
   std::string_view nearest;
@@ -41,19 +40,7 @@ std::string_view nearestName(std::string_view name, std::span<const std::string_
       nearest = candidate;
     }
   }
-  return nearest;
-}
-
-std::string suggestion(std::string_view name, std::span<const std::string_view> candidates) {
-  const std::string_view nearest = nearestName(name, candidates);
-  if (nearest.empty()) return {};
-  return " (did you mean \"" + std::string(nearest) + "\"?)";
-}
-
-std::string suggestion(std::string_view name, NameMap candidates) {
-  std::vector<std::string_view> names;
-  for (const NameMap::Entry& entry : candidates.entries()) names.push_back(entry.name);
-  return suggestion(name, names);
+  return nearest.empty() ? std::string() : " (did you mean \"" + std::string(nearest) + "\"?)";
 }
 
 }  // namespace orv::spelling

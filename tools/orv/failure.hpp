@@ -1,10 +1,16 @@
 // How the command ends, and why.
 #pragma once
 
+#include <unistd.h>
+
+#include <cerrno>
 #include <cstdint>
+#include <cstring>
 #include <expected>
 #include <string>
 #include <string_view>
+
+#include <orv/spelling/value_text.hpp>
 
 namespace orv::tool {
 
@@ -33,11 +39,19 @@ inline std::unexpected<Failure> fail(ExitStatus status, std::string line) {
 inline std::unexpected<Failure> endQuietly() { return fail(ExitStatus::done, {}); }
 
 // "file: reason", with what errno says.
-std::unexpected<Failure> failWithErrno(std::string_view file);
+inline std::unexpected<Failure> failWithErrno(std::string_view file) {
+  const int cause = errno;
+  return fail(ExitStatus::fileError, std::string(file) + ": " + std::strerror(cause));
+}
 
 // Prints the failure's line, if it has any, on standard error. Control characters and ill-formed text in it,
 // which come from file names and from input, are made visible, so that it is one line and leaves the terminal
 // alone.
-void report(const Failure& failure);
+inline void report(const Failure& failure) {
+  if (failure.line.empty()) return;
+  const std::string line = spelling::printable(failure.line) + '\n';
+  // Nothing can be done where this fails too.
+  [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, line.data(), line.size());
+}
 
 }  // namespace orv::tool

@@ -5,9 +5,10 @@
 #include <csignal>
 #include <new>
 #include <optional>
+#include <span>
 #include <variant>
 
-#include "tools/orv/command_line/command_line.hpp"
+#include "tools/orv/command_line/command.hpp"
 #include "tools/orv/output/output_file.hpp"
 
 namespace orv::tool {
@@ -22,8 +23,8 @@ void occupyStandardDescriptors() {
   }
 }
 
-ExitStatus runCommandLine(int argumentCount, const char* const* arguments) {
-  const auto parsed = parseCommandLine(argumentCount, arguments);
+ExitStatus runCommandLine(std::span<char*> words) {
+  const auto parsed = parseCommandLine(words);
   if (const auto* const request = std::get_if<Request>(&parsed))
     return request->command->run(request->options);
   if (const auto* const answer = std::get_if<Answer>(&parsed)) return writeWhole(std::nullopt, answer->text);
@@ -40,7 +41,7 @@ int main(int argumentCount, char** arguments) {
   std::signal(SIGPIPE, SIG_IGN);
   orv::tool::occupyStandardDescriptors();
   try {
-    return static_cast<int>(orv::tool::runCommandLine(argumentCount, arguments));
+    return static_cast<int>(orv::tool::runCommandLine({arguments, static_cast<std::size_t>(argumentCount)}));
   } catch (const std::bad_alloc&) {
     orv::tool::report({ExitStatus::fileError, "orv: out of memory"});
     return static_cast<int>(ExitStatus::fileError);

@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-#include "tools/orv/messages/payload_pairing.hpp"
+#include "tools/orv/messages/message_type.hpp"
 
 namespace orv::tool {
 

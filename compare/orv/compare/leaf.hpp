@@ -4,17 +4,18 @@
 #include <compare>
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
+#include <tuple>
+#include <utility>
 #include <variant>
 #include <vector>
 
+#include <orv/any_value_visitor.hpp>
 #include <orv/byte_buffer.hpp>
-#include <orv/enumeration.hpp>
-#include <orv/name_map.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
-#include <orv/visitor.hpp>
 
 namespace orv::compare {
 
@@ -24,13 +25,11 @@ struct Step {
   static constexpr std::uint32_t unknownFields = 0xFFFFFFFF;
 
   std::uint32_t number;
-  std::size_t index;  // in a list
-  bool isInList;
+  std::optional<std::size_t> index;  // in a list
   std::string_view name;
 
-  friend std::strong_ordering operator<=>(const Step& left, const Step& right) {
-    if (const auto order = left.number <=> right.number; order != 0) return order;
-    return left.index <=> right.index;
+  friend auto operator<=>(const Step& left, const Step& right) {
+    return std::tie(left.number, left.index) <=> std::tie(right.number, right.index);
   }
   friend bool operator==(const Step& left, const Step& right) { return (left <=> right) == 0; }
 };
@@ -68,25 +67,19 @@ struct Leaf {
 
 // A visitor that lists the leaves of what it walks, in ascending order of their places; a message stands
 // before what is in it.
-class LeafCollector {
+class LeafCollector : public AnyValueVisitor<LeafCollector> {
  public:
-  using Error = NeverFails;
-  using Result = std::expected<void, NeverFails>;
-
   template <class M>
   static std::vector<Leaf> collect(const M& message) {
     LeafCollector collector;
-    collector.names_ = M::_protobuf_nameMap();
     (void)message.traverse(collector);
     return std::move(collector.leaves_);
   }
 
-  // The operations that Visitor lists.
-
-  Result visitSingularStringField(const Text& value, std::uint32_t number) { return add(number, value); }
-  Result visitSingularBytesField(const ByteBuffer& value, std::uint32_t number) { return add(number, value); }
-  Result visitSingularBoolField(bool value, std::uint32_t number) { return add(number, value); }
-  Result visitSingularUInt32Field(std::uint32_t value, std::uint32_t number) { return add(number, value); }
+  template <class T>
+  Result visitAnyValue(const T& value, std::uint32_t number) {
+    return add(number, value);
+  }
   template <class Enumeration>
   Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
     const auto name = Enumeration::_protobuf_nameMap().name(value.rawValue());
@@ -94,54 +87,49 @@ class LeafCollector {
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    return walk(message, stepTo(number));
+    enter(number, MessagePresence());
+    (void)walkNested(message);
+    place_.pop_back();
+    return {};
   }
   Result visitRepeatedStringField(const std::vector<Text>& texts, std::uint32_t number) {
-    for (std::size_t index = 0; index < texts.size(); ++index) addAt(stepTo(number, index), texts[index]);
-    return {};
+    return visitItems(texts, [&](const Text& text) { return visitAnyValue(text, number); });
   }
   template <class M>
   Result visitRepeatedMessageField(const std::vector<M>& messages, std::uint32_t number) {
-    for (std::size_t index = 0; index < messages.size(); ++index)
-      (void)walk(messages[index], stepTo(number, index));
-    return {};
+    return visitItems(messages, [&](const M& message) { return visitSingularMessageField(message, number); });
   }
   Result visitUnknownFields(const UnknownStorage& unknownFields);
 
  private:
-  Step stepTo(std::uint32_t number) const {
-    return {number, 0, false, names_.name(number).value_or(std::string_view())};
-  }
-  Step stepTo(std::uint32_t number, std::size_t index) const {
-    return {number, index, true, names_.name(number).value_or(std::string_view())};
+  template <class Items, class Visit>
+  Result visitItems(const Items& items, Visit visit) {
+    std::size_t index = 0;
+    for (const auto& item : items) {
+      itemIndex_ = index++;
+      (void)visit(item);
+    }
+    return {};
   }
 
+  // Adds a leaf, and stays at its place.
   template <class T>
-  void addAt(Step step, T value) {
-    place_.push_back(step);
+  void enter(std::uint32_t number, T value) {
+    // What has no name are the unknown fields.
+    const std::string_view name = names().name(number).value_or("unknownFields");
+    place_.push_back({number, std::exchange(itemIndex_, std::nullopt), name});
     leaves_.push_back({place_, std::move(value)});
-    place_.pop_back();
   }
   template <class T>
   Result add(std::uint32_t number, T value) {
-    addAt(stepTo(number), std::move(value));
-    return {};
-  }
-  template <class M>
-  Result walk(const M& message, Step step) {
-    addAt(step, MessagePresence());
-    place_.push_back(step);
-    const NameMap outer = names_;
-    names_ = M::_protobuf_nameMap();
-    (void)message.traverse(*this);
-    names_ = outer;
+    enter(number, std::move(value));
     place_.pop_back();
     return {};
   }
 
   std::vector<Leaf> leaves_;
   std::vector<Step> place_;
-  NameMap names_;
+  std::optional<std::size_t> itemIndex_;  // of the item that is visited next
 };
 
 }  // namespace orv::compare

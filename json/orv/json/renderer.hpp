@@ -3,16 +3,14 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <expected>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include <orv/any_value_visitor.hpp>
 #include <orv/byte_buffer.hpp>
-#include <orv/name_map.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
-#include <orv/visitor.hpp>
 
 namespace orv::json {
 
@@ -26,83 +24,36 @@ struct RenderOptions {
 };
 
 // A visitor that writes what it is handed as the members of an object.
-class Renderer {
+class Renderer : public AnyValueVisitor<Renderer> {
  public:
-  using Error = NeverFails;
-  using Result = std::expected<void, NeverFails>;
-
   // Appends to `output`.
   explicit Renderer(std::string& output, RenderOptions options = {}) : output_(output), options_(options) {}
 
   template <class M>
   void render(const M& message) {
-    const NameMap outer = names_;
-    names_ = M::_protobuf_nameMap();
     open('{');
-    (void)message.traverse(*this);
+    (void)walkNested(message);
     close('}');
-    names_ = outer;
   }
 
-  // The operations that Visitor lists.
-
-  Result visitSingularStringField(const Text& value, std::uint32_t number) {
-    startMember(number);
-    appendText(value.utf8());
-    return {};
-  }
-  Result visitSingularBytesField(const ByteBuffer& value, std::uint32_t number) {
-    startMember(number);
-    appendBytes(value.characters());
-    return {};
-  }
-  Result visitSingularBoolField(bool value, std::uint32_t number) {
-    startMember(number);
-    output_ += value ? "true" : "false";
-    return {};
-  }
-  Result visitSingularUInt32Field(std::uint32_t value, std::uint32_t number) {
-    startMember(number);
-    output_ += std::to_string(value);
-    return {};
-  }
-  // By name, or by number where the raw value has none.
-  template <class Enumeration>
-  Result visitSingularEnumField(const Enumeration& value, std::uint32_t number) {
-    startMember(number);
-    if (const auto name = Enumeration::_protobuf_nameMap().name(value.rawValue())) {
-      appendText(*name);
-    } else {
-      output_ += std::to_string(value.rawValue());
-    }
+  template <class T>
+  Result visitAnyValue(const T& value, std::uint32_t number) {
+    startMember(fieldName(number));
+    append(value);
     return {};
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    startMember(number);
+    startMember(fieldName(number));
     render(message);
     return {};
   }
   Result visitRepeatedStringField(const std::vector<Text>& texts, std::uint32_t number) {
-    startMember(number);
-    open('[');
-    for (const Text& text : texts) {
-      startItem();
-      appendText(text.utf8());
-    }
-    close(']');
-    return {};
+    return visitList(texts, number, [&](const Text& text) { append(text); });
   }
   template <class M>
   Result visitRepeatedMessageField(const std::vector<M>& messages, std::uint32_t number) {
-    startMember(number);
-    open('[');
-    for (const M& message : messages) {
-      startItem();
-      render(message);
-    }
-    close(']');
-    return {};
+    return visitList(messages, number, [&](const M& message) { render(message); });
   }
   Result visitUnknownFields(const UnknownStorage& unknownFields);
 
@@ -111,15 +62,41 @@ class Renderer {
   void close(char bracket);
   // What stands between two members or list items, and before the first.
   void startItem();
+  // Where lines are indented.
+  void startLine();
   void startMember(std::string_view name);
-  void startMember(std::uint32_t number);
-  void appendText(std::string_view utf8);
-  void appendBytes(std::string_view bytes);
-  void renderUnknown(const UnknownField& field);
+
+  template <class T, class Append>
+  Result visitList(const std::vector<T>& items, std::uint32_t number, Append appendItem) {
+    startMember(fieldName(number));
+    open('[');
+    for (const T& item : items) {
+      startItem();
+      appendItem(item);
+    }
+    close(']');
+    return {};
+  }
+
+  void append(const Text& text) { appendQuoted(text.utf8()); }
+  void append(const ByteBuffer& bytes) { appendBase64(bytes.characters()); }
+  void append(bool value) { output_ += value ? "true" : "false"; }
+  void append(std::uint32_t value) { output_ += std::to_string(value); }
+  // By name, or by number where the raw value has none.
+  template <class Enumeration>
+  void append(const Enumeration& value) {
+    if (const auto name = Enumeration::_protobuf_nameMap().name(value.rawValue())) {
+      appendQuoted(*name);
+    } else {
+      output_ += std::to_string(value.rawValue());
+    }
+  }
+  void appendQuoted(std::string_view utf8);
+  void appendBase64(std::string_view bytes);
+  void appendUnknown(const UnknownField& field);
 
   std::string& output_;
   RenderOptions options_;
-  NameMap names_;
   std::size_t depth_ = 0;
   bool isAtFirst_ = true;  // whether the innermost object or list is still empty
 };

@@ -1,12 +1,15 @@
-// The subcommands and their options, in one table: parsing, help, manual page and completion are made of it.
+// The subcommands and their options, in one table, and what is made of it: parsing, help, manual page and
+// completion.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <expected>
 #include <optional>
 #include <span>
 #include <string>
 #include <string_view>
+#include <variant>
 
 #include "tools/orv/failure.hpp"
 #include "tools/orv/options.hpp"
@@ -85,5 +88,29 @@ std::string listed(const FormatChoice& formats);
 
 // The option's text with the formats that the command takes.
 std::string textOf(const OptionDescription& option, const Command& command);
+
+// Work: a command and its options, which are complete.
+struct Request {
+  const Command* command;
+  Options options;
+};
+
+// Text that was asked for in place of work: help, the version, the manual page, the completion.
+struct Answer {
+  std::string text;
+};
+
+// The first word is the program's name. Words change their places.
+std::variant<Request, Answer, Failure> parseCommandLine(std::span<char*> words);
+
+// The text of --help, set for a terminal of so many columns; 0 stands for 80.
+std::string helpText(std::size_t width);
+std::string helpText(const Command& command, std::size_t width);
+
+// The manual page in mdoc(7). The date is that of its contents: "November 22, 2025".
+std::string manPage(std::string_view date);
+
+// A script that completes the command in bash.
+std::string bashCompletion();
 
 }  // namespace orv::tool

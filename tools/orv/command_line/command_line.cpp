@@ -1,5 +1,6 @@
-#include "tools/orv/command_line/command_line.hpp"
+#include "tools/orv/command_line/command.hpp"
 
+#include <getopt.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -15,105 +16,70 @@ namespace orv::tool {
 
 namespace {
 
-using Words = std::span<const char* const>;
-using Result = std::expected<void, Failure>;
-
 std::unexpected<Failure> usageFailure(const std::string& reason) {
   return fail(ExitStatus::usage, "orv: " + reason);
 }
 
-// Takes the words behind a command apart. Options may stand before and behind files, letters together ("-dq"),
-// values in a word of their own or not ("-tMember", "--type=Member"); what follows "--" is no option.
-class Parser {
- public:
-  Parser(const Command& command, Words words) : command_(command), words_(words) {}
+std::unexpected<Failure> failUnexpected(const Command& command, std::string_view what,
+                                        std::string_view word) {
+  return usageFailure(std::string(command.name) + ": " + std::string(what) + " " + std::string(word) +
+                      spelling::suggestion(word, command.options, &OptionDescription::name));
+}
 
-  Result parse() {
-    while (!words_.empty()) {
-      const std::string_view word = takeWord();
-      const bool isFile = isBehindOptions_ || word == "-" || !word.starts_with('-');
-      if (!isFile && word == "--") {
-        isBehindOptions_ = true;
-      } else if (auto taken = isFile ? takeFile(word) : takeOptions(word); !taken) {
-        return taken;
-      }
-    }
-    return {};
+// What getopt_long answers for an option: its letter, or a number above all letters.
+int codeOf(const Command& command, const OptionDescription& option) {
+  if (option.letter != '\0') return option.letter;
+  return 0x100 + static_cast<int>(std::ranges::find(command.options, &option) - command.options.begin());
+}
+
+// The word that getopt_long does not know, without a value.
+std::string unknownOption(std::span<char*> words) {
+  if (::optopt != 0) return {'-', static_cast<char>(::optopt)};
+  const std::string_view word = words[static_cast<std::size_t>(::optind) - 1];
+  return std::string(word.substr(0, word.find('=')));
+}
+
+// Enters the words behind a command into the options. Answers whether help is asked for.
+std::expected<bool, Failure> readWords(const Command& command, std::span<char*> words, Options& options) {
+  std::string letters = ":";  // so that a value that is missing is told from an option that is unknown
+  std::vector<::option> names;
+  for (const auto* const option : command.options) {
+    const int needsValue = option->valueName.empty() ? no_argument : required_argument;
+    // The name is a literal, which ends with a zero.
+    names.push_back({option->name.data() + 2, needsValue, nullptr, codeOf(command, *option)});
+    if (option->letter == '\0') continue;
+    letters += option->letter;
+    if (needsValue != 0) letters += ':';
   }
+  names.push_back({});
 
-  bool wantsHelp() const { return wantsHelp_; }
-  Options& options() { return options_; }
-
- private:
-  std::string_view takeWord() {
-    const std::string_view word = words_.front();
-    words_ = words_.subspan(1);
-    return word;
-  }
-
-  Result takeFile(std::string_view word) {
-    if (command_.operands == Operands::none) return unexpected("unexpected ", word);
-    options_.files.emplace_back(word);
-    return {};
-  }
-
-  Result takeOptions(std::string_view word) {
-    if (word.starts_with("--")) {
-      const auto equals = word.find('=');
-      const auto* const option = find(&OptionDescription::name, word.substr(0, equals));
-      if (option == nullptr) return unexpected("unknown option ", word.substr(0, equals));
-      if (equals == std::string_view::npos) return takeOption(*option, std::nullopt);
-      return takeOption(*option, word.substr(equals + 1));
-    }
-    for (std::size_t at = 1; at < word.size(); ++at) {
-      const auto* const option = find(&OptionDescription::letter, word[at]);
-      if (option == nullptr) return unexpected("unknown option ", word);
-      const bool isFlag = option->valueName.empty();
-      const bool isLast = isFlag || at + 1 == word.size();
-      const auto value = isLast ? std::nullopt : std::optional(word.substr(at + 1));
-      if (auto taken = takeOption(*option, value); !taken || !isFlag) return taken;
-    }
-    return {};
-  }
-
-  template <class Key>
-  const OptionDescription* find(Key OptionDescription::*key, Key value) const {
-    const auto found =
-        std::ranges::find(command_.options, value, [&](const auto* option) { return option->*key; });
-    return found != command_.options.end() ? *found : nullptr;
-  }
-
-  // With the value that stands in the option's own word, if any.
-  Result takeOption(const OptionDescription& option, std::optional<std::string_view> value) {
+  const int count = static_cast<int>(words.size());
+  const auto next = [&] {
+    return ::getopt_long(count, words.data(), letters.c_str(), names.data(), nullptr);
+  };
+  bool wantsHelp = false;
+  ::opterr = 0;  // what is wrong is said here
+  for (int code = next(); code != -1; code = next()) {
+    const int known = code == '?' || code == ':' ? ::optopt : code;
+    const auto found = std::ranges::find(command.options, known,
+                                         [&](const auto* option) { return codeOf(command, *option); });
+    if (found == command.options.end())
+      return failUnexpected(command, "unknown option", unknownOption(words));
+    const OptionDescription& option = **found;
     const std::string name(option.name);
-    if (option.valueName.empty()) {
-      if (value) return usageFailure(name + ": takes no value");
-      value.emplace();
-    }
-    if (!value && words_.empty())
-      return usageFailure(name + ": " + std::string(option.valueName) + " is missing");
-    if (!value) value = takeWord();
-    if (option.take == nullptr) {
-      wantsHelp_ = true;
-    } else if (const auto taken = option.take(options_, command_, *value); !taken) {
-      return usageFailure(name + ": " + taken.error());
-    }
-    return {};
+    if (code == '?') return usageFailure(name + ": takes no value");
+    if (code == ':') return usageFailure(name + ": " + std::string(option.valueName) + " is missing");
+    wantsHelp = wantsHelp || option.take == nullptr;
+    if (option.take == nullptr) continue;
+    const auto taken = option.take(options, command, option.valueName.empty() ? "" : ::optarg);
+    if (!taken) return usageFailure(name + ": " + taken.error());
   }
-
-  Result unexpected(std::string_view what, std::string_view word) const {
-    std::vector<std::string_view> known;
-    for (const auto* const option : command_.options) known.push_back(option->name);
-    return usageFailure(std::string(command_.name) + ": " + std::string(what) + std::string(word) +
-                        spelling::suggestion(word, known));
+  for (const char* const word : words.subspan(std::min(words.size(), static_cast<std::size_t>(::optind)))) {
+    if (command.operands == Operands::none) return failUnexpected(command, "unexpected", word);
+    options.files.emplace_back(word);
   }
-
-  const Command& command_;
-  Words words_;
-  Options options_;
-  bool isBehindOptions_ = false;
-  bool wantsHelp_ = false;
-};
+  return wantsHelp;
+}
 
 // Fills in what the command has for options that are not given. The answer says what is wrong with the options
 // together, if anything is.
@@ -143,34 +109,32 @@ std::optional<std::string> complete(const Command& command, Options& options) {
   return std::nullopt;
 }
 
-std::variant<Request, Answer, Failure> parseCommand(const Command& command, Words words) {
-  Parser parser(command, words);
-  if (const auto parsed = parser.parse(); !parsed) return parsed.error();
-  if (parser.wantsHelp()) return Answer{helpText(command, terminalWidth(STDOUT_FILENO))};
-  if (const auto reason = complete(command, parser.options()))
+std::variant<Request, Answer, Failure> parseCommand(const Command& command, std::span<char*> words) {
+  Options options;
+  const auto wantsHelp = readWords(command, words, options);
+  if (!wantsHelp) return wantsHelp.error();
+  if (*wantsHelp) return Answer{helpText(command, terminalWidth(STDOUT_FILENO))};
+  if (const auto reason = complete(command, options))
     return usageFailure(std::string(command.name) + ": " + *reason).error();
-  return Request{&command, parser.options()};
+  return Request{&command, options};
 }
 
 }  // namespace
 
-std::variant<Request, Answer, Failure> parseCommandLine(int argumentCount, const char* const* arguments) {
-  const Words words(arguments + std::min(1, argumentCount), arguments + argumentCount);
-  const std::string_view first = words.empty() ? "" : words.front();
+std::variant<Request, Answer, Failure> parseCommandLine(std::span<char*> words) {
+  const std::string_view first = words.size() < 2 ? "" : words[1];
   if (first == "-h" || first == "--help") return Answer{helpText(terminalWidth(STDOUT_FILENO))};
   if (first == "--version") return Answer{"orv " ORV_VERSION "\n"};
   // Both are for the build.
-  if (first == "--man-page" && words.size() == 2) return Answer{manPage(words[1])};
+  if (first == "--man-page" && words.size() == 3) return Answer{manPage(words[2])};
   if (first == "--bash-completion") return Answer{bashCompletion()};
 
   const auto commands = commandTable.commands;
   const auto named = std::ranges::find(commands, first, &Command::name);
   if (named != commands.end()) return parseCommand(*named, words.subspan(1));
-  const bool couldBeFile = first.empty() || first.starts_with('-') || ::access(words.front(), F_OK) == 0;
+  const bool couldBeFile = first.empty() || first.starts_with('-') || ::access(words[1], F_OK) == 0;
   if (!couldBeFile) {
-    std::vector<std::string_view> names;
-    for (const Command& command : commands) names.push_back(command.name);
-    if (const std::string suggestion = spelling::suggestion(first, names); !suggestion.empty())
+    if (const auto suggestion = spelling::suggestion(first, commands, &Command::name); !suggestion.empty())
       return usageFailure("no file and no command \"" + std::string(first) + "\"" + suggestion).error();
   }
   return parseCommand(commands.front(), words);

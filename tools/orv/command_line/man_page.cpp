@@ -1,4 +1,4 @@
-#include "tools/orv/command_line/command_line.hpp"
+#include "tools/orv/command_line/command.hpp"
 
 #include <algorithm>
 #include <cstddef>

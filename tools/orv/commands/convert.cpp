@@ -6,7 +6,7 @@
 #include <orv/spelling/base64.hpp>
 #include <orv/spelling/hex.hpp>
 #include "tools/orv/command_line/command.hpp"
-#include "tools/orv/commands/message_loop.hpp"
+#include "tools/orv/input/message_input.hpp"
 #include "tools/orv/input/text_stream.hpp"
 
 namespace orv::tool {

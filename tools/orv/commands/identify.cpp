@@ -13,7 +13,7 @@
 #include <orv/byte_view.hpp>
 #include <orv/spelling/value_text.hpp>
 #include "tools/orv/command_line/command.hpp"
-#include "tools/orv/commands/message_loop.hpp"
+#include "tools/orv/input/message_input.hpp"
 #include "tools/orv/inspect/trace.hpp"
 
 namespace orv::tool {

@@ -6,7 +6,6 @@
 #include <orv/byte_view.hpp>
 #include <orv/delimited_stream.hpp>
 #include <orv/spelling/hex.hpp>
-#include "tools/orv/input/byte_source.hpp"
 #include "tools/orv/input/text_stream.hpp"
 
 namespace orv::tool {

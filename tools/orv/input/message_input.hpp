@@ -1,4 +1,4 @@
-// Messages out of files of any format.
+// Messages out of files of any format, and the loop over files and their messages that several subcommands share.
 #pragma once
 
 #include <cstddef>
@@ -13,6 +13,7 @@
 #include "tools/orv/input/input_file.hpp"
 #include "tools/orv/messages/message_value.hpp"
 #include "tools/orv/options.hpp"
+#include "tools/orv/output/output_file.hpp"
 
 namespace orv::tool {
 
@@ -60,5 +61,22 @@ class MessageInput {
   std::string encoded_;  // of a message that came as text
   std::string_view encoding_;
 };
+
+// What a subcommand does with messages.
+class MessageWork {
+ public:
+  // Takes the message that the input stands at.
+  virtual Outcome<void> take(const MessageInput& message) = 0;
+  // A file ends in a piece that is no message.
+  virtual Outcome<void> takeEnd(const Failure&) { return {}; }
+
+ protected:
+  ~MessageWork() = default;
+};
+
+// Hands out the messages of all files, one after the other, and writes what the work left in the output. A
+// file that fails is reported, behind the output that came before, and the others go on; the first failure
+// gives the status.
+ExitStatus forEachMessage(const Options& options, OutputFile& output, MessageWork& work);
 
 }  // namespace orv::tool

@@ -24,10 +24,8 @@ std::size_t rowSize(std::size_t width) {
   return width >= narrow ? 8 : 4;
 }
 
-bool startsCharacter(char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }
-
 std::size_t columns(std::string_view text) {
-  return static_cast<std::size_t>(std::ranges::count_if(text, startsCharacter));
+  return static_cast<std::size_t>(std::ranges::count_if(text, spelling::startsCharacter));
 }
 
 // How much of the text stands in so many columns, where an ellipsis takes the place of the first character that
@@ -36,7 +34,7 @@ std::string_view fitting(std::string_view text, std::size_t room) {
   if (text.size() <= room || columns(text) <= room) return text;
   std::size_t end = 0;
   for (std::size_t started = 0; end < text.size(); ++end) {
-    if (startsCharacter(text[end]) && ++started >= room) break;
+    if (spelling::startsCharacter(text[end]) && ++started >= room) break;
   }
   return text.substr(0, end);
 }

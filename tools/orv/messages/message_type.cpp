@@ -1,9 +1,12 @@
 #include "tools/orv/messages/message_type.hpp"
 
 #include <algorithm>
+#include <charconv>
 #include <vector>
 
+#include <orv/envelope.hpp>
 #include <orv/spelling/nearest_name.hpp>
+#include <orv/wire_reader.hpp>
 
 namespace orv::tool {
 
@@ -19,6 +22,18 @@ constexpr auto types = [] {
   return list;
 }();
 
+constexpr NameMap kindNames = VessaSessionMessageType::_protobuf_nameMap();
+constexpr auto typeNumber = SessionMessage::_protobuf_nameMap().number("type");
+constexpr auto dataNumber = SessionMessage::_protobuf_nameMap().number("data");
+
+std::optional<std::int64_t> kindNumber(std::string_view kind) {
+  if (const auto number = kindNames.number(kind)) return number;
+  std::int32_t number = 0;
+  const auto [end, status] = std::from_chars(kind.data(), kind.data() + kind.size(), number);
+  if (status != std::errc() || end != kind.data() + kind.size()) return std::nullopt;
+  return number;
+}
+
 std::string_view lastWord(std::string_view name) { return name.substr(name.rfind('.') + 1); }
 
 }  // namespace
@@ -31,16 +46,15 @@ const MessageType& typeOf(const MessageDescriptor& descriptor) {
 
 std::expected<const MessageType*, std::string> findMessageType(std::string_view name) {
   std::vector<const MessageType*> sameLastWord;
-  std::vector<std::string_view> names;
   for (const MessageType& type : types) {
     if (name == type.fullName() || name == type.shortName()) return &type;
     if (name == lastWord(type.fullName())) sameLastWord.push_back(&type);
-    names.push_back(type.shortName());
   }
   if (sameLastWord.size() == 1) return sameLastWord.front();
   const std::string quoted = "\"" + std::string(name) + "\"";
   if (sameLastWord.empty()) {
-    return std::unexpected("unknown message type " + quoted + spelling::suggestion(name, names));
+    return std::unexpected("unknown message type " + quoted +
+                           spelling::suggestion(name, types, &MessageType::shortName));
   }
   std::string error = quoted + " could be ";
   for (const MessageType* type : sameLastWord) {
@@ -48,6 +62,55 @@ std::expected<const MessageType*, std::string> findMessageType(std::string_view 
     error += type->shortName();
   }
   return std::unexpected(error);
+}
+
+const MessageType* PayloadPairing::payloadOf(VessaSessionMessageType type) const {
+  if (!opens_) return nullptr;
+  if (const auto found = forKind_.find(type.rawValue()); found != forKind_.end()) return found->second;
+  if (forAll_ != nullptr) return forAll_;
+  const MessageDescriptor* const usual = envelope::payloadOf(type);
+  return usual != nullptr ? &typeOf(*usual) : nullptr;
+}
+
+std::expected<void, std::string> PayloadPairing::override(std::string_view pairing) {
+  const auto equals = pairing.find('=');
+  const auto payload =
+      findMessageType(equals == std::string_view::npos ? pairing : pairing.substr(equals + 1));
+  if (!payload) return std::unexpected(payload.error());
+  if (equals == std::string_view::npos) {
+    forAll_ = *payload;
+    return {};
+  }
+  const std::string_view kind = pairing.substr(0, equals);
+  const auto number = kindNumber(kind);
+  if (!number) {
+    return std::unexpected("unknown envelope type \"" + std::string(kind) + "\"" +
+                           spelling::suggestion(kind, kindNames.entries(), &NameMap::Entry::name));
+  }
+  forKind_[*number] = *payload;
+  return {};
+}
+
+EnvelopeOutline outlineOf(std::span<const std::byte> envelope) {
+  EnvelopeOutline outline;
+  WireReader reader(envelope);
+  while (!reader.isAtEnd()) {
+    const std::byte* const tagStart = reader.position();
+    const auto tag = reader.readTag();
+    if (!tag) break;
+    if (tag->fieldNumber() == typeNumber && tag->wireType() == WireType::varint) {
+      const auto number = reader.readVarint();
+      if (!number) break;
+      outline.type = VessaSessionMessageType(static_cast<std::int32_t>(*number));
+    } else if (tag->fieldNumber() == dataNumber && tag->wireType() == WireType::lengthDelimited) {
+      const auto body = reader.readLengthDelimited();
+      if (!body) break;
+      outline.data = *body;
+    } else if (!reader.skipValue(*tag, tagStart, 0)) {
+      break;
+    }
+  }
+  return outline;
 }
 
 }  // namespace orv::tool

@@ -14,7 +14,6 @@
 #include <orv/json/document.hpp>
 #include <orv/json/renderer.hpp>
 #include "tools/orv/messages/message_type.hpp"
-#include "tools/orv/messages/payload_pairing.hpp"
 
 namespace orv::tool {
 

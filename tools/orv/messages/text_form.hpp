@@ -6,7 +6,7 @@
 #include <string_view>
 
 #include <orv/spelling/text_position.hpp>
-#include "tools/orv/messages/payload_pairing.hpp"
+#include "tools/orv/messages/message_type.hpp"
 
 namespace orv::tool {
 

@@ -1,12 +1,11 @@
 // Hexadecimal digits.
 #pragma once
 
-#include <cstddef>
-#include <cstdint>
 #include <expected>
 #include <string>
 #include <string_view>
 
+#include <orv/internal/hex_digits.hpp>
 #include <orv/spelling/text_position.hpp>
 
 namespace orv::spelling {
@@ -14,8 +13,7 @@ namespace orv::spelling {
 // Appends two lower-case digits for each byte, with `between` between two bytes.
 void appendHex(std::string_view bytes, std::string& output, std::string_view between = {});
 
-// A number in lower-case digits, with leading zeros where it has fewer than `fewestDigits`.
-std::string hexNumber(std::uint64_t number, std::size_t fewestDigits);
+using internal::hexNumber;
 
 // Reads pairs of hexadecimal digits, with white space and "0x" between them, piece by piece.
 class HexReader {

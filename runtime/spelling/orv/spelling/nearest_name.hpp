@@ -1,19 +1,24 @@
 // What a misspelled name was probably meant to be.
 #pragma once
 
+#include <functional>
 #include <span>
 #include <string>
 #include <string_view>
-
-#include <orv/name_map.hpp>
+#include <vector>
 
 namespace orv::spelling {
 
-// The candidate that is spelled most like `name`, letter case aside; empty when none is close.
-std::string_view nearestName(std::string_view name, std::span<const std::string_view> candidates);
-
-// ` (did you mean "handle"?)` with the nearest candidate, or nothing.
+// ` (did you mean "handle"?)` with the candidate that is spelled most like `name`, letter case aside; nothing
+// when none is close.
 std::string suggestion(std::string_view name, std::span<const std::string_view> candidates);
-std::string suggestion(std::string_view name, NameMap candidates);
+
+// The same for things that have a name.
+template <class Things, class NameOf>
+std::string suggestion(std::string_view name, const Things& things, NameOf nameOf) {
+  std::vector<std::string_view> names;
+  for (const auto& thing : things) names.push_back(std::invoke(nameOf, thing));
+  return suggestion(name, names);
+}
 
 }  // namespace orv::spelling

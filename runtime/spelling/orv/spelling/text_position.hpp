@@ -3,6 +3,7 @@
 
 #include <cstddef>
 #include <string>
+#include <string_view>
 #include <utility>
 
 namespace orv::spelling {
@@ -23,6 +24,15 @@ constexpr bool isSpace(char character) {
   return character == ' ' || character == '\t' || character == '\r' || character == '\n';
 }
 
+// Whether a byte of UTF-8 is the first of its character.
+constexpr bool startsCharacter(char byte) { return (static_cast<unsigned char>(byte) & 0xC0) != 0x80; }
+
+// Where the character begins that has the byte `at`.
+constexpr std::size_t characterStart(std::string_view utf8, std::size_t at) {
+  while (at > 0 && !startsCharacter(utf8[at])) --at;
+  return at;
+}
+
 // Where the next character stands.
 class TextPosition {
  public:
@@ -30,7 +40,7 @@ class TextPosition {
     if (character == '\n') {
       ++line_;
       column_ = 1;
-    } else if ((static_cast<unsigned char>(character) & 0xC0) != 0x80) {  // not inside a character
+    } else if (startsCharacter(character)) {
       ++column_;
     }
   }
