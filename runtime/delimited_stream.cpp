@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cassert>
 #include <limits>
 #include <string_view>
 #include <vector>
@@ -126,10 +127,14 @@ DelimitedReader& DelimitedReader::operator=(DelimitedReader&&) noexcept = defaul
 DelimitedReader::~DelimitedReader() = default;
 
 std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::next() {
+  assert(source_ != nullptr && "a reader that was moved from reads nothing");
   return source_->next();
 }
 
-std::uint64_t DelimitedReader::messageOffset() const { return source_->messageOffset(); }
+std::uint64_t DelimitedReader::messageOffset() const {
+  assert(source_ != nullptr && "a reader that was moved from has no place");
+  return source_->messageOffset();
+}
 
 StreamError DelimitedReader::malformedMessage(const DecodeError& error) const {
   return {.cause = StreamError::Cause::malformedMessage,

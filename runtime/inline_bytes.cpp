@@ -16,7 +16,8 @@ using std::char_traits;
 // Copies up to objectSize bytes, which may overlap, without a call: in two pieces of a fixed size, or three.
 void copyShort(char* target, const char* source, std::size_t size) {
   const auto copyEnds = [&]<class Piece>(Piece) {
-    Piece first, last;
+    Piece first;
+    Piece last;
     std::memcpy(&first, source, sizeof first);
     std::memcpy(&last, source + size - sizeof last, sizeof last);
     std::memcpy(target, &first, sizeof first);

@@ -46,7 +46,7 @@ class BinaryDecoder : private internal::OutermostFrame, public internal::FieldRe
   template <class M, class Read>
   std::expected<void, DecodeError> readWith(M& message, Read read) {
     outermostMessage = &M::descriptor();
-    FieldReader reader = *this;
+    FieldReader reader = static_cast<const FieldReader&>(*this);
     const bool isRead = static_cast<bool>(read(message, reader));
     static_cast<FieldReader&>(*this) = reader;
     if (isRead) return {};

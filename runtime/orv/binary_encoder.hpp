@@ -70,7 +70,7 @@ class BinaryEncoder : private internal::Target, public internal::FieldWriter {
   // registers.
   template <class Walk>
   std::expected<void, EncodeError> writeWith(Walk walk) {
-    FieldWriter writer = *this;
+    FieldWriter writer = static_cast<const FieldWriter&>(*this);
     isWhole_ = false;
     if (!walk(writer)) return std::unexpected(error());
     isWhole_ = true;

@@ -61,7 +61,7 @@ class Message {
   // Reads fields into this message until the decoder has no more: values are replaced, nested messages
   // merged, lists grown. The decoder's error is returned as it was made; what was read before it stays.
   template <DecoderOf<M> D>
-  [[nodiscard, gnu::always_inline]] inline DecodeResult<D> decodeMessage(D& decoder) {
+  [[nodiscard, gnu::always_inline]] DecodeResult<D> decodeMessage(D& decoder) {
     return internal::readFields<Table<M>>(
         self(), decoder, [&]<std::size_t index>(D & at) __attribute__((always_inline)) {
           return internal::decodeRow<Table<M>, index>(self(), at);
@@ -72,7 +72,7 @@ class Message {
   // Hands the fields that are to be emitted to the visitor, in ascending order, the unknown fields last. The
   // visitor's first error ends the walk and is returned as it was made.
   template <VisitorOf<M> V>
-  [[nodiscard, gnu::always_inline]] inline VisitResult<V> traverse(V& visitor) const {
+  [[nodiscard, gnu::always_inline]] VisitResult<V> traverse(V& visitor) const {
     return internal::visitFields<Table<M>>(self(), visitor);
   }
   [[nodiscard]] std::expected<void, EncodeError> traverse(BinaryEncoder& visitor) const;

@@ -39,10 +39,15 @@ std::string unknownOption(std::span<char*> words) {
   return std::string(word.substr(0, word.find('=')));
 }
 
-// Enters the words behind a command into the options. Answers whether help is asked for.
-std::expected<bool, Failure> readWords(const Command& command, std::span<char*> words, Options& options) {
+// A command's options as getopt_long takes them.
+struct KnownOptions {
   std::string letters = ":";  // so that a value that is missing is told from an option that is unknown
   std::vector<::option> names;
+};
+
+KnownOptions optionsOf(const Command& command) {
+  KnownOptions known;
+  auto& [letters, names] = known;
   for (const auto* const option : command.options) {
     const int needsValue = option->valueName.empty() ? no_argument : required_argument;
     // The name is a literal, which ends with a zero.
@@ -52,16 +57,21 @@ std::expected<bool, Failure> readWords(const Command& command, std::span<char*> 
     if (needsValue != 0) letters += ':';
   }
   names.push_back({});
+  return known;
+}
 
+// Enters the words behind a command into the options. Answers whether help is asked for.
+std::expected<bool, Failure> readWords(const Command& command, std::span<char*> words, Options& options) {
+  const KnownOptions known = optionsOf(command);
   const int count = static_cast<int>(words.size());
   const auto next = [&] {
-    return ::getopt_long(count, words.data(), letters.c_str(), names.data(), nullptr);
+    return ::getopt_long(count, words.data(), known.letters.c_str(), known.names.data(), nullptr);
   };
   bool wantsHelp = false;
   ::opterr = 0;  // what is wrong is said here
   for (int code = next(); code != -1; code = next()) {
-    const int known = code == '?' || code == ':' ? ::optopt : code;
-    const auto found = std::ranges::find(command.options, known,
+    const int given = code == '?' || code == ':' ? ::optopt : code;
+    const auto found = std::ranges::find(command.options, given,
                                          [&](const auto* option) { return codeOf(command, *option); });
     if (found == command.options.end())
       return failUnexpected(command, "unknown option", unknownOption(words));

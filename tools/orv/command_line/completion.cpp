@@ -73,11 +73,12 @@ std::string bashCompletion() {
     for (const auto* const option : command.options) {
       words += ' ' + std::string(option->name);
       if (option->valueName.empty()) continue;
-      values += "    " + name + std::string(option->name);
-      if (option->letter != '\0') values += " | " + name + '-' + option->letter;
-      values += ") " + valuesOf(*option, command) + " ;;\n";
+      values.append("    ").append(name);
+      values += option->name;
+      if (option->letter != '\0') values.append(" | ").append(name).append("-") += option->letter;
+      values.append(") ").append(valuesOf(*option, command)).append(" ;;\n");
     }
-    options += "    " + name + ") echo" + words + " ;;\n";
+    options.append("    ").append(name).append(") echo").append(words).append(" ;;\n");
   }
   return std::string(beginning) + variable("_orv_commands", names) +
          variable("_orv_naming_types", namingTypes) + variable("_orv_general", general) +

@@ -1,6 +1,7 @@
 // A message's field table, checked, and what derives from it alone.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -94,10 +95,9 @@ class UncheckedTable {
   }
   // 19000 to 19999 are the format's own (protobuf.dev, "Assigning Field Numbers").
   static constexpr bool areNumbersValid() {
-    for (const std::uint32_t number : numbers) {
-      if (number == 0 || number >= 1U << 29 || (number >= 19000 && number <= 19999)) return false;
-    }
-    return true;
+    return std::ranges::all_of(numbers, [](std::uint32_t number) {
+      return number >= 1 && number < 1U << 29 && (number < 19000 || number > 19999);
+    });
   }
   static constexpr bool areNamesDistinct() {
     for (std::size_t at = 0; at < size; ++at) {

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <functional>
+#include <iterator>
 #include <span>
 #include <string>
 #include <string_view>
@@ -17,6 +18,7 @@ std::string suggestion(std::string_view name, std::span<const std::string_view> 
 template <class Things, class NameOf>
 std::string suggestion(std::string_view name, const Things& things, NameOf nameOf) {
   std::vector<std::string_view> names;
+  names.reserve(std::size(things));
   for (const auto& thing : things) names.push_back(std::invoke(nameOf, thing));
   return suggestion(name, names);
 }
