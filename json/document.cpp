@@ -16,6 +16,14 @@ namespace orv::json {
 
 namespace {
 
+constexpr std::size_t longestName = 64;
+
+bool isPlain(std::string_view name) {
+  return !name.empty() && name.size() <= longestName && std::ranges::all_of(name, [](char c) {
+    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_';
+  });
+}
+
 // Members in the document's order.
 using Node = nlohmann::ordered_json;
 
@@ -128,6 +136,17 @@ constexpr std::array<std::string_view, 6> kindNames{"null",     "a boolean", "a 
 const Node& nodeAt(const void* node) { return *static_cast<const Node*>(node); }
 
 }  // namespace
+
+std::string memberStep(std::string_view name) {
+  if (isPlain(name)) return "." + std::string(name);
+  if (name.size() <= longestName) return "[\"" + std::string(name) + "\"]";
+  return "[\"" + std::string(name.substr(0, spelling::characterStart(name, longestName))) + "…\"]";
+}
+
+std::string Error::message() const {
+  if (!path.empty()) return path + ": " + reason;
+  return spelling::TextError{reason, line, column}.message();
+}
 
 struct Document::Contents {
   Node root;
