@@ -9,7 +9,7 @@
 #include <orv/spelling/text_position.hpp>
 #include <orv/spelling/value_text.hpp>
 
-namespace orv::compare {
+namespace orv::inline v0::compare {
 
 namespace {
 

@@ -2,7 +2,7 @@
 
 #include <orv/instantiate.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 template class Message<envelope::Envelope<JoinRequest>>;
 template class Message<envelope::Envelope<JoinResponse>>;
@@ -12,7 +12,7 @@ template class Message<envelope::Envelope<Group>>;
 
 }  // namespace orv
 
-namespace orv::envelope {
+namespace orv::inline v0::envelope {
 
 namespace {
 

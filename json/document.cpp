@@ -12,7 +12,7 @@
 
 #include <orv/spelling/text_position.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 namespace {
 

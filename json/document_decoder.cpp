@@ -6,7 +6,7 @@
 #include <orv/spelling/base64.hpp>
 #include <orv/spelling/nearest_name.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 namespace {
 

@@ -8,7 +8,7 @@
 #include <orv/utf8.hpp>
 #include <orv/wire_reader.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 namespace {
 

@@ -10,7 +10,7 @@
 
 #include <orv/utf8.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace {
 

@@ -4,7 +4,7 @@
 #include <string_view>
 #include <vector>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // The canonical decomposition (NFD) of well-formed UTF-8, as code points. Time and memory are near-linear in
 // the length for any input, long runs of combining marks included.

@@ -10,7 +10,7 @@
 #include <string_view>
 #include <vector>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace {
 

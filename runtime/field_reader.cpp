@@ -4,7 +4,7 @@
 
 #include <orv/utf8.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // Outside the fast path what is wrong is found by a WireReader, which says it.
 

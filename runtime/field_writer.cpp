@@ -1,6 +1,6 @@
 #include <orv/internal/field_writer.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 namespace {
 

@@ -3,7 +3,7 @@
 #define XXH_INLINE_ALL
 #include <xxhash.h>
 
-namespace orv {
+namespace orv::inline v0 {
 
 void Hasher::combine(std::uint64_t value) { state_ = XXH3_64bits_withSeed(&value, sizeof value, state_); }
 

@@ -6,7 +6,7 @@
 #include <new>
 #include <string>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 namespace {
 

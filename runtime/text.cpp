@@ -7,7 +7,7 @@
 #include <orv/utf8.hpp>
 #include "canonical.hpp"
 
-namespace orv {
+namespace orv::inline v0 {
 
 Text::Text(std::string_view utf8) {
   std::size_t wellFormed = utf8::wellFormedPrefix(utf8);

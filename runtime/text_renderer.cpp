@@ -8,7 +8,7 @@
 
 #include <orv/internal/hex_digits.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace {
 

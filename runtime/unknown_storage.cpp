@@ -4,7 +4,7 @@
 #include <cstring>
 #include <new>
 
-namespace orv {
+namespace orv::inline v0 {
 
 std::expected<UnknownStorage, DecodeError> UnknownStorage::checked(std::span<const std::byte> records) {
   UnknownStorage storage;

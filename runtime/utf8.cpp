@@ -3,7 +3,7 @@
 #include <bit>
 #include <cstring>
 
-namespace orv::utf8 {
+namespace orv::inline v0::utf8 {
 
 Step step(std::string_view text) {
   const auto byteAt = [&](std::size_t at) { return static_cast<unsigned char>(text[at]); };

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <array>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace {
 

@@ -8,7 +8,7 @@
 
 #include <orv/compare/leaf.hpp>
 
-namespace orv::compare {
+namespace orv::inline v0::compare {
 
 // One value that is not the same in both messages.
 struct Difference {

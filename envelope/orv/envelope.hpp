@@ -19,7 +19,7 @@
 #include <orv/join_response.hpp>
 #include <orv/session_message.hpp>
 
-namespace orv::envelope {
+namespace orv::inline v0::envelope {
 
 // An envelope of this type carries a P.
 template <class P>

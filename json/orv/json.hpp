@@ -12,7 +12,7 @@
 #include <orv/json/error.hpp>
 #include <orv/json/renderer.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 // The message as one JSON object, without a line end. What the binary encoding leaves out is left out here:
 // absent fields, empty lists, fields with implicit presence at their default.

@@ -2,7 +2,7 @@
 
 #include <orv/instantiate.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 template class Message<JoinRequest>;
 template class Message<JoinRequest::Content>;

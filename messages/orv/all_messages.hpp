@@ -9,7 +9,7 @@
 #include <orv/member.hpp>
 #include <orv/session_message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A list of types, to run one piece of code over all of them:
 //

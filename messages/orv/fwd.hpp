@@ -1,7 +1,7 @@
 // Declarations of what the library's headers define.
 #pragma once
 
-namespace orv {
+namespace orv::inline v0 {
 
 class Text;
 class ByteBuffer;

@@ -11,7 +11,7 @@
 #include <orv/decoder.hpp>
 #include <orv/text.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Has Derived read each value that is no message, the elements of a list one by one:
 //

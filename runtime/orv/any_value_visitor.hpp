@@ -13,7 +13,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Hands each value that is no message to Derived, the elements of a list one by one:
 //

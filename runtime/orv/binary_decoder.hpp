@@ -9,7 +9,7 @@
 #include <orv/decode_error.hpp>
 #include <orv/internal/field_reader.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Reads one message from bytes that lie in one stretch of memory and outlive the decoder:
 //

@@ -13,7 +13,7 @@
 #include <orv/encode_error.hpp>
 #include <orv/internal/field_writer.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A visitor that writes what it is handed, in one pass:
 //

@@ -5,7 +5,7 @@
 #include <span>
 #include <string_view>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Both views are valid as long as the one they are made of.
 inline std::span<const std::byte> bytesOf(std::string_view characters) {

@@ -8,7 +8,7 @@
 
 #include <orv/decode_error.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // What a BinaryDecoder asks when a oneof member arrives while its group already holds a case. It is asked,
 // too, when the record of the case that is held has another wire type and changes nothing. It refers to a

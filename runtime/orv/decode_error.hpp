@@ -10,7 +10,7 @@
 
 #include <orv/descriptor.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // What can be wrong with bytes.
 enum class DecodeCause : std::uint8_t {

@@ -11,7 +11,7 @@
 #include <orv/internal/seam.hpp>
 #include <orv/text.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // What every read of a decoder answers: nothing, or the decoder's own error.
 template <class D>

@@ -15,7 +15,7 @@
 #include <orv/decode_error.hpp>
 #include <orv/encode_error.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Fills the front of a buffer from a file, a socket or the like. Answers how many bytes it put there, 0 at
 // the end of the stream, and a negative number when reading failed. It may give fewer bytes than there is

@@ -8,7 +8,7 @@
 
 #include <orv/name_map.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // How a field is kept.
 enum class FieldKind : std::uint8_t {

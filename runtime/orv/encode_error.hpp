@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <string_view>
 
-namespace orv {
+namespace orv::inline v0 {
 
 enum class EncodeError : std::uint8_t {
   bufferTooSmall,  // the caller's buffer cannot hold the encoding

@@ -12,7 +12,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A visitor that feeds each field's number and value, and the unknown fields, into a hasher.
 class HashVisitor {

@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <string_view>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Feeds bytes and numbers to XXH3 (xxhash.com), each step seeded with the result of the one before. Results
 // hold inside one process only: they are neither stored nor sent. A seed of one's own makes them hard to

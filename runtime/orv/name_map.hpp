@@ -6,7 +6,7 @@
 #include <span>
 #include <string_view>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Names by number: field numbers of a message, raw values of an enumeration. Every name is of the kind
 // `same`: the text name is the JSON name too. A map is a view of a table that lasts as long as the program.

@@ -12,7 +12,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A visitor that adds up what BinaryEncoder would write.
 class SizeCounter {

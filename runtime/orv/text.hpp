@@ -10,7 +10,7 @@
 #include <orv/hasher.hpp>
 #include <orv/internal/inline_bytes.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace internal {
 class FieldReader;

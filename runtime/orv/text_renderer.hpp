@@ -12,7 +12,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format"), a field a line.
 // Unknown fields are written by number; one that is length-delimited and reads as a sequence of records is

@@ -11,7 +11,7 @@
 #include <orv/internal/seam.hpp>
 #include <orv/wire_reader.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace internal {
 class FieldReader;

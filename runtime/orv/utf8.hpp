@@ -8,7 +8,7 @@
 
 #include <orv/internal/inline_bytes.hpp>
 
-namespace orv::utf8 {
+namespace orv::inline v0::utf8 {
 
 // What stands at the start of a text: a code point, or the longest start of an ill-formed one.
 struct Step {

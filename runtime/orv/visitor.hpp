@@ -11,7 +11,7 @@
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // What every visit answers: nothing, or the visitor's own error, which ends the walk.
 template <class V>

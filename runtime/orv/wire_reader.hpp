@@ -8,7 +8,7 @@
 
 #include <orv/decode_error.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace internal {
 

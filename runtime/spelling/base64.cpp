@@ -4,7 +4,7 @@
 #include <cstddef>
 #include <cstdint>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 namespace {
 

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 namespace {
 

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <cstddef>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 namespace {
 

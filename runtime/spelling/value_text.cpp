@@ -3,7 +3,7 @@
 #include <orv/spelling/hex.hpp>
 #include <orv/utf8.hpp>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 namespace {
 

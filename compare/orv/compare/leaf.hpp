@@ -17,7 +17,7 @@
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 
-namespace orv::compare {
+namespace orv::inline v0::compare {
 
 // A field on the way from the outermost message to a value. Unknown fields come last, as one field that is a
 // list.

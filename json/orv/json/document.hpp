@@ -10,7 +10,7 @@
 
 #include <orv/json/error.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 // A view of one value of a document, valid as long as the document.
 class Value {

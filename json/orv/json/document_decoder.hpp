@@ -17,7 +17,7 @@
 #include <orv/name_map.hpp>
 #include <orv/text.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 // A decoder over one JSON object: its members are the fields, found by their text names. A member that is
 // null counts as absent. It reads strictly: what the message does not define, or cannot hold, is an error

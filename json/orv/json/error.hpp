@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 // The error of everything that reads JSON.
 struct Error {

@@ -12,7 +12,7 @@
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 
-namespace orv::json {
+namespace orv::inline v0::json {
 
 struct RenderOptions {
   // A member a line; otherwise the whole document is one line.

@@ -8,7 +8,7 @@
 
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A device asks a host to connect it.
 class ConnectionRequest final : public Message<ConnectionRequest> {

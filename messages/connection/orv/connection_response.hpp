@@ -10,7 +10,7 @@
 #include <orv/empty_message.hpp>
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // The host's answer to a ConnectionRequest. It has no fields and gives its parts their names: the answer is a
 // Content, which is encoded as a message of its own.

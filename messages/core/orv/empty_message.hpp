@@ -6,7 +6,7 @@
 
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // The base of a message without fields. It keeps unknown fields as any message does.
 template <class M>

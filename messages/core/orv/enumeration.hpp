@@ -11,7 +11,7 @@
 #include <orv/hasher.hpp>
 #include <orv/name_map.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // An open enumeration: named cases with fixed raw values, and any other 64-bit raw value as UNRECOGNIZED. Two
 // values are equal when their raw values are, so UNRECOGNIZED with a named case's raw value is that case. On

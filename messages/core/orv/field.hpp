@@ -6,7 +6,7 @@
 
 #include <orv/internal/field_traits.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // The type of its storage says how a field is kept:
 //

@@ -24,7 +24,7 @@
 #include <orv/size_counter.hpp>
 #include <orv/text_renderer.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 namespace internal {
 

@@ -22,7 +22,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 class BinaryDecoder;
 class BinaryEncoder;

@@ -11,7 +11,7 @@
 #include <orv/enumeration.hpp>
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // The kind of the payload that a SessionMessage carries.
 class VessaSessionMessageType final : public Enumeration<VessaSessionMessageType> {

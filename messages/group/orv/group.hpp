@@ -11,7 +11,7 @@
 #include <orv/member.hpp>
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // One event of a group's membership. Every event names the group by its UUID, whose bytes are not looked
 // into.

@@ -8,7 +8,7 @@
 
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // Someone who belongs to a group.
 class Member final : public Message<Member> {

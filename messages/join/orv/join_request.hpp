@@ -8,7 +8,7 @@
 
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // A device asks the host of a session to let it join. Both fields are opaque bytes of any length.
 class JoinRequest final : public Message<JoinRequest> {

@@ -11,7 +11,7 @@
 #include <orv/empty_message.hpp>
 #include <orv/message.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 // The host's answer to a JoinRequest, as opaque bytes.
 class JoinResponse final : public Message<JoinResponse> {

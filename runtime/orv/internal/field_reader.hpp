@@ -25,7 +25,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/wire_reader.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // Where a message stands that is being read. It is written once a message and read where an error is put
 // together, or a hook asked.

@@ -22,7 +22,7 @@
 #include <orv/unknown_storage.hpp>
 #include <orv/wire_reader.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // Where an encoding goes.
 struct Target {

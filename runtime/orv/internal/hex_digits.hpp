@@ -8,7 +8,7 @@
 #include <string>
 #include <string_view>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 inline constexpr std::string_view hexDigits = "0123456789abcdef";
 

@@ -13,7 +13,7 @@
 #include <type_traits>
 #include <utility>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // Eight bytes, which need not be aligned.
 inline std::uint64_t wordAt(const void* bytes) {

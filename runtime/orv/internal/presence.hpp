@@ -6,7 +6,7 @@
 #include <optional>
 #include <variant>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // The value for change in place; an absent one becomes present with its default.
 template <class T>

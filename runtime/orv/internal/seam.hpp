@@ -7,7 +7,7 @@
 
 #include <orv/name_map.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // What the operations of a decoder or visitor answer: its own Result where it names one, which then can
 // do what std::expected<void, Error> can.

@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <expected>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // The error of such a step, an empty sign: what was wrong stands elsewhere, once. Why these are not
 // std::expected: docs/decisions/error-sign.md.

@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // How many bytes a varint takes: one for each seven bits up to the highest that is set. 9/64 is a seventh
 // rounded up, and exact for up to 64 bits.

@@ -13,7 +13,7 @@
 #include <orv/descriptor.hpp>
 #include <orv/text.hpp>
 
-namespace orv {
+namespace orv::inline v0 {
 
 template <class M>
 class Message;
@@ -22,7 +22,7 @@ class Enumeration;
 
 }  // namespace orv
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 template <class T>
 concept IsMessage = std::derived_from<T, Message<T>>;

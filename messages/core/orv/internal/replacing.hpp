@@ -10,7 +10,7 @@
 #include <orv/internal/field_traits.hpp>
 #include <orv/internal/rules.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // Reads a message of any type in place of one: what a reader is given to read a nested message by.
 struct Replace {

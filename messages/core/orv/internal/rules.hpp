@@ -16,7 +16,7 @@
 #include <orv/internal/table.hpp>
 #include <orv/visitor.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 template <class Next>
 [[gnu::always_inline]] inline bool isAtField(const Next& next) {

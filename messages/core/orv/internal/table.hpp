@@ -15,7 +15,7 @@
 #include <orv/internal/field_traits.hpp>
 #include <orv/name_map.hpp>
 
-namespace orv::internal {
+namespace orv::inline v0::internal {
 
 // M's table as it stands. `Rows` hands it out: the table is private, and M lets its base see it.
 template <class M, class Rows>

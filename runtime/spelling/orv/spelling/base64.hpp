@@ -8,7 +8,7 @@
 
 #include <orv/spelling/text_position.hpp>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 // Appends the standard alphabet's form, padded.
 void appendBase64(std::string_view bytes, std::string& output);

@@ -8,7 +8,7 @@
 #include <orv/internal/hex_digits.hpp>
 #include <orv/spelling/text_position.hpp>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 // Appends two lower-case digits for each byte, with `between` between two bytes.
 void appendHex(std::string_view bytes, std::string& output, std::string_view between = {});

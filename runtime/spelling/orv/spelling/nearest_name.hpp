@@ -8,7 +8,7 @@
 #include <string_view>
 #include <vector>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 // ` (did you mean "handle"?)` with the candidate that is spelled most like `name`, letter case aside; nothing
 // when none is close.

@@ -6,7 +6,7 @@
 #include <string_view>
 #include <utility>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 // Why a text cannot be read, and where; lines and columns count from 1.
 struct TextError {

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-namespace orv::spelling {
+namespace orv::inline v0::spelling {
 
 // Whether the bytes are well-formed text without control characters.
 bool isReadable(std::string_view bytes);
