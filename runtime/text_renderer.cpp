@@ -1,18 +1,17 @@
 #include <orv/text_renderer.hpp>
 
-#include <google/protobuf/io/coded_stream.h>
-
 #include <algorithm>
 #include <array>
-#include <limits>
+#include <optional>
+#include <span>
 
+#include <orv/byte_view.hpp>
 #include <orv/internal/hex_digits.hpp>
+#include <orv/wire_reader.hpp>
 
 namespace orv::inline v0 {
 
 namespace {
-
-using google::protobuf::io::CodedInputStream;
 
 // What the official printer allows (its kUnknownFieldRecursionLimit).
 constexpr int unknownLevels = 10;
@@ -55,56 +54,91 @@ char* writeEscaped(std::string_view bytes, char* target) {
   return target;
 }
 
-template <class Number>
-std::string hexadecimal(Number value) {
-  return "0x" + internal::hexNumber(value, 2 * sizeof value);
-}
+// Reads records as the official printer does, which takes more than the strict reader: tags and lengths of up to
+// ten bytes, of which the low 32 bits count.
+class LenientReader {
+ public:
+  explicit LenientReader(std::span<const std::byte> bytes) : reader_(bytes) {}
+
+  bool isAtEnd() const { return reader_.isAtEnd(); }
+
+  // A field's tag, or 0 if there is none.
+  Tag readTag() {
+    const Tag tag{static_cast<std::uint32_t>(readVarint().value_or(0))};
+    return tag.fieldNumber() == 0 ? Tag{0} : tag;
+  }
+  std::optional<std::uint64_t> readVarint() { return valueOf(reader_.readVarint()); }
+  std::optional<std::uint64_t> readFixed64() { return valueOf(reader_.readFixed64()); }
+  std::optional<std::uint64_t> readFixed32() { return valueOf(reader_.readFixed32()); }
+  std::optional<std::span<const std::byte>> readLengthDelimited() {
+    const auto length = static_cast<std::uint32_t>(readVarint().value_or(unreadable));
+    if (length > reader_.remaining() || length >= unreadable) return std::nullopt;
+    const std::span body(reader_.position(), length);
+    reader_ = WireReader({body.data() + length, reader_.remaining() - length});
+    return body;
+  }
+
+ private:
+  static constexpr std::uint32_t unreadable = std::uint32_t{1}
+                                              << 31;  // also the first length that is too large
+
+  template <class Number>
+  static std::optional<std::uint64_t> valueOf(const WireResult<Number>& result) {
+    return result ? std::optional<std::uint64_t>(*result) : std::nullopt;
+  }
+
+  WireReader reader_;
+};
 
 }  // namespace
 
-// Unknown fields, read as the official printer reads them. Whether the bytes of a length-delimited one are
-// shown as a message is decided by libprotobuf's reader, which takes more than ours: only so is the text the
-// same.
+// Unknown fields, in the words of the official printer, which also decides as here whether the bytes of a
+// length-delimited one are shown as a message.
 class TextRenderer::UnknownFieldsRenderer {
  public:
   explicit UnknownFieldsRenderer(TextRenderer& renderer) : renderer_(renderer) {}
 
-  // Writes record after record up to the end of the input or of a group. False if one cannot be read.
-  bool renderRecords(CodedInputStream& input, int levelsLeft) {
-    for (;;) {
-      const std::uint32_t tag = input.ReadTag();
-      if (tag == 0 || wireTypeOf(tag) == WireType::endGroup) return true;
-      if (tag >> 3 == 0 || !renderValue(input, tag, levelsLeft)) return false;
+  // How deep records may still be shown: as messages, and in groups.
+  struct Levels {
+    int messages;
+    int groups;
+  };
+
+  // Writes record after record up to the end of the input, or of the group that `start` began. False if that
+  // end is not reached.
+  bool renderRecords(LenientReader& input, Levels left, std::optional<Tag> start = std::nullopt) {
+    while (!input.isAtEnd()) {
+      const Tag tag = input.readTag();
+      if (tag.wireType() == WireType::endGroup) return start && tag.fieldNumber() == start->fieldNumber();
+      if (tag.value == 0 || !renderValue(input, tag, left)) return false;
     }
+    return !start;
   }
 
  private:
-  static WireType wireTypeOf(std::uint32_t tag) { return Tag{tag}.wireType(); }
-
   // Always by number, also where the message has a name for it that belongs to another wire type.
-  bool renderValue(CodedInputStream& input, std::uint32_t tag, int levelsLeft) {
-    const std::string name = std::to_string(tag >> 3);
-    std::uint64_t wide = 0;
-    std::uint32_t narrow = 0;
-    switch (wireTypeOf(tag)) {
-      case WireType::varint: return input.ReadVarint64(&wide) && renderer_.plain(name, std::to_string(wide));
-      case WireType::fixed64:
-        return input.ReadLittleEndian64(&wide) && renderer_.plain(name, hexadecimal(wide));
-      case WireType::fixed32:
-        return input.ReadLittleEndian32(&narrow) && renderer_.plain(name, hexadecimal(narrow));
+  bool renderValue(LenientReader& input, Tag tag, Levels left) {
+    const std::string name = std::to_string(tag.fieldNumber());
+    const auto number = [&](std::optional<std::uint64_t> value, std::size_t hexDigits) {
+      return value && renderer_.plain(name, hexDigits == 0 ? std::to_string(*value)
+                                                           : "0x" + internal::hexNumber(*value, hexDigits));
+    };
+    switch (tag.wireType()) {
+      case WireType::varint: return number(input.readVarint(), 0);
+      case WireType::fixed64: return number(input.readFixed64(), 16);
+      case WireType::fixed32: return number(input.readFixed32(), 8);
       case WireType::lengthDelimited: {
-        std::string body;
-        if (!input.ReadVarint32(&narrow) || !input.ReadString(&body, static_cast<int>(narrow))) return false;
-        if (!renderAsMessage(name, body, levelsLeft)) (void)renderer_.quoted(name, body);
+        const auto body = input.readLengthDelimited();
+        if (!body) return false;
+        if (!renderAsMessage(name, *body, left.messages)) (void)renderer_.quoted(name, charactersOf(*body));
         return true;
       }
       case WireType::startGroup: {
-        if (!input.IncrementRecursionDepth()) return false;
+        if (left.groups == 0) return false;
         renderer_.open(name);
-        const bool isRead = renderRecords(input, levelsLeft - 1);
+        const bool isWhole = renderRecords(input, {left.messages - 1, left.groups - 1}, tag);
         renderer_.close();
-        input.DecrementRecursionDepth();
-        return isRead && input.LastTagWas((tag & ~7U) | static_cast<std::uint32_t>(WireType::endGroup));
+        return isWhole;
       }
       case WireType::endGroup: break;
     }
@@ -112,13 +146,12 @@ class TextRenderer::UnknownFieldsRenderer {
   }
 
   // Takes back what it wrote if the bytes turn out not to be a message.
-  bool renderAsMessage(std::string_view name, const std::string& body, int levelsLeft) {
+  bool renderAsMessage(std::string_view name, std::span<const std::byte> body, int levelsLeft) {
     if (body.empty() || levelsLeft <= 0) return false;
-    CodedInputStream input(reinterpret_cast<const std::uint8_t*>(body.data()), static_cast<int>(body.size()));
-    input.SetRecursionLimit(levelsLeft);
+    LenientReader input(body);
     const std::size_t sizeBefore = renderer_.output_.size();
     renderer_.open(name);
-    const bool isMessage = renderRecords(input, levelsLeft - 1) && input.ConsumedEntireMessage();
+    const bool isMessage = renderRecords(input, {levelsLeft - 1, levelsLeft});
     renderer_.close();
     if (!isMessage) renderer_.output_.resize(sizeBefore);
     return isMessage;
@@ -176,15 +209,8 @@ void TextRenderer::appendQuoted(std::string_view bytes) {
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
   UnknownFieldsRenderer renderer(*this);
   for (const UnknownField& field : unknownFields) {
-    // The library counts in an int. Only a group can be a larger record.
-    if (field.record.size() > std::numeric_limits<int>::max()) {
-      (void)quoted(std::to_string(field.tag.fieldNumber()),
-                   {reinterpret_cast<const char*>(field.value.data()), field.value.size()});
-      continue;
-    }
-    CodedInputStream input(reinterpret_cast<const std::uint8_t*>(field.record.data()),
-                           static_cast<int>(field.record.size()));
-    (void)renderer.renderRecords(input, unknownLevels);
+    LenientReader input(field.record);
+    (void)renderer.renderRecords(input, {unknownLevels, internal::maximumNesting});
   }
   return {};
 }

@@ -130,22 +130,33 @@ TEST(Differential, DescribesAsTheOfficialCodeDoes) {
 }
 
 TEST(Differential, ShowsUnknownFieldsAsTheOfficialCodeDoes) {
+  const auto compareUnknown = [](const std::string& body) {
+    const std::string input = record(20, body) + hex("A3 01") + record(3, body) + hex("A4 01");
+    const auto official = newOfficial("orv.Member");
+    ASSERT_TRUE(official->ParseFromString(input));
+    EXPECT_EQ(messageNamed("orv.Member").parse(input).value()->debugDescription(), official->DebugString())
+        << toHex(input);
+  };
   // Bodies that may or may not be taken for messages.
   std::string nested = hex("08 01");
   std::string groups = hex("08 01");
   for (int level = 0; level < 14; ++level) {
     nested = record(3, nested);
     groups = hex("1B") + groups + hex("1C");
-    for (const std::string& body :
-         {nested, groups, hex("88 00 05"), hex("88 80 80 80 00 05"), hex("88 80*8 00 05"),
-          hex("0A 80 80 80 80 10 08 01"), hex("0A 82 00 08 01"), hex("08 FF*9 7F"), hex("0D 01 02 03"),
-          hex("1C"), hex("00"), hex("0E 00")}) {
-      const std::string input = record(20, body) + hex("A3 01") + record(3, body) + hex("A4 01");
-      const auto official = newOfficial("orv.Member");
-      ASSERT_TRUE(official->ParseFromString(input));
-      EXPECT_EQ(messageNamed("orv.Member").parse(input).value()->debugDescription(), official->DebugString())
-          << toHex(input);
-    }
+    compareUnknown(nested);
+    compareUnknown(groups);
+  }
+  for (const std::string_view body :
+       {"88 00 05", "88 80 80 80 00 05", "88 80*8 00 05", "0A 80 80 80 80 10 08 01", "0A 82 00 08 01",
+        "08 FF*9 7F", "0D 01 02 03", "1C", "00", "0E 00"}) {
+    compareUnknown(hex(body));
+  }
+  constexpr std::string_view bytes("\x08\x0A\x0B\x0C\x0D\x09\x00\x01\x02\x04\x80\xFF\x10\x13\x14\x03", 16);
+  Random random;
+  for (std::size_t round = Random::rounds(20'000); round > 0 && !HasFailure(); --round) {
+    std::string body;
+    for (std::size_t size = random.below(14); size > 0; --size) body += bytes[random.below(bytes.size())];
+    compareUnknown(body);
   }
 }
 
