@@ -1,5 +1,7 @@
 #include <orv/spelling/value_text.hpp>
 
+#include <utf8proc.h>
+
 #include <orv/spelling/hex.hpp>
 #include <orv/utf8.hpp>
 
@@ -7,9 +9,19 @@ namespace orv::inline v0::spelling {
 
 namespace {
 
+// Whether a terminal shows the character, in its place, and does nothing else. Not so controls, line
+// separators, what turns the direction of writing, and what is not seen (Unicode's Default_Ignorable_Code_Point).
 bool isShown(const utf8::Step& step) {
-  const bool isControl = step.codePoint < 0x20 || (step.codePoint >= 0x7F && step.codePoint < 0xA0);
-  return step.isWellFormed && !isControl;
+  if (!step.isWellFormed) return false;
+  if (step.codePoint < 0x7F) return step.codePoint >= 0x20;
+  const auto& property = *utf8proc_get_property(static_cast<utf8proc_int32_t>(step.codePoint));
+  switch (property.category) {
+    case UTF8PROC_CATEGORY_CC:
+    case UTF8PROC_CATEGORY_CF:
+    case UTF8PROC_CATEGORY_ZL:
+    case UTF8PROC_CATEGORY_ZP: return false;
+    default: return !property.ignorable;
+  }
 }
 
 // What stands at the start of the text, as it is or in escapes. Answers how many bytes it takes.

@@ -44,9 +44,8 @@ inline std::unexpected<Failure> failWithErrno(std::string_view file) {
   return fail(ExitStatus::fileError, std::string(file) + ": " + std::strerror(cause));
 }
 
-// Prints the failure's line, if it has any, on standard error. Control characters and ill-formed text in it,
-// which come from file names and from input, are made visible, so that it is one line and leaves the terminal
-// alone.
+// Prints the failure's line, if it has any, on standard error. What file names and input bring into it is
+// escaped, so that it is one line and leaves the terminal alone.
 inline void report(const Failure& failure) {
   if (failure.line.empty()) return;
   const std::string line = spelling::printable(failure.line) + '\n';

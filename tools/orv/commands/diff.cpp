@@ -7,6 +7,7 @@
 #include <utility>
 
 #include <orv/compare.hpp>
+#include <orv/spelling/value_text.hpp>
 #include "tools/orv/command_line/command.hpp"
 #include "tools/orv/input/message_input.hpp"
 #include "tools/orv/output/output_file.hpp"
@@ -59,9 +60,9 @@ class Comparison {
     if (options_.isQuiet) return {};
     std::string lines;
     if (isFirst) {
-      palette_.append(lines, Palette::Colour::removed, "--- " + options_.files[0]);
+      palette_.append(lines, Palette::Colour::removed, "--- " + spelling::printable(options_.files[0]));
       lines += '\n';
-      palette_.append(lines, Palette::Colour::added, "+++ " + options_.files[1]);
+      palette_.append(lines, Palette::Colour::added, "+++ " + spelling::printable(options_.files[1]));
       lines += '\n';
     }
     std::string place;

@@ -141,7 +141,7 @@ class Identification final : public MessageWork {
     const auto ranked = rankTypes(bytesOf(message.encoding()));
     if (!ranked) return std::unexpected(message.failureOf(ranked.error()));
     std::string text = message.frame().number > 1 ? "\n" : "";
-    if (options_.files.size() > 1) text += message.path() + ":\n";
+    if (options_.files.size() > 1) text += spelling::printable(message.path()) + ":\n";
     if (options_.isDelimited) text += "message " + std::to_string(message.frame().number) + ":\n";
     return output_.write(text + describe(*ranked));
   }

@@ -184,7 +184,7 @@ class Inspection final : public MessageWork {
   Outcome<void> takeEnd(const Failure& failure) override {
     if (failure.status != ExitStatus::malformed) return {};
     std::string line;
-    layout_.appendError(line, failure.line);
+    layout_.appendError(line, spelling::printable(failure.line));
     return output_.write(line);
   }
 
@@ -193,7 +193,7 @@ class Inspection final : public MessageWork {
 
   std::string heading(const MessageInput& message) const {
     std::string text;
-    if (options_.files.size() > 1) text += message.path() + ": ";
+    if (options_.files.size() > 1) text += spelling::printable(message.path()) + ": ";
     if (options_.isDelimited) text += "message " + std::to_string(message.frame().number) + ": ";
     text += options_.type->fullName();
     return text + ", " + std::to_string(message.encoding().size()) + " bytes";

@@ -7,10 +7,11 @@
 
 namespace orv::inline v0::spelling {
 
-// Whether the bytes are well-formed text without control characters.
+// Whether the bytes are well-formed text that a terminal shows as it is: without controls, without characters
+// that turn the direction of writing or are not seen.
 bool isReadable(std::string_view bytes);
 
-// The text on one line: control characters and ill-formed bytes become \x escapes.
+// Text from outside for people, on one line: what is not readable in it becomes \x escapes, byte by byte.
 std::string printable(std::string_view text);
 
 // Text in quotes on one line, with C escapes for what cannot be shown; cut where it is long, and then with
