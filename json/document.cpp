@@ -6,6 +6,7 @@
 #include <cmath>
 #include <limits>
 #include <nlohmann/json.hpp>
+#include <span>
 #include <unordered_set>
 #include <utility>
 #include <vector>
@@ -16,7 +17,7 @@ namespace orv::inline v0::json {
 
 namespace {
 
-constexpr std::size_t longestName = 64;
+constexpr std::size_t longestName = 60;
 
 bool isPlain(std::string_view name) {
   return !name.empty() && name.size() <= longestName && std::ranges::all_of(name, [](char c) {
@@ -27,17 +28,56 @@ bool isPlain(std::string_view name) {
 // Members in the document's order.
 using Node = nlohmann::ordered_json;
 
-// The library's sentence without its prefix, which ends with the position, and without the token that was
-// read, which may be as long as the input.
-std::string reasonOf(std::string_view what) {
-  if (const auto prefix = what.find(": "); prefix != std::string_view::npos) what.remove_prefix(prefix + 2);
-  std::string reason(what);
-  constexpr std::size_t longestToken = 40;
-  const auto token = reason.find("; last read: '");
-  if (token == std::string::npos) return reason;
-  const auto end = reason.rfind('\'');
-  if (end - token > longestToken) reason.erase(token, end + 1 - token);
-  return reason;
+// Phrases of the library's sentences, and what is said in their place.
+struct Phrase {
+  std::string_view library;
+  std::string_view ours;
+};
+
+// What is wrong with a word, a number or a string.
+constexpr Phrase mistakes[] = {
+    {"number overflow", "a number too large for a double"},
+    {"invalid number", "no number"},
+    {"ill-formed UTF-8", "ill-formed UTF-8"},
+    {"missing closing quote", "a string without its closing quotation mark"},
+    {"control character", "a control character in a string, which must be escaped"},
+    {"surrogate", "half a surrogate pair"},
+    {"'\\u' must be", "\\u without its four hexadecimal digits"},
+    {"forbidden character after backslash", "an escape that JSON does not have"},
+};
+
+// What the parser was at. What stands there is of another kind.
+constexpr Phrase expectations[] = {
+    {"; expected end of input", "expected the end"},
+    {"parsing object key", "expected a name in quotation marks"},
+    {"parsing object separator", "expected \":\""},
+    {"parsing object", "expected \",\" or \"}\""},
+    {"parsing array", "expected \",\" or \"]\""},
+    {"parsing value", "expected a value"},
+};
+
+constexpr Phrase findings[] = {
+    {"unexpected end of input", "the end"}, {"unexpected string", "a string"},
+    {"unexpected number", "a number"},      {"unexpected true", "true"},
+    {"unexpected false", "false"},          {"unexpected null", "null"},
+    {"invalid literal", "another word"},
+};
+
+std::optional<std::string> find(std::span<const Phrase> phrases, std::string_view sentence) {
+  const auto isIn = [&](const Phrase& phrase) { return sentence.find(phrase.library) != sentence.npos; };
+  const auto found = std::ranges::find_if(phrases, isIn);
+  return found == phrases.end() ? std::nullopt : std::optional(std::string(found->ours));
+}
+
+// The reason in our words: the library's sentence repeats what it read, however long that is. `at` is the
+// character at which the text goes wrong.
+std::string reasonOf(std::string_view sentence, char at) {
+  constexpr std::size_t longest = 200;  // what is repeated comes behind
+  sentence = sentence.substr(0, longest);
+  if (at == '\0') return "a NUL character";
+  if (const auto mistake = find(mistakes, sentence)) return *mistake;
+  const std::string found = find(findings, sentence).value_or(std::string("\"") + at + '"');
+  return find(expectations, sentence).value_or("expected JSON") + ", found " + found;
 }
 
 // Builds a document from the parser's events. The library's own builder would keep one of two members of the
@@ -67,12 +107,20 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
     return innermost.names.insert(std::move(name)).second || fail("the object has this member twice");
   }
   // The position counts the bytes that were read, the offending one included.
-  bool parse_error(std::size_t position, const std::string&,
+  bool parse_error(std::size_t position, const std::string& token,
                    const nlohmann::detail::exception& cause) override {
+    constexpr int numberOverflow = 406;
+    const std::size_t length = cause.id == numberOverflow ? token.size() : 1;
+    const std::size_t at = position < length ? 0 : position - length;
+    return failAt(at, reasonOf(cause.what(), at < text_.size() ? text_[at] : ' '));
+  }
+
+  // About the text; answers false.
+  bool failAt(std::size_t offset, std::string reason) {
     spelling::TextPosition place;
-    for (std::size_t at = 0; at + 1 < std::min(position, text_.size()); ++at) place.advance(text_[at]);
-    const auto [reason, line, column] = place.error(reasonOf(cause.what()));
-    error_ = Error{.reason = reason, .path = {}, .line = line, .column = column};
+    for (const char character : text_.substr(0, offset)) place.advance(character);
+    const spelling::TextError error = place.error(std::move(reason));
+    error_ = Error{.reason = error.reason, .path = {}, .line = error.line, .column = error.column};
     return false;
   }
 
@@ -119,6 +167,9 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
       const std::size_t finished = step.node->size() - (&step == &open_.back() ? 0 : 1);
       path += step.node->is_array() ? '[' + std::to_string(finished) + ']' : memberStep(step.memberName);
     }
+    constexpr std::size_t longestPath = 4 * longestName;
+    if (path.size() > longestPath)
+      path.replace(1, spelling::characterStart(path, path.size() - longestPath) - 1, "…");
     error_ = Error{.reason = std::move(reason), .path = std::move(path)};
     return false;
   }
@@ -162,6 +213,9 @@ Value Document::root() const { return Value(&contents_->root); }
 std::expected<Document, Error> Document::parse(std::string_view text) {
   DocumentBuilder builder(text);
   Node::sax_parse(text.begin(), text.end(), &builder);
+  // The library takes a NUL for the end.
+  if (const auto nul = text.find('\0'); nul != std::string_view::npos && !builder.error().has_value())
+    builder.failAt(nul, reasonOf({}, '\0'));
   if (builder.error().has_value()) return std::unexpected(*builder.error());
   return Document(std::make_unique<Contents>(builder.takeRoot()));
 }

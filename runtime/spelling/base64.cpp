@@ -63,6 +63,7 @@ std::optional<std::string> decodeBase64(std::string_view text) {
 std::expected<void, TextError> Base64Reader::take(std::string_view piece, std::string& bytes) {
   for (const char character : piece) {
     if (!isSpace(character)) {
+      if (isPadded_) return std::unexpected(position_.error("more behind the padding, which ends a message"));
       if (group_.empty()) groupStart_ = position_;
       group_ += character;
     }
@@ -78,6 +79,7 @@ std::expected<void, TextError> Base64Reader::finish(std::string& bytes) {
   const auto decoded = decodeBase64(group_);
   if (!decoded) return std::unexpected(groupStart_.error("no base64 digits"));
   bytes += *decoded;
+  isPadded_ = runs_ == Runs::one && group_.ends_with('=');
   group_.clear();
   return {};
 }

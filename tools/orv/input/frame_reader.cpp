@@ -16,7 +16,7 @@ namespace {
 class WholeInput final : public FrameReader {
  public:
   WholeInput(InputFile& file, Format format, std::size_t maximumSize)
-      : FrameReader(file.name(), maximumSize), source_(file, format) {}
+      : FrameReader(file.name(), maximumSize), source_(file, format, /*isStream=*/false) {}
 
   Outcome<std::optional<Frame>> next() override {
     if (std::exchange(isRead_, true)) return std::nullopt;
@@ -43,7 +43,7 @@ class DelimitedInput final : public FrameReader {
  public:
   DelimitedInput(InputFile& file, Format format, std::size_t maximumSize)
       : FrameReader(file.name(), maximumSize),
-        source_(file, format),
+        source_(file, format, /*isStream=*/true),
         reader_([this](std::span<std::byte> buffer) { return source_.read(buffer); }, maximumSize) {}
 
   Outcome<std::optional<Frame>> next() override {

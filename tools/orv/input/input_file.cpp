@@ -56,9 +56,11 @@ std::ptrdiff_t InputFile::readDescriptor(std::span<std::byte> buffer) const {
   }
 }
 
-ByteSource::ByteSource(InputFile& file, Format format) : file_(file) {
+ByteSource::ByteSource(InputFile& file, Format format, bool isStream) : file_(file) {
+  using Runs = spelling::Base64Reader::Runs;
   if (format == Format::hex) spelling_.emplace<spelling::HexReader>();
-  if (format == Format::base64) spelling_.emplace<spelling::Base64Reader>();
+  if (format == Format::base64)
+    spelling_.emplace<spelling::Base64Reader>(isStream ? Runs::several : Runs::one);
 }
 
 std::ptrdiff_t ByteSource::read(std::span<std::byte> buffer) {

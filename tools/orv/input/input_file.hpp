@@ -48,8 +48,8 @@ class InputFile {
 // Reads a file in one of the formats that spell bytes.
 class ByteSource {
  public:
-  // The file must outlive the source.
-  ByteSource(InputFile& file, Format format);
+  // The file must outlive the source. In a stream padded runs of base64 follow one another.
+  ByteSource(InputFile& file, Format format, bool isStream);
 
   // As InputFile::read; after a negative answer failure() says what was wrong.
   std::ptrdiff_t read(std::span<std::byte> buffer);

@@ -17,9 +17,14 @@ void appendBase64(std::string_view bytes, std::string& output);
 // base64.
 std::optional<std::string> decodeBase64(std::string_view text);
 
-// Reads base64 with white space in it, piece by piece; padded runs may follow one another.
+// Reads base64 with white space in it, piece by piece.
 class Base64Reader {
  public:
+  // Padding ends a run. What follows it is an error, or another run.
+  enum class Runs : bool { one, several };
+
+  explicit Base64Reader(Runs runs = Runs::one) : runs_(runs) {}
+
   // Appends the bytes that the piece completes.
   std::expected<void, TextError> take(std::string_view piece, std::string& bytes);
   // There is no more: appends what is left.
@@ -29,6 +34,8 @@ class Base64Reader {
   TextPosition position_;
   TextPosition groupStart_;
   std::string group_;  // up to four digits
+  Runs runs_;
+  bool isPadded_ = false;  // nothing may follow
 };
 
 }  // namespace orv::spelling
