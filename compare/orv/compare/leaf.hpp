@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <tuple>
@@ -14,6 +15,7 @@
 
 #include <orv/any_value_visitor.hpp>
 #include <orv/byte_buffer.hpp>
+#include <orv/compare/alignment.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 
@@ -34,8 +36,10 @@ struct Step {
   friend bool operator==(const Step& left, const Step& right) { return (left <=> right) == 0; }
 };
 
-// A present message, whatever it holds.
+// A present message of this type, whatever it holds.
 struct MessagePresence {
+  std::string_view type;
+
   friend bool operator==(MessagePresence, MessagePresence) = default;
 };
 
@@ -62,8 +66,18 @@ struct Leaf {
 
   // "data.initialize.members[1].handle"
   std::string path() const;
+  // Whether a path leads here, or to a message that this is in. One without an index stands for all items.
+  bool isAt(std::string_view path) const;
   bool isIn(const Leaf& message) const;
 };
+
+// Of leaves that are one message, or one item of a list whose place has `depth` steps. Equal ones have equal contents;
+// those of the same fields and kinds have the same shape.
+AlignmentKey keyOf(std::span<const Leaf> leaves, std::size_t depth = 0);
+
+// What a value holds, on a line that is cut where it is long: `{handle: "ann"}`. The first leaf is the value, the
+// others are in it.
+std::string summaryOf(std::span<const Leaf> value);
 
 // A visitor that lists the leaves of what it walks, in ascending order of their places; a message stands
 // before what is in it.
@@ -87,7 +101,7 @@ class LeafCollector : public AnyValueVisitor<LeafCollector> {
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    enter(number, MessagePresence());
+    enter(number, MessagePresence{M::protoMessageName});
     (void)walkNested(message);
     place_.pop_back();
     return {};

@@ -35,7 +35,7 @@ class Comparison {
     if (!left) return std::unexpected(left.error());
     const auto right = after.message();
     if (!right) return std::unexpected(right.error());
-    for (const Difference& difference : (*left)->differencesTo(**right)) {
+    for (const Difference& difference : compare::differencesOfLeaves((*left)->leaves(), (*right)->leaves())) {
       if (auto told = tell(before, difference); !told) return told;
     }
     if (!options_.comparesEncodings || before.encoding() == after.encoding()) return {};

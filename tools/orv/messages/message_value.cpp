@@ -23,11 +23,6 @@ class TypedValue final : public MessageValue {
   std::string text() const override { return message_.debugDescription(); }
   std::string json(json::RenderOptions options) const override { return json::render(message_, options); }
   std::expected<std::string, EncodeError> serialize() const override { return message_.serialize(); }
-  std::vector<compare::Difference> differencesTo(const MessageValue& other) const override {
-    const auto* const same = dynamic_cast<const TypedValue*>(&other);
-    return same != nullptr ? compare::differences(message_, same->message_)
-                           : compare::differencesOfLeaves(leaves(), other.leaves());
-  }
   std::vector<compare::Leaf> leaves() const override { return compare::LeafCollector::collect(message_); }
 
  private:

@@ -25,8 +25,6 @@ class MessageValue {
   virtual std::string text() const = 0;
   virtual std::string json(json::RenderOptions options) const = 0;
   virtual std::expected<std::string, EncodeError> serialize() const = 0;
-  // Where the other message differs from this one; it may be of another type, or opened otherwise.
-  virtual std::vector<compare::Difference> differencesTo(const MessageValue& other) const = 0;
   virtual std::vector<compare::Leaf> leaves() const = 0;
 };
 
