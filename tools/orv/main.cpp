@@ -4,7 +4,6 @@
 
 #include <csignal>
 #include <new>
-#include <optional>
 #include <span>
 #include <variant>
 
@@ -27,7 +26,7 @@ ExitStatus runCommandLine(std::span<char*> words) {
   const auto parsed = parseCommandLine(words);
   if (const auto* const request = std::get_if<Request>(&parsed))
     return request->command->run(request->options);
-  if (const auto* const answer = std::get_if<Answer>(&parsed)) return writeWhole(std::nullopt, answer->text);
+  if (const auto* const answer = std::get_if<Answer>(&parsed)) return writeWhole(answer->text);
   report(std::get<Failure>(parsed));
   return std::get<Failure>(parsed).status;
 }

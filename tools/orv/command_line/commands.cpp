@@ -135,7 +135,7 @@ constexpr auto inspectOptions =
 constexpr auto diffOptions =
     list(type, payload, noUnwrap, from, delimited, bytes, quiet, colour, maximumSize, output, help);
 constexpr auto identifyOptions = list(from, delimited, maximumSize, output, help);
-constexpr auto printingOptions = list(output, help);
+constexpr auto printingOptions = list(help);
 
 constexpr std::array allFormats{Format::binary, Format::hex, Format::base64, Format::text, Format::json};
 constexpr auto byteFormats = std::span(allFormats).first<3>();
@@ -166,7 +166,7 @@ constexpr Example identifyExamples[] = {
     {"orv identify payload.bin", "the types that these bytes could be"},
 };
 constexpr Example typesExamples[] = {{"orv types Group", "the fields of one type"}};
-constexpr Example schemaExamples[] = {{"orv schema -o orv.proto", "a file for protoc"}};
+constexpr Example schemaExamples[] = {{"orv schema > orv.proto", "a file for protoc"}};
 
 constexpr Command commands[] = {
     {.name = "decode",

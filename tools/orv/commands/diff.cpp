@@ -92,10 +92,11 @@ class Comparison {
   bool hasFoundDifferences_ = false;
 };
 
-Outcome<void> compareFiles(const Options& options, Comparison& comparison, Progress& progress) {
-  const auto before = MessageInput::open(options.files[0], options);
+Outcome<void> compareFiles(const Options& options, OutputFile& output, Comparison& comparison,
+                           Progress& progress) {
+  const auto before = MessageInput::open(options.files[0], options, output);
   if (!before) return std::unexpected(before.error());
-  const auto after = MessageInput::open(options.files[1], options);
+  const auto after = MessageInput::open(options.files[1], options, output);
   if (!after) return std::unexpected(after.error());
   MessageInput& left = **before;
   MessageInput& right = **after;
@@ -125,7 +126,7 @@ ExitStatus runDiff(const Options& options) {
   OutputFile output(options.output);
   Comparison comparison(options, output);
   Progress progress(output.isTerminal());
-  auto outcome = compareFiles(options, comparison, progress);
+  auto outcome = compareFiles(options, output, comparison, progress);
   progress.clear();
   if (auto flushed = outcome ? output.finish() : output.flush(); !flushed) outcome = flushed;
   if (!outcome) {

@@ -76,9 +76,9 @@ ExitStatus runTypes(const Options& options) {
     if (!text.empty()) text += '\n';
     text += describe(*type);
   }
-  return writeWhole(options.output, text);
+  return writeWhole(text);
 }
 
-ExitStatus runSchema(const Options& options) { return writeWhole(options.output, schema()); }
+ExitStatus runSchema(const Options&) { return writeWhole(schema()); }
 
 }  // namespace orv::tool

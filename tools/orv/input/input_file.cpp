@@ -1,6 +1,7 @@
 #include "tools/orv/input/input_file.hpp"
 
 #include <fcntl.h>
+#include <poll.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -12,16 +13,18 @@
 
 namespace orv::tool {
 
-Outcome<InputFile> InputFile::open(const std::string& path) {
-  if (path == "-") return InputFile("standard input", STDIN_FILENO);
+Outcome<InputFile> InputFile::open(const std::string& path, OutputFile& output) {
+  if (path == "-") return InputFile("standard input", STDIN_FILENO, output);
   const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
   if (descriptor < 0) return failWithErrno(path);
-  return InputFile(path, descriptor);
+  return InputFile(path, descriptor, output);
 }
 
 InputFile::InputFile(InputFile&& other) noexcept
     : name_(std::move(other.name_)),
       descriptor_(std::exchange(other.descriptor_, STDIN_FILENO)),
+      output_(other.output_),
+      failure_(std::move(other.failure_)),
       lookedAt_(std::move(other.lookedAt_)) {}
 
 InputFile::~InputFile() {
@@ -49,10 +52,20 @@ std::optional<char> InputFile::firstVisibleCharacter() {
   }
 }
 
-std::ptrdiff_t InputFile::readDescriptor(std::span<std::byte> buffer) const {
+std::ptrdiff_t InputFile::readDescriptor(std::span<std::byte> buffer) {
+  pollfd source{.fd = descriptor_, .events = POLLIN, .revents = 0};
+  if (::poll(&source, 1, 0) == 0) {
+    if (auto written = output_.flush(); !written) {
+      failure_ = std::move(written.error());
+      return -1;
+    }
+  }
   for (;;) {
     const ssize_t count = ::read(descriptor_, buffer.data(), buffer.size());
-    if (count >= 0 || errno != EINTR) return count;
+    if (count >= 0) return count;
+    if (errno == EINTR) continue;
+    failure_ = failWithErrno(name_).error();
+    return -1;
   }
 }
 
@@ -66,7 +79,7 @@ ByteSource::ByteSource(InputFile& file, Format format, bool isStream) : file_(fi
 std::ptrdiff_t ByteSource::read(std::span<std::byte> buffer) {
   if (!std::holds_alternative<std::monostate>(spelling_)) return readSpelled(buffer);
   const std::ptrdiff_t count = file_.read(buffer);
-  if (count < 0) failure_ = failWithErrno(file_.name()).error();
+  if (count < 0) failure_ = file_.failure();
   return count;
 }
 
@@ -78,7 +91,7 @@ std::ptrdiff_t ByteSource::readSpelled(std::span<std::byte> buffer) {
     const std::ptrdiff_t count = file_.read(piece);
     isAtEnd_ = count <= 0;
     if (count < 0) {
-      failure_ = failWithErrno(file_.name()).error();
+      failure_ = file_.failure();
       continue;
     }
     const std::string_view characters = charactersOf(std::span(piece).first(static_cast<std::size_t>(count)));

@@ -13,13 +13,16 @@
 #include <orv/spelling/hex.hpp>
 #include "tools/orv/failure.hpp"
 #include "tools/orv/options.hpp"
+#include "tools/orv/output/output_file.hpp"
 
 namespace orv::tool {
 
-// A file, or standard input for "-", read from its beginning to its end.
+// A file, or standard input for "-", read from its beginning to its end. Whenever more of it is waited for, what
+// was made of it so far is written.
 class InputFile {
  public:
-  [[nodiscard]] static Outcome<InputFile> open(const std::string& path);
+  // The output must outlive the file.
+  [[nodiscard]] static Outcome<InputFile> open(const std::string& path, OutputFile& output);
 
   InputFile(InputFile&& other) noexcept;
   InputFile& operator=(InputFile&&) = delete;
@@ -28,20 +31,23 @@ class InputFile {
   // As errors name it.
   const std::string& name() const { return name_; }
 
-  // Answers how many bytes it put into the buffer, 0 at the end, a negative number and errno when reading
-  // failed.
+  // Answers how many bytes it put into the buffer, 0 at the end, and a negative number after a failure.
   std::ptrdiff_t read(std::span<std::byte> buffer);
+  const Failure& failure() const { return *failure_; }
 
   // The first character that is no white space, which stays to be read; none if there is none near the
   // beginning.
   std::optional<char> firstVisibleCharacter();
 
  private:
-  InputFile(std::string name, int descriptor) : name_(std::move(name)), descriptor_(descriptor) {}
-  std::ptrdiff_t readDescriptor(std::span<std::byte> buffer) const;
+  InputFile(std::string name, int descriptor, OutputFile& output)
+      : name_(std::move(name)), descriptor_(descriptor), output_(output) {}
+  std::ptrdiff_t readDescriptor(std::span<std::byte> buffer);
 
   std::string name_;
   int descriptor_;
+  OutputFile& output_;
+  std::optional<Failure> failure_;
   std::string lookedAt_;  // what was read to look at it
 };
 

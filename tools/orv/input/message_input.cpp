@@ -19,10 +19,9 @@ Format guessFormat(InputFile& file) {
 
 Outcome<void> takeMessages(const std::string& path, const Options& options, OutputFile& output,
                            MessageWork& work, Progress& progress) {
-  const auto opened = MessageInput::open(path, options);
+  const auto opened = MessageInput::open(path, options, output);
   if (!opened) return std::unexpected(opened.error());
   MessageInput& input = **opened;
-  const bool isTerminal = output.isTerminal();
   for (;;) {
     const auto hasNext = input.next();
     if (!hasNext) {
@@ -31,9 +30,6 @@ Outcome<void> takeMessages(const std::string& path, const Options& options, Outp
     }
     if (!*hasNext) return {};
     if (auto taken = work.take(input); !taken) return taken;
-    if (isTerminal) {
-      if (auto flushed = output.flush(); !flushed) return flushed;
-    }
     progress.update(input.frame().number, input.frame().offset);
   }
 }
@@ -47,8 +43,9 @@ MessageInput::MessageInput(InputFile file, const std::string& path, const Option
       format_(options.from ? *options.from : guessFormat(file_)),
       reader_(FrameReader::make(file_, format_, options)) {}
 
-Outcome<std::unique_ptr<MessageInput>> MessageInput::open(const std::string& path, const Options& options) {
-  auto file = InputFile::open(path);
+Outcome<std::unique_ptr<MessageInput>> MessageInput::open(const std::string& path, const Options& options,
+                                                          OutputFile& output) {
+  auto file = InputFile::open(path, output);
   if (!file) return std::unexpected(std::move(file.error()));
   return std::unique_ptr<MessageInput>(new MessageInput(std::move(*file), path, options));
 }

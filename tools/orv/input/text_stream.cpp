@@ -77,7 +77,7 @@ Outcome<bool> TextStream::readLine(std::string& line) {
     if (buffer_.size() > maximumSize()) return failTooLarge(frame_);
     std::byte piece[65536];
     const std::ptrdiff_t count = file_.read(piece);
-    if (count < 0) return failWithErrno(file_.name());
+    if (count < 0) return std::unexpected(file_.failure());
     if (count == 0) {
       line = buffer_;
       break;
