@@ -7,7 +7,7 @@ import struct
 import subprocess
 import sys
 
-from tool import SKIPPED, delimited, expect, in_scratch_directory, record
+from tool import SKIPPED, delimited, expect, in_scratch_directory, record, run
 
 DISSECTOR = os.path.abspath(sys.argv[2])
 TREE = os.path.realpath(os.path.join(os.path.dirname(__file__), "../.."))
@@ -43,6 +43,7 @@ ENVELOPES = [
         "usesToken = true",
     ),
     (bytes.fromhex("10 09") + record(3, b"\xff"), "type 9", None, "data"),
+    (bytes.fromhex("10 FF FF FF FF FF FF FF FF FF 01"), "type -1", None, "type = -1"),
 ]
 
 
@@ -140,16 +141,32 @@ def test():
         capture("tcp.pcap", [tcp(1 + start, stream[start : start + size]) for start in segments])
         check("tcp.pcap")
 
-    # What is no envelope is marked, and disturbs nothing.
-    junk = [b"\xff" * 6, bytes.fromhex("1A FF FF FF FF 0F"), bytes.fromhex("10 05 1A 05 12 17"), b""]
-    capture("junk.pcap", [udp(payload) for payload in junk] + [tcp(1, b"\xff" * 20)])
-    expect(
-        "junk: information",
-        names("junk.pcap"),
-        ["no type", "no type (malformed)", "groupMessage (malformed)"],
-    )
+    damage(envelopes)
+
+
+def damage(envelopes):
+    """What is malformed to the command is marked, and disturbs nothing."""
+    damaged = [bytes.fromhex("0B 0B 0C 0C"), bytes.fromhex("0B"), b"\xff" * 6, bytes.fromhex("1A FF FF FF FF 0F")]
+    for envelope in (envelopes[0], envelopes[4], record(3, record(1, record(2, record(1, b"a\xc3\xa9")))) + b"\x10\x05"):
+        damaged += [envelope[:size] for size in range(1, len(envelope))]
+        for at in range(len(envelope)):
+            damaged += [envelope[:at] + byte + envelope[at + 1 :] for byte in (b"\x00", b"\x0b", b"\x80", b"\xff")]
+    malformed = [number for number, message in enumerate(damaged, 1) if run(stdin=message).returncode != 0]
+    capture("damaged.pcap", [udp(message) for message in damaged])
+    marked = dissected("damaged.pcap", "-Y", "orv.malformed", "-T", "fields", "-e", "frame.number")
+    expect("marked as malformed", [int(number) for number in marked.split()], malformed)
+    shown = dissected("damaged.pcap", "-Y", "orv.malformed", "-T", "fields", "-e", "_ws.col.Info").splitlines()
+    expect("malformed in the column", [name for name in shown if not name.endswith(" (malformed)")], [])
+
+    capture("junk.pcap", [udp(b""), tcp(1, b"\xff" * 20)])
     marked = dissected("junk.pcap", "-Y", "orv.malformed", "-T", "fields", "-e", "frame.number")
-    expect("junk: marked as malformed", marked.split(), ["2", "3", "5"])
+    expect("junk: marked as malformed", marked.split(), ["2"])
+    capture("place.pcap", [udp(bytes.fromhex("08 01 10 05 1A 05 12 17 0A 01 61"))])
+    expect(
+        "the place of what is malformed",
+        "Malformed: byte 6 of the envelope: field 2 runs past the end" in dissected("place.pcap", "-V"),
+        True,
+    )
 
 
 if shutil.which("tshark") is None:

@@ -1,12 +1,14 @@
 -- Wireshark: dissects the messages of the invitation protocol, with Wireshark's own Protocol Buffers
 -- dissector and the schema proto/orv.proto. A UDP datagram holds one envelope, a TCP stream envelopes behind
--- their lengths as varints. docs/wireshark.md says how to set it up. The build puts the table KINDS before it.
+-- their lengths as varints. docs/wireshark.md says how to set it up. The build puts the tables KINDS and MESSAGES
+-- before it.
 
 local ENVELOPE = "orv.SessionMessage"
 
 local TYPE_FIELD, DATA_FIELD = 2, 3
-local VARINT, FIXED64, LENGTH_DELIMITED, FIXED32 = 0, 1, 2, 5
+local VARINT, FIXED64, LENGTH_DELIMITED, START_GROUP, END_GROUP, FIXED32 = 0, 1, 2, 3, 4, 5
 local LONGEST_LENGTH = 5
+local MOST_NESTING = 100
 local TCP = 2 -- as in pinfo.port_type
 
 local kind_names = {}
@@ -16,58 +18,103 @@ end
 
 local orv = Proto("orv", "Invitation protocol")
 orv.fields.length = ProtoField.uint32("orv.length", "Length of the envelope")
-orv.fields.type = ProtoField.uint32("orv.type", "Type of the envelope", base.DEC, kind_names)
+orv.fields.type = ProtoField.int32("orv.type", "Type of the envelope", base.DEC, kind_names)
 orv.fields.payload = ProtoField.string("orv.payload", "Payload message")
 orv.experts.malformed =
-  ProtoExpert.new("orv.malformed", "Not an envelope", expert.group.MALFORMED, expert.severity.ERROR)
+  ProtoExpert.new("orv.malformed", "Malformed", expert.group.MALFORMED, expert.severity.ERROR)
 orv.prefs.udp = Pref.range("UDP ports", "", "Ports whose datagrams hold one envelope each", 65535)
 orv.prefs.tcp = Pref.range("TCP ports", "", "Ports whose streams hold envelopes behind their lengths", 65535)
 
 local protobuf = Dissector.get("protobuf")
 
--- The varint at the offset and the offset behind it; nothing if the bytes end in it, or if it is longer than
--- `longest`.
-local function read_varint(tvb, offset, longest)
+-- The varint at the offset and the offset behind it; nothing if it does not end before the limit, or is longer than
+-- `longest`. Of a long one the first five bytes are read, which hold more than 32 bits.
+local function read_varint(tvb, offset, limit, longest)
   local value, factor = 0, 1
-  for at = offset, math.min(offset + longest, tvb:len()) - 1 do
+  for at = offset, math.min(offset + longest, limit) - 1 do
     local byte = tvb(at, 1):uint()
-    value = value + (byte % 128) * factor
+    if at < offset + 5 then
+      value = value + (byte % 128) * factor
+      factor = factor * 128
+    end
     if byte < 128 then
       return value, at + 1
     end
-    factor = factor * 128
   end
 end
 
--- The kind of an envelope: the last of its type fields. Nothing if it has none, or if it is malformed.
-local function kind_of(tvb)
-  local number
-  local offset = 0
-  while offset < tvb:len() do
+local function fail(offset, reason)
+  error({ offset = offset, reason = reason }, 0)
+end
+
+-- Fails unless a message, or the group of this number, is well-formed from the offset to the limit; the offset behind
+-- it. `fields` says which fields are messages or texts. `see` is called with each number and value, and where the value
+-- ends.
+local function walk(tvb, offset, limit, fields, nesting, group, see)
+  while offset < limit do
+    local start = offset
     local tag, value
-    tag, offset = read_varint(tvb, offset, 5)
-    if not tag then
-      return number
+    tag, offset = read_varint(tvb, offset, limit, 5)
+    if not tag or tag < 8 or tag >= 2 ^ 32 then
+      fail(start, "malformed tag")
     end
-    local wire_type = tag % 8
+    local number, wire_type = math.floor(tag / 8), tag % 8
     if wire_type == VARINT then
-      value, offset = read_varint(tvb, offset, 10)
-      if math.floor(tag / 8) == TYPE_FIELD then
-        number = value
-      end
+      value, offset = read_varint(tvb, offset, limit, 10)
     elseif wire_type == LENGTH_DELIMITED then
-      value, offset = read_varint(tvb, offset, LONGEST_LENGTH)
+      value, offset = read_varint(tvb, offset, limit, LONGEST_LENGTH)
       offset = offset and offset + value
     elseif wire_type == FIXED32 then
       offset = offset + 4
     elseif wire_type == FIXED64 then
       offset = offset + 8
+    elseif wire_type == START_GROUP and nesting < MOST_NESTING then
+      offset = walk(tvb, offset, limit, {}, nesting + 1, number)
+    elseif wire_type == END_GROUP and number == group then
+      return offset
     else
-      return number
+      fail(start, "wire type " .. wire_type .. " where none can be")
     end
-    if not offset then
-      return number
+    if not offset or offset > limit then
+      fail(start, "field " .. number .. " runs past the end")
     end
+    local kind = wire_type == LENGTH_DELIMITED and fields[number]
+    if kind == "string" and value > 0 then
+      local text = tvb(offset - value, value)
+      if text:string(ENC_UTF_8) ~= text:raw() then
+        fail(start, "ill-formed UTF-8 in field " .. number)
+      end
+    elseif kind and kind ~= "string" then
+      walk(tvb, offset - value, offset, MESSAGES[kind], nesting + 1)
+    end
+    if see then
+      see(number, wire_type, value, offset)
+    end
+  end
+  if group then
+    fail(limit - 1, "group without its end")
+  end
+  return offset
+end
+
+-- The type of an envelope, which is the last of its type fields, if it has one; and what is wrong with the envelope or
+-- with its payload, the last of its data fields, if anything is.
+local function look_into(tvb)
+  local number, data_start, data_end
+  local fine, fault = pcall(walk, tvb, 0, tvb:len(), MESSAGES[ENVELOPE], 0, nil, function(field, wire_type, value, stop)
+    if field == TYPE_FIELD and wire_type == VARINT then
+      number = value % 2 ^ 32
+      number = number < 2 ^ 31 and number or number - 2 ^ 32
+    elseif field == DATA_FIELD and wire_type == LENGTH_DELIMITED then
+      data_start, data_end = stop - value, stop
+    end
+  end)
+  local payload = (KINDS[number] or {}).payload
+  if fine and payload and data_start then
+    fine, fault = pcall(walk, tvb, data_start, data_end, MESSAGES[payload], 0)
+  end
+  if not fine then
+    return number, fault
   end
   return number
 end
@@ -80,17 +127,19 @@ function payload.dissector(tvb, pinfo, tree)
     return 0
   end
   pinfo.private["pb_msg_type"] = "message," .. name
-  return protobuf:call(tvb, pinfo, tree)
+  -- It raises an error where the bytes end too early, which look_into has found.
+  pcall(Dissector.call, protobuf, tvb, pinfo, tree)
+  return tvb:len()
 end
 DissectorTable.get("protobuf_field"):add(ENVELOPE .. ".data", payload)
 
 local function dissect_envelope(tvb, pinfo, tree)
   local branch = tree:add(orv, tvb())
-  local number = kind_of(tvb)
+  local number, fault = look_into(tvb)
   local kind = KINDS[number] or {}
-  local name = kind.name or (number and "type " .. tostring(number)) or "no type"
+  local name = kind.name or (number and string.format("type %d", number)) or "no type"
   branch:append_text(": " .. name)
-  if number and number <= 0xFFFFFFFF then
+  if number then
     branch:add(orv.fields.type, number):set_generated()
   end
   if kind.payload then
@@ -99,9 +148,10 @@ local function dissect_envelope(tvb, pinfo, tree)
   end
   pinfo.private["orv_payload"] = kind.payload or ""
   pinfo.private["pb_msg_type"] = "message," .. ENVELOPE
-  -- It raises an error where the bytes end too early.
-  if not pcall(Dissector.call, protobuf, tvb, pinfo, branch) then
-    branch:add_proto_expert_info(orv.experts.malformed)
+  pcall(Dissector.call, protobuf, tvb, pinfo, branch)
+  if fault then
+    local reason = string.format("Malformed: byte %d of the envelope: %s", fault.offset, fault.reason)
+    branch:add_tvb_expert_info(orv.experts.malformed, tvb(fault.offset), reason)
     name = name .. " (malformed)"
   end
   return name
@@ -112,7 +162,7 @@ local function dissect_stream(tvb, pinfo, tree)
   local names = {}
   local offset = 0
   while offset < tvb:len() do
-    local length, start = read_varint(tvb, offset, LONGEST_LENGTH)
+    local length, start = read_varint(tvb, offset, tvb:len(), LONGEST_LENGTH)
     if not length or start + length > tvb:len() then
       if not length and tvb:len() - offset >= LONGEST_LENGTH then
         tree:add_proto_expert_info(orv.experts.malformed, "Length of more than five bytes")
