@@ -38,12 +38,22 @@ def completion(helps):
         for option, formats in re.findall(r"(--from|--to) FORMAT\s+[^:]*:([^-]*)", text):
             listed = set(re.findall(r"\b(binary|hex|base64|text|json)\b", formats))
             expect(f"completion of {name} {option}", completed(COMMAND, name, option, ""), listed)
+            expect(f"completion of {name} {option}=", completed(COMMAND, name, option, "="), listed)
+            first = min(listed)
+            expect(
+                f"completion of {name} {option}={first}", completed(COMMAND, name, option, "=", first), {first}
+            )
     expect("completion without a command", completed(COMMAND, "--"), options(helps["decode"]) | {"--version"})
     expect(
         "completion of types", completed(COMMAND, "types", "JoinReq"), {"JoinRequest", "JoinRequest.Content"}
     )
     expect("completion of a type", completed(COMMAND, "-t", "Memb"), {"Member"})
-    expect("completion of a payload", completed(COMMAND, "--payload", "joinRequest", "=", "Memb"), {"Member"})
+    payload = "the type of a payload"
+    expect(payload, completed(COMMAND, "--payload", "joinRequest", "=", "Memb"), {"Member"})
+    expect(payload, completed(COMMAND, "--payload", "=", "joinRequest", "=", "Memb"), {"Member"})
+    expect("completion of a kind", completed(COMMAND, "--payload", "join"), {"joinRequest=", "joinResponse="})
+    expect("completion of a kind", completed(COMMAND, "--payload", "=", "group"), {"groupMessage="})
+    expect("completion of a command to tell more of", completed(COMMAND, "help", ""), set(helps))
 
 
 def man_page(helps):
@@ -90,8 +100,11 @@ def test():
     helps = commands()
     expect("help of no command", run("-h").stdout, run("--help").stdout)
     expect("version", run("--version").stdout.decode().split()[0], "orv")
+    expect("version, in short", run("-V").stdout, run("--version").stdout)
+    expect("help without a command", run("help").stdout, run("--help").stdout)
     for name, text in helps.items():
         longest = max(len(line) for line in text.splitlines() if not line.startswith("  echo"))
+        expect(f"help on {name}", run("help", name).stdout.decode(), text)
         expect(f"help of {name} fits 80 columns", longest <= 80, True)
     completion(helps)
     man_page(helps)

@@ -37,7 +37,7 @@ struct Options {
   // members.
   std::size_t maximumSize = std::size_t{16} << 20;
   ColourChoice colour = ColourChoice::automatic;
-  std::vector<std::string> files;  // or the names of message types, for the command types
+  std::vector<std::string> files;  // or the names of message types or of a command, for types and help
   std::optional<std::string> output;
 };
 

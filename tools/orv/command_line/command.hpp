@@ -44,7 +44,7 @@ struct Example {
 };
 
 // What stands behind the options.
-enum class Operands : std::uint8_t { none, files, twoFiles, types };
+enum class Operands : std::uint8_t { none, files, twoFiles, types, command };
 
 struct Command {
   std::string_view name;
@@ -82,6 +82,9 @@ ExitStatus runDiff(const Options& options);
 ExitStatus runIdentify(const Options& options);
 ExitStatus runTypes(const Options& options);
 ExitStatus runSchema(const Options& options);
+ExitStatus runHelp(const Options& options);
+
+const Command* findCommand(std::string_view name);
 
 // "binary (default), hex, base64"
 std::string listed(const FormatChoice& formats);

@@ -91,21 +91,36 @@ std::expected<bool, Failure> readWords(const Command& command, std::span<char*> 
   return wantsHelp;
 }
 
+// Says which of the options changes nothing, if one does.
+std::optional<std::string> withoutEffect(const Options& options) {
+  const PayloadPairing& payloads = options.payloads;
+  if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
+  if (!payloads.isClosed() && !payloads.hasOverrides()) return std::nullopt;
+  if (payloads.isClosed() && payloads.hasOverrides())
+    return "--no-unwrap leaves nothing for --payload to open";
+  const std::string given = payloads.isClosed() ? "--no-unwrap" : "--payload";
+  if (!options.type->isEnvelope())
+    return given + " is for envelopes: " + std::string(options.type->fullName()) + " has no payload";
+  if (options.from && isBytes(*options.from) && options.to && isBytes(*options.to))
+    return given + " changes nothing where bytes stay bytes";
+  return std::nullopt;
+}
+
 // Fills in what the command has for options that are not given. The answer says what is wrong with the options
 // together, if anything is.
 std::optional<std::string> complete(const Command& command, Options& options) {
   if (!options.from) options.from = command.from.byDefault;
   if (!options.to) options.to = command.to.byDefault;
-  const auto isMissing = [](const FormatChoice& choice, std::optional<Format> given) {
-    return !choice.allowed.empty() && !choice.isGuessed && !given;
-  };
-  if (isMissing(command.from, options.from) || isMissing(command.to, options.to))
-    return "--from and --to must be given";
+  if (!command.from.allowed.empty() && !command.from.isGuessed && !options.from)
+    return "--from must be given";
+  if (const auto reason = withoutEffect(options)) return reason;
   auto& files = options.files;
   if (command.operands == Operands::twoFiles) {
     if (files.size() != 2) return "takes two files, not " + std::to_string(files.size());
     if (files[0] == "-" && files[1] == "-") return "only one of the files can be standard input";
   }
+  if (command.operands == Operands::command && files.size() > 1)
+    return "takes one command, not " + std::to_string(files.size());
   if (command.operands == Operands::files && files.empty()) {
     // Other formats may be typed.
     if (options.from == Format::binary && isTerminal(STDIN_FILENO))
@@ -134,20 +149,29 @@ std::variant<Request, Answer, Failure> parseCommand(const Command& command, std:
 std::variant<Request, Answer, Failure> parseCommandLine(std::span<char*> words) {
   const std::string_view first = words.size() < 2 ? "" : words[1];
   if (first == "-h" || first == "--help") return Answer{helpText(terminalWidth(STDOUT_FILENO))};
-  if (first == "--version") return Answer{"orv " ORV_VERSION "\n"};
+  if (first == "-V" || first == "--version") return Answer{"orv " ORV_VERSION "\n"};
   // Both are for the build.
   if (first == "--man-page" && words.size() == 3) return Answer{manPage(words[2])};
   if (first == "--bash-completion") return Answer{bashCompletion()};
 
+  if (const Command* const named = findCommand(first)) return parseCommand(*named, words.subspan(1));
   const auto commands = commandTable.commands;
-  const auto named = std::ranges::find(commands, first, &Command::name);
-  if (named != commands.end()) return parseCommand(*named, words.subspan(1));
   const bool couldBeFile = first.empty() || first.starts_with('-') || ::access(words[1], F_OK) == 0;
   if (!couldBeFile) {
     if (const auto suggestion = spelling::suggestion(first, commands, &Command::name); !suggestion.empty())
       return usageFailure("no file and no command \"" + std::string(first) + "\"" + suggestion).error();
   }
-  return parseCommand(commands.front(), words);
+  auto parsed = parseCommand(commands.front(), words);
+  // A command that stands behind options was taken for a file, unless there is one of this name.
+  const auto isMisplaced = [](const std::string& word) {
+    return findCommand(word) != nullptr && ::access(word.c_str(), F_OK) != 0;
+  };
+  std::vector<std::string> operands;
+  if (const auto* const request = std::get_if<Request>(&parsed)) operands = request->options.files;
+  if (std::holds_alternative<Failure>(parsed)) operands.assign(words.begin(), words.end());
+  const auto misplaced = std::ranges::find_if(operands, isMisplaced);
+  if (misplaced == operands.end()) return parsed;
+  return usageFailure("the command comes first: orv " + *misplaced + " ...").error();
 }
 
 }  // namespace orv::tool

@@ -93,9 +93,9 @@ constexpr std::string_view flag;  // the value's name of an option without a val
 constexpr OptionDescription type{'t', "--type", "TYPE",
                                  "the message type, for instance Group.MemberAdded (default SessionMessage)",
                                  takeType};
-constexpr OptionDescription payload{noLetter, "--payload", "[KIND=]TYPE",
-                                    "the type of an envelope's payload, of all or of those of one kind",
-                                    takePayload};
+constexpr OptionDescription payload{
+    noLetter, "--payload", "[KIND=]TYPE",
+    "the type of an envelope's payload, for one kind or for all that have none", takePayload};
 constexpr OptionDescription noUnwrap{noLetter, "--no-unwrap", flag, "leave the payloads of envelopes bytes",
                                      leaveClosed};
 constexpr OptionDescription from{
@@ -120,7 +120,7 @@ constexpr OptionDescription output{'o', "--output", "FILE", "write to the file (
                                    takeOutput};
 // Both are answered in place of work.
 constexpr OptionDescription help{'h', "--help", flag, "show this help", nullptr};
-constexpr OptionDescription version{noLetter, "--version", flag, "show the version", nullptr};
+constexpr OptionDescription version{'V', "--version", flag, "show the version", nullptr};
 
 template <class... Options>
 constexpr std::array<const OptionDescription*, sizeof...(Options)> list(const Options&... options) {
@@ -168,6 +168,8 @@ constexpr Example identifyExamples[] = {
 constexpr Example typesExamples[] = {{"orv types Group", "the fields of one type"}};
 constexpr Example schemaExamples[] = {{"orv schema > orv.proto", "a file for protoc"}};
 
+constexpr Example helpExamples[] = {{"orv help diff", "the options of diff"}};
+
 constexpr Command commands[] = {
     {.name = "decode",
      .run = runConvert,
@@ -207,7 +209,7 @@ constexpr Command commands[] = {
              "kept as they are.",
      .operands = Operands::files,
      .from = {.allowed = allFormats},
-     .to = {.allowed = allFormats},
+     .to = {.allowed = allFormats, .byDefault = Format::text},
      .options = decodeOptions,
      .examples = convertExamples},
     {.name = "diff",
@@ -248,6 +250,15 @@ constexpr Command commands[] = {
      .to = {},
      .options = printingOptions,
      .examples = schemaExamples},
+    {.name = "help",
+     .run = runHelp,
+     .summary = "tell more of a command",
+     .text = "Shows the help of a command, as its option --help does, or of all.",
+     .operands = Operands::command,
+     .from = {},
+     .to = {},
+     .options = printingOptions,
+     .examples = helpExamples},
 };
 
 constexpr StatusDescription statuses[] = {
@@ -277,6 +288,11 @@ constinit const CommandTable commandTable{
     .commands = commands,
     .statuses = statuses,
 };
+
+const Command* findCommand(std::string_view name) {
+  const auto* const found = std::ranges::find(commands, name, &Command::name);
+  return found == std::end(commands) ? nullptr : found;
+}
 
 std::string listed(const FormatChoice& formats) {
   std::string names;

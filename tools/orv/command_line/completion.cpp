@@ -15,30 +15,43 @@ constexpr std::string_view ending = R"bash(
 _orv() {
   local current=${COMP_WORDS[COMP_CWORD]} previous=${COMP_WORDS[COMP_CWORD - 1]}
   local command=${_orv_commands%% *} words=''
+  # An equals sign is a word of its own.
+  local isBehindEquals=''
+  [[ $current == = ]] && current='' isBehindEquals=1
+  [[ $previous == = ]] && previous=${COMP_WORDS[COMP_CWORD - 2]} isBehindEquals=1
   if ((COMP_CWORD > 1)) && [[ " $_orv_commands " == *" ${COMP_WORDS[1]} "* ]]; then
     command=${COMP_WORDS[1]}
   fi
-  if [[ $previous == = ]]; then
-    words=$(_orv_types)
-  elif words=$(_orv_values "$command$previous"); then
+  if words=$(_orv_values "$command$previous"); then
     :
+  elif [[ $isBehindEquals ]]; then
+    words=$(_orv_types)
   elif [[ $current == -* ]]; then
     words=$(_orv_options "$command")
     ((COMP_CWORD == 1)) && words+=" $_orv_general"
   elif ((COMP_CWORD == 1)); then
     words=$_orv_commands
-  elif [[ " $_orv_naming_types " == *" $command "* ]]; then
-    words=$(_orv_types)
+  else
+    words=$(_orv_values "$command")
   fi
   mapfile -t COMPREPLY < <(compgen -W "$words" -- "$current")
+  [[ ${COMPREPLY[0]-} == *= ]] && compopt -o nospace 2> /dev/null
 }
 
 complete -o default -F _orv orv
 )bash";
 
+constexpr const char* types = "_orv_types";
+
 // What bash runs for the words that an option's value can be; files are its own affair.
 std::string valuesOf(const OptionDescription& option, const Command& command) {
-  if (option.valueName.ends_with("TYPE")) return "_orv_types";
+  if (option.valueName == "TYPE") return types;
+  if (option.valueName == "[KIND=]TYPE") {
+    std::string kinds;
+    for (const auto& kind : VessaSessionMessageType::_protobuf_nameMap().entries())
+      kinds += ' ' + std::string(kind.name) + '=';
+    return "echo" + kinds + "; " + types;
+  }
   std::string words(option.words);
   if (option.formats != nullptr) {
     words = listed({.allowed = (command.*option.formats).allowed});
@@ -60,7 +73,6 @@ std::string variable(std::string_view name, const std::string& words) {
 
 std::string bashCompletion() {
   std::string names;
-  std::string namingTypes;
   std::string options;
   std::string values;
   std::string general;
@@ -68,7 +80,8 @@ std::string bashCompletion() {
   for (const Command& command : commandTable.commands) {
     const std::string name(command.name);
     names += name + ' ';
-    if (command.operands == Operands::types) namingTypes += name + ' ';
+    if (command.operands == Operands::types) values += "    " + name + ") " + types + " ;;\n";
+    if (command.operands == Operands::command) values += "    " + name + ") echo \"$_orv_commands\" ;;\n";
     std::string words;
     for (const auto* const option : command.options) {
       words += ' ' + std::string(option->name);
@@ -80,8 +93,7 @@ std::string bashCompletion() {
     }
     options.append("    ").append(name).append(") echo").append(words).append(" ;;\n");
   }
-  return std::string(beginning) + variable("_orv_commands", names) +
-         variable("_orv_naming_types", namingTypes) + variable("_orv_general", general) +
+  return std::string(beginning) + variable("_orv_commands", names) + variable("_orv_general", general) +
          function("_orv_options", options) + function("_orv_values", values) + std::string(ending);
 }
 

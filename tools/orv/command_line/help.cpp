@@ -1,8 +1,14 @@
 #include "tools/orv/command_line/command.hpp"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <utility>
 #include <vector>
+
+#include <orv/spelling/nearest_name.hpp>
+#include "tools/orv/output/output_file.hpp"
+#include "tools/orv/output/palette.hpp"
 
 namespace orv::tool {
 
@@ -86,6 +92,7 @@ std::string_view operandsText(Operands operands) {
     case Operands::files: return " [FILE]...";
     case Operands::twoFiles: return " A B";
     case Operands::types: return " [TYPE]...";
+    case Operands::command: return " [COMMAND]";
   }
   return {};
 }
@@ -108,7 +115,7 @@ std::string helpText(std::size_t width) {
   text += "\nExamples:\n";
   for (const Command& command : table.commands)
     text += "  " + std::string(command.examples.front().line) + '\n';
-  return text + "\n\"orv COMMAND --help\" tells more of each command.\n";
+  return text + "\n\"orv help COMMAND\" tells more of each command.\n";
 }
 
 std::string helpText(const Command& command, std::size_t width) {
@@ -120,6 +127,16 @@ std::string helpText(const Command& command, std::size_t width) {
   for (const Example& example : command.examples)
     text += "  " + std::string(example.line) + "\n      " + wrapped(example.text, 6, columns);
   return text;
+}
+
+ExitStatus runHelp(const Options& options) {
+  const std::size_t width = terminalWidth(STDOUT_FILENO);
+  if (options.files.empty()) return writeWhole(helpText(width));
+  const std::string& name = options.files.front();
+  if (const Command* const command = findCommand(name)) return writeWhole(helpText(*command, width));
+  report({ExitStatus::usage, "orv: help: no command \"" + name + "\"" +
+                                 spelling::suggestion(name, commandTable.commands, &Command::name)});
+  return ExitStatus::usage;
 }
 
 }  // namespace orv::tool

@@ -50,6 +50,7 @@ std::string_view operandsOf(const Command& command) {
     case Operands::files: return ".Op Ar\n";
     case Operands::twoFiles: return ".Ar A B\n";
     case Operands::types: return ".Op Ar type ...\n";
+    case Operands::command: return ".Op Ar command\n";
   }
   return {};
 }

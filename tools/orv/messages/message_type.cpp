@@ -67,9 +67,8 @@ std::expected<const MessageType*, std::string> findMessageType(std::string_view 
 const MessageType* PayloadPairing::payloadOf(VessaSessionMessageType type) const {
   if (!opens_) return nullptr;
   if (const auto found = forKind_.find(type.rawValue()); found != forKind_.end()) return found->second;
-  if (forAll_ != nullptr) return forAll_;
   const MessageDescriptor* const usual = envelope::payloadOf(type);
-  return usual != nullptr ? &typeOf(*usual) : nullptr;
+  return usual != nullptr ? &typeOf(*usual) : forOthers_;
 }
 
 std::expected<void, std::string> PayloadPairing::override(std::string_view pairing) {
@@ -78,7 +77,7 @@ std::expected<void, std::string> PayloadPairing::override(std::string_view pairi
       findMessageType(equals == std::string_view::npos ? pairing : pairing.substr(equals + 1));
   if (!payload) return std::unexpected(payload.error());
   if (equals == std::string_view::npos) {
-    forAll_ = *payload;
+    forOthers_ = *payload;
     return {};
   }
   const std::string_view kind = pairing.substr(0, equals);

@@ -48,19 +48,22 @@ class PayloadPairing {
     return pairing;
   }
 
+  bool isClosed() const { return !opens_; }
+  bool hasOverrides() const { return forOthers_ != nullptr || !forKind_.empty(); }
+
   // None for envelopes whose data stays bytes.
   const MessageType* payloadOf(VessaSessionMessageType type) const;
 
   // From now on data is bytes, whatever the type.
   void leaveClosed() { opens_ = false; }
 
-  // "TYPE" for the payload of every envelope, "KIND=TYPE" for those of one type, which is given by its name
-  // or its number. The error says what is wrong with it.
+  // "KIND=TYPE" for the payloads of one type of envelopes, which is given by its name or its number, "TYPE" for
+  // those of all types that have none. The error says what is wrong with it.
   std::expected<void, std::string> override(std::string_view pairing);
 
  private:
   bool opens_ = true;
-  const MessageType* forAll_ = nullptr;
+  const MessageType* forOthers_ = nullptr;
   std::map<std::int64_t, const MessageType*> forKind_;
 };
 
