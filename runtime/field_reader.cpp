@@ -8,10 +8,6 @@ namespace orv::inline v0::internal {
 
 // Outside the fast path what is wrong is found by a WireReader, which says it.
 
-bool FieldReader::isWellFormed(const std::byte* text, std::size_t size) {
-  return utf8::isWellFormed({reinterpret_cast<const char*>(text), size});
-}
-
 OutermostFrame& FieldReader::outermost(Frame& frame) {
   Frame* at = &frame;
   while (at->outer != nullptr) at = at->outer;

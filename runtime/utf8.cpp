@@ -1,7 +1,10 @@
 #include <orv/utf8.hpp>
 
+#include <algorithm>
 #include <bit>
 #include <cstring>
+
+#include "byte_block.hpp"
 
 namespace orv::inline v0::utf8 {
 
@@ -67,14 +70,79 @@ std::uint32_t fourBytesAt(const char* bytes) {
   return std::endian::native == std::endian::little ? word : std::byteswap(word);
 }
 
+#ifdef ORV_HAS_BYTE_BLOCKS
+
+using internal::ByteBlock;
+using internal::eightAt;
+using internal::sixteenAt;
+
+// Whether the first `size` bytes, fewer than 64, are well-formed, by bits in parallel (R. D. Cameron, "A case study
+// in SIMD text processing with parallel bit streams", PPoPP 2008): each lead byte says where continuation bytes
+// have to be, and they have to be there and nowhere else (table 3-6). `continuations` are those that there are.
+template <std::size_t parts>
+bool isWellFormed(const ByteBlock<parts>& block, std::size_t size, std::uint64_t continuations) {
+  const std::uint64_t nonAscii = block.below(0x00);
+  const std::uint64_t belowLeads = block.below(0xC2);
+  std::uint64_t expected = (nonAscii ^ belowLeads) << 1;
+  std::uint64_t wrong = belowLeads ^ continuations;
+  if (const std::uint64_t ofThreeOrMore = nonAscii ^ block.below(0xE0); ofThreeOrMore != 0) {
+    const std::uint64_t ofFour = nonAscii ^ block.below(0xF0);
+    expected |= ofThreeOrMore << 2 | ofFour << 3;
+    // Some leads have a narrower range of the second byte (table 3-7).
+    const std::uint64_t belowA0 = block.below(0xA0);
+    wrong |= (block.equalTo(0xE0) << 1 & belowA0) | (block.equalTo(0xED) << 1 & ~belowA0);
+    if (ofFour != 0) {
+      const std::uint64_t below90 = block.below(0x90);
+      wrong |= (block.equalTo(0xF0) << 1 & below90) | (block.equalTo(0xF4) << 1 & ~below90) |
+               (nonAscii ^ block.below(0xF5));
+    }
+  }
+  wrong |= expected ^ continuations;
+  const std::uint64_t end = std::uint64_t{1} << size;
+  return ((wrong & (end - 1)) | (expected & end)) == 0;
+}
+
+// How many bytes at the start are well-formed: all of them, or those in front of a block that is not.
+std::size_t wellFormedBlocks(std::string_view text) {
+  constexpr std::size_t blockSize = 64;
+  std::size_t at = 0;
+  while (text.size() - at >= blockSize) {
+    const char* const bytes = text.data() + at;
+    const ByteBlock<4> block{
+        {sixteenAt(bytes), sixteenAt(bytes + 16), sixteenAt(bytes + 32), sixteenAt(bytes + 48)}};
+    const std::uint64_t continuations = block.below(0xC0);
+    // The letter that begins last may go on behind the block.
+    const std::size_t size = blockSize - 1 - static_cast<std::size_t>(std::countl_zero(~continuations | 1));
+    if (size == 0 || !isWellFormed(block, size, continuations)) break;
+    at += size;
+  }
+  return at;
+}
+
+#endif
+
 }  // namespace
+
+bool isWellFormedWithin(const std::byte* bytes, std::size_t size) {
+  const char* const characters = reinterpret_cast<const char*>(bytes);
+#ifdef ORV_HAS_BYTE_BLOCKS
+  const ByteBlock<3> block{{sixteenAt(characters), sixteenAt(characters + 16), eightAt(characters + 32)}};
+  return isWellFormed(block, size, block.below(0xC0));
+#else
+  return isWellFormed({characters, size});
+#endif
+}
 
 std::size_t wellFormedPrefix(std::string_view text) {
   if (isAscii(text)) [[likely]]
     return text.size();
   const char* const bytes = text.data();
   const std::size_t size = text.size();
+#ifdef ORV_HAS_BYTE_BLOCKS
+  std::size_t at = wellFormedBlocks(text);
+#else
   std::size_t at = 0;
+#endif
   while (at < size) {
     // ASCII is passed eight bytes at a time.
     while (size - at >= 8) {

@@ -44,6 +44,10 @@ inline bool isAscii(std::string_view text) {
   return (bits & internal::highBits) == 0;
 }
 
+// Whether the first `size` bytes, which fit inside a text, are well-formed, of InlineBytes::objectSize that may be
+// read.
+bool isWellFormedWithin(const std::byte* bytes, std::size_t size);
+
 inline bool isWellFormed(std::string_view text) { return wellFormedPrefix(text) == text.size(); }
 
 }  // namespace orv::utf8

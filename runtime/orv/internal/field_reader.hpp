@@ -23,6 +23,7 @@
 #include <orv/internal/step.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
+#include <orv/utf8.hpp>
 #include <orv/wire_reader.hpp>
 
 namespace orv::inline v0::internal {
@@ -354,7 +355,7 @@ class FieldReader {
       // The common case: a short text with more input behind it is checked and copied in steps of a fixed
       // size.
       if (size <= InlineBytes::inlineCapacity && isReadableWithin(start) &&
-          (InlineBytes::isAsciiWithin(start, size) || isWellFormed(start, size))) [[likely]] {
+          (InlineBytes::isAsciiWithin(start, size) || utf8::isWellFormedWithin(start, size))) [[likely]] {
         presentValue(slot).bytes_.assignWithin(start, size);
         at_ = bodyEnd;
         isTaken_ = true;
@@ -428,7 +429,6 @@ class FieldReader {
     __builtin_prefetch(list.data() + std::min(list.size() + ahead, list.capacity()), 1);
   }
 
-  static bool isWellFormed(const std::byte* text, std::size_t size);
   static OutermostFrame& outermost(Frame& frame);
   static Step askHook(Frame& frame);
 
