@@ -1,209 +1,443 @@
 #include "tools/orv/messages/text_form.hpp"
 
-#include <google/protobuf/compiler/parser.h>
-#include <google/protobuf/descriptor.h>
-#include <google/protobuf/descriptor.pb.h>
-#include <google/protobuf/dynamic_message.h>
-#include <google/protobuf/io/tokenizer.h>
-#include <google/protobuf/io/zero_copy_stream_impl_lite.h>
-#include <google/protobuf/message.h>
-#include <google/protobuf/text_format.h>
-
 #include <algorithm>
-#include <cassert>
-#include <map>
-#include <memory>
-#include <tuple>
+#include <charconv>
+#include <cstdint>
+#include <limits>
+#include <optional>
 #include <utility>
+#include <vector>
 
+#include <orv/byte_view.hpp>
+#include <orv/internal/varint.hpp>
+#include <orv/spelling/escape.hpp>
+#include <orv/spelling/nearest_name.hpp>
+#include <orv/spelling/value_text.hpp>
+#include <orv/unknown_storage.hpp>
 #include <orv/utf8.hpp>
 
 namespace orv::tool {
 
 namespace {
 
-namespace pb = google::protobuf;
+using internal::maximumNesting;
+using spelling::quotedText;
 
-// Keeps the first error.
-class FirstError final : public pb::io::ErrorCollector {
- public:
-  void AddError(int line, pb::io::ColumnNumber column, const std::string& message) override {
-    if (error_.has_value()) return;
-    std::string reason = message;
-    if (reason.ends_with('.')) reason.pop_back();
-    error_ = {std::move(reason), static_cast<std::size_t>(line) + 1, static_cast<std::size_t>(column) + 1};
+constexpr bool isDigit(char c) { return c >= '0' && c <= '9'; }
+constexpr bool isWordCharacter(char c) {
+  return isDigit(c) || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || c == '_';
+}
+constexpr bool isBlank(char c) { return spelling::isSpace(c) || c == '\v' || c == '\f'; }
+
+// Decimal, hexadecimal behind 0x, octal behind 0.
+std::optional<std::uint64_t> numberOf(std::string_view word) {
+  int base = 10;
+  if (word.starts_with("0x") || word.starts_with("0X")) {
+    base = 16;
+    word.remove_prefix(2);
+  } else if (word.size() > 1 && word[0] == '0') {
+    base = 8;
   }
-  spelling::TextError error() const {
-    return error_.value_or(spelling::TextError{"no message in the text format", 1, 1});
+  std::uint64_t number = 0;
+  const auto [end, status] = std::from_chars(word.data(), word.data() + word.size(), number, base);
+  if (status != std::errc() || end != word.data() + word.size()) return std::nullopt;
+  return number;
+}
+
+// Takes a text apart. The first failure is kept; everything that can fail answers whether it went well.
+class Scanner {
+ public:
+  explicit Scanner(std::string_view text) : text_(text) { skipBlanks(); }
+
+  std::size_t at() const { return at_; }
+  bool isAtEnd() const { return at_ == text_.size(); }
+  bool sees(char c) const { return at_ < text_.size() && text_[at_] == c; }
+  bool seesMessage() const { return sees('{') || sees('<'); }
+  bool seesString() const { return sees('"') || sees('\''); }
+  bool take(char c) {
+    if (!sees(c)) return false;
+    ++at_;
+    skipBlanks();
+    return true;
+  }
+  void takeAny() {
+    ++at_;
+    skipBlanks();
+  }
+
+  // A name or a number; empty where there is none.
+  std::string_view takeWord() {
+    const std::string_view word = seenWord();
+    at_ += word.size();
+    skipBlanks();
+    return word;
+  }
+
+  // Strings that follow one another are one.
+  bool takeString(std::string& bytes) {
+    while (seesString()) {
+      if (!takePiece(text_[at_++], bytes)) return false;
+      skipBlanks();
+    }
+    return true;
+  }
+
+  bool fail(std::size_t at, std::string reason) {
+    spelling::TextPosition place;
+    for (const char c : text_.substr(0, at)) place.advance(c);
+    error_ = place.error(std::move(reason));
+    return false;
+  }
+  bool failExpecting(std::string_view expected) { return failExpecting(expected, at_); }
+  bool failExpecting(std::string_view expected, std::size_t at) {
+    at_ = at;
+    return fail(at_, "expected " + std::string(expected) + ", found " + found());
+  }
+  const spelling::TextError& error() const { return error_; }
+
+ private:
+  // White space and comments.
+  void skipBlanks() {
+    for (; at_ < text_.size(); ++at_) {
+      if (sees('#'))
+        at_ = std::min(text_.find('\n', at_), text_.size() - 1);
+      else if (!isBlank(text_[at_]))
+        return;
+    }
+  }
+
+  std::string_view seenWord() const {
+    std::size_t end = at_;
+    while (end < text_.size() && isWordCharacter(text_[end])) ++end;
+    return text_.substr(at_, end - at_);
+  }
+
+  bool takePiece(char quote, std::string& bytes) {
+    for (;;) {
+      const std::size_t start = at_;
+      while (at_ < text_.size() && isInside(text_[at_], quote)) ++at_;
+      bytes += text_.substr(start, at_ - start);
+      if (isAtEnd() || sees('\n')) return fail(at_, "a string without its closing quotation mark");
+      if (sees('\0')) return fail(at_, "a NUL character");
+      if (text_[at_] == quote) return ++at_, true;
+      const std::size_t length = spelling::takeEscape(text_.substr(at_), bytes);
+      if (length == 0) return fail(at_, "an escape that C does not have");
+      at_ += length;
+    }
+  }
+  static bool isInside(char c, char quote) { return c != quote && c != '\\' && c != '\n' && c != '\0'; }
+
+  std::string found() const {
+    if (isAtEnd()) return "the end";
+    if (sees('\0')) return "a NUL character";
+    const std::string_view word = seenWord();
+    return quotedText(word.empty() ? text_.substr(at_, utf8::step(text_.substr(at_)).length) : word);
+  }
+
+  std::string_view text_;
+  std::size_t at_ = 0;
+  spelling::TextError error_{};
+};
+
+void appendVarint(std::uint64_t value, std::string& output) {
+  for (; value >= 0x80; value >>= 7) output += static_cast<char>(value | 0x80);
+  output += static_cast<char>(value);
+}
+
+template <class Number>
+void appendFixed(Number value, std::string& output) {
+  for (std::size_t index = 0; index < sizeof value; ++index) output += static_cast<char>(value >> 8 * index);
+}
+
+constexpr WireType wireTypeOf(ValueType type) {
+  return type == ValueType::boolean || type == ValueType::uint32 || type == ValueType::enumeration
+             ? WireType::varint
+             : WireType::lengthDelimited;
+}
+
+constexpr const FieldDescriptor& envelopeField(std::string_view name) {
+  return *std::ranges::find(SessionMessage::descriptor().fields, name, &FieldDescriptor::name);
+}
+
+// Writes the encoding of what it reads, in one pass. Fields of a message that do not ascend are put in order at
+// its end.
+class TextEncoder {
+ public:
+  TextEncoder(std::string_view text, const PayloadPairing& payloads) : text_(text), payloads_(payloads) {}
+
+  std::expected<std::string, spelling::TextError> encode(const MessageType& type) {
+    if (!takeFields(type.descriptor, '\0')) return std::unexpected(text_.error());
+    return std::move(output_);
   }
 
  private:
-  std::optional<spelling::TextError> error_;
-};
+  // What was read of a message.
+  struct Progress {
+    const MessageDescriptor* type;  // none for a message that nothing is known of
+    std::uint64_t given = 0;        // a bit for each field, by its place in the type
+    std::uint32_t givenOneofs = 0;
+    std::uint32_t lastNumber = 0;
+    bool isAscending = true;
+    std::string unknown{};  // records
+  };
 
-pb::FileDescriptorProto shippedFile() {
-  const std::string_view source = schema();
-  pb::io::ArrayInputStream input(source.data(), static_cast<int>(source.size()));
-  FirstError errors;  // none: the shipped schema is well-formed
-  pb::io::Tokenizer tokenizer(&input, &errors);
-  pb::FileDescriptorProto file;
-  pb::compiler::Parser().Parse(&tokenizer, &file);
-  file.set_name("orv.proto");
-  return file;
-}
-
-// The message types of the shipped schema, or of one that differs from it in one thing: an envelope's data is
-// a message of the payload's type. Made on first use, never freed.
-class TextSchema {
- public:
-  // The shipped one for no payload.
-  static TextSchema& with(const MessageType* payload) {
-    static auto& schemas = *new std::map<const MessageType*, TextSchema>();
-    return schemas.try_emplace(payload, payload).first->second;
-  }
-
-  explicit TextSchema(const MessageType* payload) {
-    pb::FileDescriptorProto file = shippedFile();
-    for (pb::DescriptorProto& message : *file.mutable_message_type()) {
-      const bool isEnvelope = file.package() + '.' + message.name() == SessionMessage::protoMessageName;
-      if (payload == nullptr || !isEnvelope) continue;
-      pb::FieldDescriptorProto& data = *std::ranges::find(*message.mutable_field(), "data", nameOfField);
-      data.set_type(pb::FieldDescriptorProto::TYPE_MESSAGE);
-      data.set_type_name('.' + std::string(payload->fullName()));
+  // Up to the closing character, or the end of the text for '\0'.
+  bool takeFields(const MessageDescriptor* type, char closing) {
+    Progress message{.type = type};
+    const std::size_t start = output_.size();
+    while (closing == '\0' ? !text_.isAtEnd() : !text_.take(closing)) {
+      if (!takeField(message)) return false;
+      (void)(text_.take(',') || text_.take(';'));
     }
-    [[maybe_unused]] const pb::FileDescriptor* const built = pool_.BuildFile(file);
-    assert(built != nullptr);
+    if (!message.isAscending) sortRecords(start);
+    output_ += message.unknown;
+    return true;
   }
 
-  std::unique_ptr<pb::Message> newMessage(std::string_view fullName) {
-    const pb::Descriptor* const descriptor = pool_.FindMessageTypeByName(std::string(fullName));
-    assert(descriptor != nullptr);
-    return std::unique_ptr<pb::Message>(factory_.GetPrototype(descriptor)->New());
+  bool takeField(Progress& message) {
+    const std::size_t at = text_.at();
+    if (text_.sees('[')) return takeUnknown(message, at, {});
+    const std::string_view name = text_.takeWord();
+    if (name.empty()) return text_.failExpecting(depth_ == 0 ? "a field" : "a field or the message's end");
+    if (isDigit(name[0])) return takeUnknown(message, at, name);
+    if (message.type == nullptr) return text_.fail(at, "the fields of an unknown one go by their numbers");
+    const auto field = std::ranges::find(message.type->fields, name, &FieldDescriptor::name);
+    if (field == message.type->fields.end()) {
+      return text_.fail(at, std::string(message.type->fullName) + " has no field " + quotedText(name) +
+                                spelling::suggestion(name, message.type->fields, &FieldDescriptor::name));
+    }
+    const auto bit = std::uint64_t{1} << (field - message.type->fields.begin());
+    const bool isAgain = (std::exchange(message.given, message.given | bit) & bit) != 0;
+    if (isAgain && field->kind != FieldKind::repeated)
+      return text_.fail(at, std::string(name) + " is there twice");
+    const std::uint32_t group = field->kind == FieldKind::oneofMember ? 1U << field->oneof : 0;
+    if ((std::exchange(message.givenOneofs, message.givenOneofs | group) & group) != 0)
+      return text_.fail(at, "a second member of a oneof");
+    message.isAscending = message.isAscending && field->number >= message.lastNumber;
+    message.lastNumber = field->number;
+    return takeValues(*field);
   }
 
- private:
-  static const std::string& nameOfField(const pb::FieldDescriptorProto& field) { return field.name(); }
-
-  pb::DescriptorPool pool_;
-  pb::DynamicMessageFactory factory_{&pool_};
-};
-
-struct ParsedText {
-  std::unique_ptr<pb::Message> message;
-  std::unique_ptr<pb::TextFormat::ParseInfoTree> locations;
-};
-
-enum class UnknownNames : bool { refuse, skip };
-
-std::expected<ParsedText, spelling::TextError> parse(TextSchema& schema, std::string_view typeName,
-                                                     std::string_view text, UnknownNames unknownNames) {
-  constexpr int maximumNesting = 100;
-  ParsedText parsed{schema.newMessage(typeName), std::make_unique<pb::TextFormat::ParseInfoTree>()};
-  FirstError errors;
-  pb::TextFormat::Parser parser;
-  parser.RecordErrorsTo(&errors);
-  parser.WriteLocationsTo(parsed.locations.get());
-  parser.SetRecursionLimit(maximumNesting);
-  parser.AllowUnknownField(unknownNames == UnknownNames::skip);
-  if (!parser.ParseFromString(std::string(text), parsed.message.get()))
-    return std::unexpected(errors.error());
-  return parsed;
-}
-
-// A list in brackets is at one place, that of its first item.
-spelling::TextError errorAt(const pb::TextFormat::ParseInfoTree& locations, const pb::FieldDescriptor& field,
-                            int index, std::string reason) {
-  auto place = locations.GetLocation(&field, index);
-  for (; place.line < 0 && index > 0; --index) place = locations.GetLocation(&field, index - 1);
-  return {std::move(reason), static_cast<std::size_t>(place.line + 1),
-          static_cast<std::size_t>(place.column + 1)};
-}
-
-std::string textAt(const pb::Message& message, const pb::FieldDescriptor& field, int index) {
-  const pb::Reflection& reflection = *message.GetReflection();
-  return field.is_repeated() ? reflection.GetRepeatedString(message, &field, index)
-                             : reflection.GetString(message, &field);
-}
-
-const pb::Message& messageAt(const pb::Message& message, const pb::FieldDescriptor& field, int index) {
-  const pb::Reflection& reflection = *message.GetReflection();
-  return field.is_repeated() ? reflection.GetRepeatedMessage(message, &field, index)
-                             : reflection.GetMessage(message, &field);
-}
-
-using TextCheck = std::expected<void, spelling::TextError>;
-
-TextCheck checkTexts(const pb::Message& message, const pb::TextFormat::ParseInfoTree& locations);
-
-// Checks one value of a field: a text, or the texts in a message.
-TextCheck checkValue(const pb::Message& message, const pb::FieldDescriptor& field, int index,
-                     const pb::TextFormat::ParseInfoTree& locations) {
-  const int place = field.is_repeated() ? index : -1;
-  if (field.type() == pb::FieldDescriptor::TYPE_MESSAGE) {
-    const auto* const nested = locations.GetTreeForNested(&field, place);
-    return checkTexts(messageAt(message, field, index), nested != nullptr ? *nested : locations);
-  }
-  if (field.type() != pb::FieldDescriptor::TYPE_STRING) return {};
-  if (utf8::isWellFormed(textAt(message, field, index))) return {};
-  const std::string item = field.is_repeated() ? '[' + std::to_string(index) + ']' : "";
-  return std::unexpected(errorAt(locations, field, place, "ill-formed UTF-8 in " + field.name() + item));
-}
-
-// The parser takes escapes of any bytes, also in texts, and says nothing.
-TextCheck checkTexts(const pb::Message& message, const pb::TextFormat::ParseInfoTree& locations) {
-  std::vector<const pb::FieldDescriptor*> fields;
-  message.GetReflection()->ListFields(message, &fields);
-  for (const pb::FieldDescriptor* field : fields) {
-    const int count = field->is_repeated() ? message.GetReflection()->FieldSize(message, field) : 1;
-    for (int index = 0; index < count; ++index) {
-      if (auto checked = checkValue(message, *field, index, locations); !checked) return checked;
+  // One value, or a list of them in brackets.
+  bool takeValues(const FieldDescriptor& field) {
+    const bool hasColon = text_.take(':');
+    if (field.kind != FieldKind::repeated || !text_.take('[')) return takeValue(field, hasColon);
+    if (text_.take(']')) return true;
+    for (;;) {
+      if (!takeValue(field, hasColon)) return false;
+      if (text_.take(']')) return true;
+      if (!text_.take(',')) return text_.failExpecting("\",\" or \"]\"");
     }
   }
-  return {};
-}
 
-std::expected<std::string, spelling::TextError> encode(
-    std::expected<ParsedText, spelling::TextError> parsed) {
-  if (!parsed) return std::unexpected(std::move(parsed.error()));
-  if (auto checked = checkTexts(*parsed->message, *parsed->locations); !checked)
-    return std::unexpected(checked.error());
-  return parsed->message->SerializePartialAsString();
-}
+  bool takeValue(const FieldDescriptor& field, bool hasColon) {
+    if (field.type == ValueType::message) return takeMessage(field.number, field.message);
+    if (&field == &envelopeField("data") && text_.seesMessage()) return takePayload(field);
+    if (!hasColon) return text_.failExpecting("\":\"");
+    if (wireTypeOf(field.type) == WireType::lengthDelimited) return takeString(field);
+    const auto number = takeNumber(field);
+    const bool isLeftOut = field.kind == FieldKind::implicitPresence && number == 0U;
+    if (number && !isLeftOut) appendNumber(field.number, *number);
+    return number.has_value();
+  }
 
-VessaSessionMessageType typeOfEnvelope(const pb::Message& envelope) {
-  const pb::FieldDescriptor* const field = envelope.GetDescriptor()->FindFieldByName("type");
-  return VessaSessionMessageType(envelope.GetReflection()->GetEnumValue(envelope, field));
-}
+  bool takeMessage(std::uint32_t number, const MessageDescriptor* type) {
+    if (!text_.seesMessage()) return text_.failExpecting("\"{\"");
+    if (++depth_ > maximumNesting)
+      return text_.fail(text_.at(), "nested deeper than " + std::to_string(maximumNesting));
+    const char closing = text_.sees('{') ? '}' : '>';
+    text_.takeAny();
+    const std::size_t contents = openRecord(number);
+    if (!takeFields(type, closing)) return false;
+    closeRecord(contents);
+    --depth_;
+    return true;
+  }
 
-bool isBefore(const spelling::TextError& left, const spelling::TextError& right) {
-  return std::tie(left.line, left.column) < std::tie(right.line, right.column);
-}
+  // An envelope's data as a message. The type that says which may stand behind it.
+  bool takePayload(const FieldDescriptor& data) {
+    const std::size_t at = text_.at();
+    std::optional<std::int64_t> kind = kind_;
+    if (!kind) kind = kindBehind(text_);
+    const MessageType* const payload = kind ? payloads_.payloadOf(VessaSessionMessageType(*kind)) : nullptr;
+    if (payload == nullptr) return text_.fail(at, "a message, but no \"type\" says which");
+    return takeMessage(data.number, payload->descriptor);
+  }
+
+  // The type of the envelope in which the text stands at a message.
+  static std::optional<std::int64_t> kindBehind(Scanner text) {
+    std::string ignored;
+    for (int depth = 0; !text.isAtEnd();) {
+      if (const auto word = text.takeWord(); !word.empty()) {
+        if (depth == 0 && word == "type" && text.take(':')) return enumerationOf(text, envelopeField("type"));
+      } else if (text.seesString()) {
+        if (!text.takeString(ignored)) return std::nullopt;
+        ignored.clear();
+      } else {
+        if (text.seesMessage()) ++depth;
+        if (text.sees('}') || text.sees('>')) --depth;
+        text.takeAny();
+      }
+    }
+    return std::nullopt;
+  }
+
+  bool takeString(const FieldDescriptor& field) {
+    if (!text_.seesString()) return text_.failExpecting("a string");
+    const std::size_t at = text_.at();
+    const std::size_t start = output_.size();
+    const std::size_t contents = openRecord(field.number);
+    if (!text_.takeString(output_)) return false;
+    const std::string_view bytes = std::string_view(output_).substr(contents);
+    if (field.type == ValueType::string && !utf8::isWellFormed(bytes))
+      return text_.fail(at, "ill-formed UTF-8 in " + std::string(field.name));
+    if (field.kind == FieldKind::implicitPresence && bytes.empty()) {
+      output_.resize(start);
+    } else {
+      closeRecord(contents);
+    }
+    return true;
+  }
+
+  // What travels of a value that is a number or a name.
+  std::optional<std::uint64_t> takeNumber(const FieldDescriptor& field) {
+    const auto failExpecting = [this, at = text_.at()](std::string_view expected) {
+      text_.failExpecting(expected, at);
+      return std::nullopt;
+    };
+    if (field.type == ValueType::enumeration) {
+      const auto raw = enumerationOf(text_, field);
+      if (!raw) return failExpecting("a name or a number of " + std::string(field.name));
+      if (&field == &envelopeField("type")) kind_ = *raw;
+      return internal::travellingValue(*raw);
+    }
+    const std::string_view word = text_.takeWord();
+    const auto number = numberOf(word);
+    if (field.type == ValueType::boolean) {
+      if (word == "true" || word == "True" || word == "t" || number == 1U) return 1;
+      if (word == "false" || word == "False" || word == "f" || number == 0U) return 0;
+      return failExpecting("true or false");
+    }
+    if (!number || *number > std::numeric_limits<std::uint32_t>::max())
+      return failExpecting("a whole number from 0 to 4294967295");
+    return *number;
+  }
+
+  static std::optional<std::int64_t> enumerationOf(Scanner& text, const FieldDescriptor& field) {
+    const bool isNegative = text.take('-');
+    const std::string_view word = text.takeWord();
+    if (const auto named = field.cases.number(word); named && !isNegative) return named;
+    const auto number = numberOf(word);
+    if (!number || *number > std::uint64_t{0x7FFFFFFF} + (isNegative ? 1 : 0)) return std::nullopt;
+    return isNegative ? -static_cast<std::int64_t>(*number) : static_cast<std::int64_t>(*number);
+  }
+
+  // A field by its number, or whole records, `[records]: "…"`, without one.
+  bool takeUnknown(Progress& message, std::size_t at, std::string_view number) {
+    const std::size_t start = output_.size();
+    if (number.empty() ? !takeRecords() : !takeNumbered(number, at)) return false;
+    if (message.type == nullptr) return true;
+    // A known field that arrives in this way would not be unknown, and nobody has looked at it.
+    const auto records = UnknownStorage::checked(bytesOf(std::string_view(output_).substr(start)));
+    if (!records) return text_.fail(at, "malformed records: " + records.error().reason());
+    for (const UnknownField& record : *records) {
+      const FieldDescriptor* const known = message.type->field(record.tag.fieldNumber());
+      if (known != nullptr && wireTypeOf(known->type) == record.tag.wireType())
+        return text_.fail(at, "field " + std::to_string(known->number) + " is " + std::string(known->name));
+    }
+    message.unknown += std::string_view(output_).substr(start);
+    output_.resize(start);
+    return true;
+  }
+
+  bool takeRecords() {
+    text_.takeAny();
+    if (text_.takeWord() != "records" || !text_.take(']') || !text_.take(':') || !text_.seesString())
+      return text_.failExpecting("a field, or [records]: and a string");
+    return text_.takeString(output_);
+  }
+
+  // The form says the wire type: a number in sixteen or eight hexadecimal digits is of 64 or 32 fixed bits.
+  bool takeNumbered(std::string_view word, std::size_t at) {
+    constexpr std::uint64_t highestNumber = (1U << 29) - 1;
+    const auto wide = numberOf(word);
+    if (!wide || *wide == 0 || *wide > highestNumber) return text_.fail(at, "no number of a field");
+    const auto number = static_cast<std::uint32_t>(*wide);
+    const bool hasColon = text_.take(':');
+    if (text_.seesMessage()) return takeMessage(number, nullptr);
+    if (!hasColon) return text_.failExpecting("\":\"");
+    if (text_.seesString()) {
+      const std::size_t contents = openRecord(number);
+      if (!text_.takeString(output_)) return false;
+      closeRecord(contents);
+      return true;
+    }
+    const std::size_t valueAt = text_.at();
+    const std::string_view digits = text_.takeWord();
+    const auto value = numberOf(digits);
+    if (!value) return text_.fail(valueAt, "expected a number, a string or a message");
+    const bool isHexadecimal = digits.starts_with("0x");
+    if (isHexadecimal && digits.size() == 18) {
+      appendTag(number, WireType::fixed64);
+      appendFixed(*value, output_);
+    } else if (isHexadecimal && digits.size() == 10) {
+      appendTag(number, WireType::fixed32);
+      appendFixed(static_cast<std::uint32_t>(*value), output_);
+    } else {
+      appendNumber(number, *value);
+    }
+    return true;
+  }
+
+  void appendTag(std::uint32_t number, WireType type) {
+    appendVarint(number << 3 | static_cast<std::uint32_t>(type), output_);
+  }
+  void appendNumber(std::uint32_t number, std::uint64_t value) {
+    appendTag(number, WireType::varint);
+    appendVarint(value, output_);
+  }
+  // Begins a length-delimited record; answers where its contents do.
+  std::size_t openRecord(std::uint32_t number) {
+    appendTag(number, WireType::lengthDelimited);
+    output_ += '\0';
+    return output_.size();
+  }
+  void closeRecord(std::size_t contents) {
+    const std::size_t size = output_.size() - contents;
+    if (size < 0x80) {
+      output_[contents - 1] = static_cast<char>(size);
+      return;
+    }
+    std::string length;
+    appendVarint(size, length);
+    output_.replace(contents - 1, 1, length);
+  }
+
+  // Those that were written from `start` on.
+  void sortRecords(std::size_t start) {
+    const std::string written = output_.substr(start);
+    std::vector<UnknownField> records;
+    for (UnknownStorage::Iterator at(bytesOf(written)); at != std::default_sentinel; ++at)
+      records.push_back(*at);
+    std::ranges::sort(records, {}, [](const UnknownField& field) {
+      return std::pair(field.tag.fieldNumber(), field.record.data());
+    });
+    output_.resize(start);
+    for (const UnknownField& field : records) output_ += charactersOf(field.record);
+  }
+
+  Scanner text_;
+  const PayloadPairing& payloads_;
+  std::string output_;
+  std::optional<std::int64_t> kind_;  // of the envelope, once it was read
+  int depth_ = 0;
+};
 
 }  // namespace
 
 std::expected<std::string, spelling::TextError> encodeTextForm(const MessageType& type, std::string_view text,
                                                                const PayloadPairing& payloads) {
-  const auto parseClosed = [&] {
-    return parse(TextSchema::with(nullptr), type.fullName(), text, UnknownNames::refuse);
-  };
-  if (!type.isEnvelope()) return encode(parseClosed());
-
-  // First with a data that is some message, to see whether it is one, and which.
-  auto seen =
-      parse(TextSchema::with(&typeOf<ConnectionResponse>()), type.fullName(), text, UnknownNames::skip);
-  if (!seen) {
-    auto closed = parseClosed();
-    // The reading that got further has the better reason.
-    if (!closed && isBefore(closed.error(), seen.error())) return std::unexpected(seen.error());
-    return encode(std::move(closed));
-  }
-  const pb::FieldDescriptor* const data = seen->message->GetDescriptor()->FindFieldByName("data");
-  if (!seen->message->GetReflection()->HasField(*seen->message, data)) return encode(parseClosed());
-  const MessageType* const payload = payloads.payloadOf(typeOfEnvelope(*seen->message));
-  if (payload == nullptr) {
-    return std::unexpected(errorAt(*seen->locations, *data, -1, "a message, but no \"type\" says which"));
-  }
-  return encode(parse(TextSchema::with(payload), type.fullName(), text, UnknownNames::refuse));
+  return TextEncoder(text, payloads).encode(type);
 }
 
 }  // namespace orv::tool

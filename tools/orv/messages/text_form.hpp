@@ -1,4 +1,4 @@
-// Reads the text format of Protocol Buffers. Behind this header stands the whole of libprotobuf.
+// Reads the text format of Protocol Buffers (protobuf.dev, "Text Format").
 #pragma once
 
 #include <expected>
@@ -10,11 +10,12 @@
 
 namespace orv::tool {
 
-// proto/orv.proto, as it was when the command was built: for peers in other languages, and for the text format.
+// proto/orv.proto, as it was when the command was built: for peers in other languages.
 std::string_view schema();
 
-// The binary encoding of a message that is given in the text format, by libprotobuf's own parser and the
-// schema. An envelope's data may be its payload as a message, or its bytes as a string.
+// The binary encoding of a message that is given in the text format. An envelope's data may be its payload as a
+// message, or its bytes as a string. Unknown fields go by their numbers: what TextRenderer writes is read again,
+// where it was told to write nothing else.
 std::expected<std::string, spelling::TextError> encodeTextForm(const MessageType& type, std::string_view text,
                                                                const PayloadPairing& payloads);
 
