@@ -55,26 +55,26 @@ void Renderer::startMember(std::string_view name) {
   output_ += options_.isIndented ? ": " : ":";
 }
 
-void Renderer::appendQuoted(std::string_view utf8) {
-  output_ += '"';
+void appendQuoted(std::string_view utf8, std::string& output) {
+  output += '"';
   while (!utf8.empty()) {
     const utf8::Step step = utf8::step(utf8);
     switch (step.codePoint) {
-      case '"': output_ += "\\\""; break;
-      case '\\': output_ += "\\\\"; break;
-      case '\n': output_ += "\\n"; break;
-      case '\r': output_ += "\\r"; break;
-      case '\t': output_ += "\\t"; break;
+      case '"': output += "\\\""; break;
+      case '\\': output += "\\\\"; break;
+      case '\n': output += "\\n"; break;
+      case '\r': output += "\\r"; break;
+      case '\t': output += "\\t"; break;
       default:
         if (isControl(step.codePoint)) {
-          output_ += "\\u" + spelling::hexNumber(step.codePoint, 4);
+          output += "\\u" + spelling::hexNumber(step.codePoint, 4);
         } else {
-          output_ += utf8.substr(0, step.length);
+          output += utf8.substr(0, step.length);
         }
     }
     utf8.remove_prefix(step.length);
   }
-  output_ += '"';
+  output += '"';
 }
 
 void Renderer::appendBase64(std::string_view bytes) {

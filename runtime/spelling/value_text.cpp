@@ -2,6 +2,8 @@
 
 #include <utf8proc.h>
 
+#include <algorithm>
+
 #include <orv/spelling/hex.hpp>
 #include <orv/utf8.hpp>
 
@@ -41,6 +43,12 @@ std::size_t appendCharacter(std::string_view text, std::string& output) {
   return step.length;
 }
 
+std::size_t columnsOf(const utf8::Step& step) {
+  if (!step.isWellFormed) return 1;
+  return static_cast<std::size_t>(
+      std::max(0, utf8proc_charwidth(static_cast<utf8proc_int32_t>(step.codePoint))));
+}
+
 std::string sizeNote(std::size_t size) { return " (" + std::to_string(size) + " bytes)"; }
 
 }  // namespace
@@ -60,10 +68,30 @@ std::string printable(std::string_view text) {
   return output;
 }
 
-std::string quotedText(std::string_view utf8, std::size_t from) {
+std::size_t columns(std::string_view utf8) {
+  if (utf8::isAscii(utf8)) return utf8.size();
+  std::size_t count = 0;
+  for (; !utf8.empty(); utf8.remove_prefix(utf8::step(utf8).length)) count += columnsOf(utf8::step(utf8));
+  return count;
+}
+
+std::string_view startWithin(std::string_view utf8, std::size_t room) {
+  if (utf8.size() <= room) return utf8;
+  std::size_t end = 0;
+  while (end < utf8.size()) {
+    const utf8::Step step = utf8::step(utf8.substr(end));
+    const std::size_t width = columnsOf(step);
+    if (width > room) break;
+    room -= width;
+    end += step.length;
+  }
+  return utf8.substr(0, end);
+}
+
+void appendQuotedText(std::string_view utf8, std::string& output, std::size_t from) {
   constexpr std::size_t longest = 60;  // bytes
   const std::size_t size = utf8.size();
-  std::string output = from == 0 ? "\"" : "…\"";
+  output += from == 0 ? "\"" : "…\"";
   utf8.remove_prefix(from);
   std::size_t taken = 0;
   while (taken < utf8.size() && taken < longest) {
@@ -72,7 +100,13 @@ std::string quotedText(std::string_view utf8, std::size_t from) {
   }
   const bool isCut = taken < utf8.size();
   output += isCut ? "\"…" : "\"";
-  return from != 0 || isCut ? output + sizeNote(size) : output;
+  if (from != 0 || isCut) output += sizeNote(size);
+}
+
+std::string quotedText(std::string_view utf8, std::size_t from) {
+  std::string output;
+  appendQuotedText(utf8, output, from);
+  return output;
 }
 
 std::string hexText(std::string_view bytes, std::size_t from) {

@@ -36,7 +36,7 @@ def completion(helps):
     for name, text in helps.items():
         expect(f"completion of {name}'s options", completed(COMMAND, name, "--"), options(text))
         for option, formats in re.findall(r"(--from|--to) FORMAT\s+[^:]*:([^-]*)", text):
-            listed = set(re.findall(r"\b(binary|hex|base64|text|json)\b", formats))
+            listed = set(re.findall(r"\b(binary|hex|base64|text|json|html)\b", formats))
             expect(f"completion of {name} {option}", completed(COMMAND, name, option, ""), listed)
             expect(f"completion of {name} {option}=", completed(COMMAND, name, option, "="), listed)
             first = min(listed)

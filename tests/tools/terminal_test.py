@@ -7,6 +7,7 @@ import struct
 import subprocess
 import termios
 import threading
+import unicodedata
 
 from tool import COMMAND, delimited, expect, in_scratch_directory, record, run, write
 
@@ -68,6 +69,23 @@ def widths():
         expect(f"help on {columns} columns is no wider ({longest})", longest <= columns, True)
 
 
+def wide_characters():
+    """Those that take two columns are counted so, and those that take none."""
+    write("wide.bin", record(1, "茶の間のスピーカー".encode() * 2) + record(2, "e\u0301".encode() * 9))
+    for columns in range(52, 110, 3):
+        _, shown = on_terminal(["inspect", "-t", "Member", "wide.bin"], columns, [("NO_COLOR", "1")])
+        longest = max(width(line) for line in shown.splitlines())
+        expect(f"wide characters on {columns} columns ({longest})", longest <= columns, True)
+        wanted = '"' + "e\u0301" * 9 + '"'
+        room = columns >= 31 + 2 + 11
+        expect(f"combining characters on {columns} columns are not cut", wanted in shown, room)
+
+
+def width(line):
+    wide = sum(unicodedata.east_asian_width(character) in "WF" for character in line)
+    return len(line) + wide - sum(unicodedata.combining(character) != 0 for character in line)
+
+
 def colours():
     write("message.bin", ENVELOPE)
     plain = run("inspect", "message.bin").stdout
@@ -120,6 +138,7 @@ def progress():
 
 def test():
     widths()
+    wide_characters()
     colours()
     refusals()
     progress()

@@ -13,11 +13,12 @@
 
 namespace orv::tool {
 
-// The forms that a message can be given in.
-enum class Format : std::uint8_t { binary, hex, base64, text, json };
+// The forms that a message can be given, or shown, in.
+enum class Format : std::uint8_t { binary, hex, base64, text, json, html };
 
 // In the order of Format, as the options spell them.
-inline constexpr std::array<std::string_view, 5> formatNames{"binary", "hex", "base64", "text", "json"};
+inline constexpr std::array<std::string_view, 6> formatNames{"binary", "hex",  "base64",
+                                                             "text",   "json", "html"};
 
 // Whether the format spells out the binary encoding, byte by byte.
 constexpr bool isBytes(Format format) { return format <= Format::base64; }
@@ -31,6 +32,7 @@ struct Options {
   std::optional<Format> to;    // none: the command writes no messages
   bool isDelimited = false;
   bool showsUnknownFields = false;
+  bool showsDefaults = false;
   bool comparesEncodings = false;
   bool isQuiet = false;
   // A message takes several times its size in memory, up to about sixty times where it is nothing but empty

@@ -23,6 +23,9 @@ struct RenderOptions {
   bool showsUnknownFields = false;
 };
 
+// Appends text as a JSON string. Ill-formed text is none of JSON's.
+void appendQuoted(std::string_view utf8, std::string& output);
+
 // A visitor that writes what it is handed as the members of an object.
 class Renderer : public AnyValueVisitor<Renderer> {
  public:
@@ -91,7 +94,7 @@ class Renderer : public AnyValueVisitor<Renderer> {
       output_ += std::to_string(value.rawValue());
     }
   }
-  void appendQuoted(std::string_view utf8);
+  void appendQuoted(std::string_view utf8) { json::appendQuoted(utf8, output_); }
   void appendBase64(std::string_view bytes);
   void appendUnknown(const UnknownField& field);
 

@@ -107,6 +107,9 @@ constexpr OptionDescription delimited{'d', "--delimited", flag, "read and write 
                                       set<&Options::isDelimited>};
 constexpr OptionDescription unknown{noLetter, "--unknown", flag, "show unknown fields in JSON",
                                     set<&Options::showsUnknownFields>};
+constexpr OptionDescription defaults{noLetter, "--defaults", flag,
+                                     "show fields that are absent, with their defaults",
+                                     set<&Options::showsDefaults>};
 constexpr OptionDescription bytes{noLetter, "--bytes", flag, "compare the encodings too",
                                   set<&Options::comparesEncodings>};
 constexpr OptionDescription quiet{'q', "--quiet", flag, "say nothing, the exit status tells",
@@ -131,7 +134,7 @@ constexpr auto decodeOptions =
     list(type, payload, noUnwrap, from, to, delimited, unknown, maximumSize, output, help);
 constexpr auto encodeOptions = list(type, payload, from, to, delimited, maximumSize, output, help);
 constexpr auto inspectOptions =
-    list(type, payload, noUnwrap, from, delimited, colour, maximumSize, output, help);
+    list(type, payload, noUnwrap, from, to, delimited, defaults, colour, maximumSize, output, help);
 constexpr auto diffOptions =
     list(type, payload, noUnwrap, from, delimited, bytes, quiet, colour, maximumSize, output, help);
 constexpr auto identifyOptions = list(from, delimited, maximumSize, output, help);
@@ -140,6 +143,7 @@ constexpr auto printingOptions = list(help);
 constexpr std::array allFormats{Format::binary, Format::hex, Format::base64, Format::text, Format::json};
 constexpr auto byteFormats = std::span(allFormats).first<3>();
 constexpr auto readableFormats = std::span(allFormats).last<2>();
+constexpr std::array shownFormats{Format::text, Format::json, Format::html};
 
 constexpr Example decodeExamples[] = {
     {"orv decode --delimited capture.bin", "shows the messages of a capture"},
@@ -199,7 +203,7 @@ constexpr Command commands[] = {
              "the payload of an envelope in its place. Malformed bytes are shown up to the error.",
      .operands = Operands::files,
      .from = {.allowed = allFormats, .byDefault = Format::binary},
-     .to = {},
+     .to = {.allowed = shownFormats, .byDefault = Format::text},
      .options = inspectOptions,
      .examples = inspectExamples},
     {.name = "convert",

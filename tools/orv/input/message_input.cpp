@@ -117,7 +117,10 @@ ExitStatus forEachMessage(const Options& options, OutputFile& output, MessageWor
     if (output.hasFailed()) return outcome.error().status;
     if (status == ExitStatus::done) status = outcome.error().status;
   }
-  if (auto finished = status == ExitStatus::done ? output.finish() : output.flush(); !finished) {
+  const bool isKept = status == ExitStatus::done || (status == ExitStatus::malformed && work.showsErrors());
+  auto finished = work.finish();
+  if (finished) finished = isKept ? output.finish() : output.flush();
+  if (!finished) {
     report(finished.error());
     return finished.error().status;
   }

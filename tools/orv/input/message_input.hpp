@@ -71,6 +71,9 @@ class MessageWork {
   virtual Outcome<void> take(const MessageInput& message) = 0;
   // A file ends in a piece that is no message.
   virtual Outcome<void> takeEnd(const Failure&) { return {}; }
+  // There are no more files. The output of malformed input stays where it is what was asked for.
+  virtual Outcome<void> finish() { return {}; }
+  virtual bool showsErrors() const { return false; }
 
  protected:
   ~MessageWork() = default;

@@ -2,14 +2,16 @@
 
 #include <algorithm>
 
-#include <orv/byte_view.hpp>
-#include <orv/spelling/hex.hpp>
+#include <orv/internal/hex_digits.hpp>
+#include <orv/spelling/value_text.hpp>
 
 namespace orv::tool {
 
 namespace {
 
+// Of the bytes: the offset's digits, of which there are rarely more than four, and a gap.
 constexpr std::size_t offsetDigits = 4;
+constexpr std::size_t bytesColumn = offsetDigits + 2;
 constexpr std::size_t pathColumn = 32;
 constexpr std::size_t kindColumn = 7;
 
@@ -18,25 +20,30 @@ constexpr std::size_t wide = 140;
 constexpr std::size_t middling = 100;
 constexpr std::size_t narrow = 72;
 
+// As hexNumber, without a string.
+std::string_view hexDigits(std::uint64_t number, std::span<char, 16> digits) {
+  std::size_t at = digits.size();
+  for (; number != 0 || at > digits.size() - offsetDigits; number >>= 4)
+    digits[--at] = internal::hexDigits[number & 0xF];
+  return {digits.data() + at, digits.size() - at};
+}
+
+// Two digits and a space for each byte.
+void appendSpacedHex(std::span<const std::byte> bytes, std::string& output) {
+  const std::size_t start = output.size();
+  output.resize(start + 3 * bytes.size(), ' ');
+  char* target = output.data() + start;
+  for (const std::byte byte : bytes) {
+    *target++ = internal::hexDigits[std::to_integer<std::size_t>(byte >> 4)];
+    *target++ = internal::hexDigits[std::to_integer<std::size_t>(byte & std::byte{0xF})];
+    ++target;
+  }
+}
+
 std::size_t rowSize(std::size_t width) {
   if (width == 0) return 8;
   if (width >= wide) return 16;
   return width >= narrow ? 8 : 4;
-}
-
-std::size_t columns(std::string_view text) {
-  return static_cast<std::size_t>(std::ranges::count_if(text, spelling::startsCharacter));
-}
-
-// How much of the text stands in so many columns, where an ellipsis takes the place of the first character that
-// is left out.
-std::string_view fitting(std::string_view text, std::size_t room) {
-  if (text.size() <= room || columns(text) <= room) return text;
-  std::size_t end = 0;
-  for (std::size_t started = 0; end < text.size(); ++end) {
-    if (spelling::startsCharacter(text[end]) && ++started >= room) break;
-  }
-  return text.substr(0, end);
 }
 
 }  // namespace
@@ -47,7 +54,7 @@ DumpLayout::DumpLayout(std::size_t width, Palette palette)
       isAligned_(width == 0 || width >= middling),
       palette_(palette) {}
 
-std::size_t DumpLayout::noteColumn() const { return offsetDigits + 2 + 3 * bytesPerRow_ + 1; }
+std::size_t DumpLayout::noteColumn() const { return bytesColumn + 3 * bytesPerRow_ + 1; }
 
 void DumpLayout::appendHeading(std::string& output, std::string_view text) const {
   palette_.append(output, Palette::Colour::payload, text);
@@ -59,7 +66,7 @@ void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Not
   const bool isValueBelow = !fitsBeside(note);
   const std::size_t end = std::max(size, isValueBelow ? bytesPerRow_ + 1 : 1);
   for (std::size_t row = 0; row < end; row += bytesPerRow_) {
-    if (row == 0 || row < size) {
+    if (row < size) {
       appendBytes(output, bytes, row);
     } else {
       output.append(noteColumn(), ' ');
@@ -72,32 +79,36 @@ void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Not
 }
 
 void DumpLayout::appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const {
-  palette_.append(output, Palette::Colour::offset, spelling::hexNumber(bytes.offset + row, offsetDigits));
-  output += "  ";
+  char digits[16];
+  const std::string_view offset = hexDigits(bytes.offset + row, digits);
+  palette_.append(output, Palette::Colour::offset, offset);
+  // Longer offsets take of the gaps before and behind the bytes.
+  const std::size_t start = std::max(offset.size() + 1, bytesColumn);
+  output.append(start - offset.size(), ' ');
   const auto append = [&](Palette::Colour colour, std::span<const std::byte> part) {
     if (part.empty()) return;
     palette_.start(output, colour);
-    spelling::appendHex(charactersOf(part), output, " ");
-    output += ' ';
+    appendSpacedHex(part, output);
     palette_.stop(output);
   };
   const std::size_t headerEnd = bytes.header.size();
-  const std::size_t end = std::min(row + bytesPerRow_, headerEnd + bytes.value.size());
-  const std::size_t split = std::clamp(headerEnd, row, std::max(row, end));
-  append(Palette::Colour::tag, bytes.header.subspan(std::min(row, headerEnd), split - row));
+  const std::size_t end = std::max(row, std::min(row + bytesPerRow_, headerEnd + bytes.value.size()));
+  const std::size_t split = std::clamp(headerEnd, row, end);
+  if (split > row) append(Palette::Colour::tag, bytes.header.subspan(row, split - row));
   if (end > split) append(bytes.valueColour, bytes.value.subspan(split - headerEnd, end - split));
-  output.append(3 * (bytesPerRow_ - (std::max(row, end) - row)) + 1, ' ');
+  const std::size_t column = start + 3 * (end - row);
+  output.append(std::max(column + 1, noteColumn()) - column, ' ');
 }
 
 std::size_t DumpLayout::indentation(const Note& note) { return 2 * note.depth; }
 
 std::size_t DumpLayout::pathWidth(const Note& note) const {
   const std::size_t column = isAligned_ ? pathColumn - std::min(pathColumn, indentation(note)) : 0;
-  return std::max(columns(note.path), column) + 2;
+  return std::max(spelling::columns(note.path), column) + 2;
 }
 
 std::size_t DumpLayout::kindWidth(const Note& note) const {
-  return std::max(columns(note.kind), isAligned_ ? kindColumn : 0) + 2;
+  return std::max(spelling::columns(note.kind), isAligned_ ? kindColumn : 0) + 2;
 }
 
 std::size_t DumpLayout::roomBehind(std::size_t column) const {
@@ -107,18 +118,24 @@ std::size_t DumpLayout::roomBehind(std::size_t column) const {
 bool DumpLayout::fitsBeside(const Note& note) const {
   if (width_ == 0) return true;
   const std::size_t start = noteColumn() + indentation(note) + pathWidth(note) + kindWidth(note);
-  return columns(note.value) <= roomBehind(start);
+  return spelling::columns(note.value) <= roomBehind(start);
 }
 
-void DumpLayout::appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
-                               std::size_t room) const {
-  const std::string_view shown = fitting(text, room);
-  const bool isCut = shown.size() < text.size() && room != 0;
-  if (shown.empty() && !isCut) return;
+std::size_t DumpLayout::appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
+                                      std::size_t room) const {
+  if (text.empty() || room == 0) return 0;
+  const std::size_t width = spelling::columns(text);
   palette_.start(output, colour);
-  output += shown;
-  if (isCut) output += "…";
+  std::size_t shown = width;
+  if (width <= room) {
+    output += text;
+  } else {
+    const std::string_view start = spelling::startWithin(text, room - 1);
+    output.append(start).append("…");
+    shown = spelling::columns(start) + 1;
+  }
   palette_.stop(output);
+  return shown;
 }
 
 void DumpLayout::appendNote(std::string& output, const Note& note) const {
@@ -126,8 +143,7 @@ void DumpLayout::appendNote(std::string& output, const Note& note) const {
   output.append(column - noteColumn(), ' ');
   const auto append = [&](Palette::Colour colour, std::string_view text, std::size_t width) {
     const std::size_t room = std::min(width, roomBehind(column));
-    appendFitting(output, colour, text, room);
-    output.append(room - std::min(room, columns(text)), ' ');
+    output.append(room - appendFitting(output, colour, text, room), ' ');
     column += room;
   };
   append(note.colour == Palette::Colour::value ? Palette::Colour::name : note.colour, note.path,
@@ -147,7 +163,7 @@ void DumpLayout::appendValue(std::string& output, const Note& note, bool isBelow
 }
 
 void DumpLayout::appendError(std::string& output, std::string_view text) const {
-  const bool fits = width_ == 0 || noteColumn() + columns(text) <= width_;
+  const bool fits = width_ == 0 || noteColumn() + spelling::columns(text) <= width_;
   output.append(fits ? noteColumn() : 0, ' ');
   palette_.append(output, Palette::Colour::error, text);
   output += '\n';

@@ -23,7 +23,7 @@ class DumpLayout {
     std::size_t depth = 0;  // of payloads
     std::string_view path;
     std::string_view kind;
-    std::string value;
+    std::string_view value;
     Palette::Colour colour = Palette::Colour::value;
   };
 
@@ -45,9 +45,9 @@ class DumpLayout {
   // Path and kind.
   void appendNote(std::string& output, const Note& note) const;
   void appendValue(std::string& output, const Note& note, bool isBelow) const;
-  // The text in so many columns, with an ellipsis where it is cut.
-  void appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
-                     std::size_t room) const;
+  // The text in so many columns, with an ellipsis where it is cut. Answers how many it takes.
+  std::size_t appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
+                            std::size_t room) const;
 
   // Places and widths in columns.
   std::size_t noteColumn() const;

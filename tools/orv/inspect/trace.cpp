@@ -1,9 +1,10 @@
 #include "tools/orv/inspect/trace.hpp"
 
+#include <algorithm>
+#include <array>
 #include <cassert>
 #include <charconv>
 #include <string>
-#include <vector>
 
 #include <orv/byte_view.hpp>
 #include <orv/utf8.hpp>
@@ -33,39 +34,47 @@ constexpr WireType wireTypeOf(ValueType type) {
   return WireType::lengthDelimited;
 }
 
+constexpr std::size_t mostFields = [] {
+  std::size_t most = 0;
+  AllMessages::forEach([&]<class M>() { most = std::max(most, M::descriptor().fields.size()); });
+  return most;
+}();
+
 class Tracer {
  public:
-  explicit Tracer(TraceSink& sink) : sink_(sink) {}
+  Tracer(TraceSink& sink, AbsentFields absent) : sink_(sink), absent_(absent) {}
 
   // `nesting` is how many messages the bytes are already in.
   End traceMessage(const MessageDescriptor& message, std::span<const std::byte> bytes, int nesting) {
     WireReader reader(bytes);
     const std::size_t pathSize = path_.size();
-    std::vector<std::size_t> occurrences;  // of repeated fields, by the field's place in the message
+    Occurrences occurrences{};
     while (!reader.isAtEnd()) {
       const std::byte* const start = reader.position();
       const auto tag = reader.readTag();
       if (!tag) return End::malformed;
       const FieldDescriptor* const field = message.field(tag->fieldNumber());
       const bool isTaken = field != nullptr && tag->wireType() == wireTypeOf(field->type);
-      TracedRecord record{
-          .type = {}, .field = field, .tag = *tag, .path = {}, .header = {}, .value = {}, .number = 0};
+      TracedRecord record{.type = {},
+                          .field = field,
+                          .tag = *tag,
+                          .path = {},
+                          .header = {},
+                          .value = {},
+                          .number = 0,
+                          .level = static_cast<std::size_t>(nesting)};
       if (isTaken) record.type = field->type;
       if (!readValue(reader, start, nesting, record)) return End::malformed;
       record.header = {start, record.value.data()};
 
-      path_.resize(pathSize);
-      if (pathSize != 0) path_ += '.';
-      if (field != nullptr) {
-        path_ += field->name;
-      } else {
-        appendNumber(tag->fieldNumber(), path_);
-      }
-      if (isTaken && field->kind == FieldKind::repeated) {
-        occurrences.resize(message.fields.size());
-        path_ += '[';
-        appendNumber(occurrences[static_cast<std::size_t>(field - message.fields.data())]++, path_);
-        path_ += ']';
+      enterField(pathSize, field, tag->fieldNumber());
+      if (isTaken) {
+        const std::uint32_t index = occurrences[static_cast<std::size_t>(field - message.fields.data())]++;
+        if (field->kind == FieldKind::repeated) {
+          path_ += '[';
+          appendNumber(index, path_);
+          path_ += ']';
+        }
       }
       record.path = path_;
       if (!sink_.record(record)) return End::stopped;
@@ -74,10 +83,47 @@ class Tracer {
         return end;
     }
     path_.resize(pathSize);
-    return End::ofInput;
+    const End end =
+        absent_ == AbsentFields::tell ? tellAbsent(message, reader, nesting, occurrences) : End::ofInput;
+    path_.resize(pathSize);
+    return end;
   }
 
  private:
+  // How often each field was there, by its place in its message.
+  using Occurrences = std::array<std::uint32_t, mostFields>;
+
+  void enterField(std::size_t pathSize, const FieldDescriptor* field, std::uint32_t number) {
+    path_.resize(pathSize);
+    if (pathSize != 0) path_ += '.';
+    if (field != nullptr) {
+      path_ += field->name;
+    } else {
+      appendNumber(number, path_);
+    }
+  }
+
+  End tellAbsent(const MessageDescriptor& message, const WireReader& reader, int nesting,
+                 const Occurrences& occurrences) {
+    const std::size_t pathSize = path_.size();
+    const std::span<const std::byte> none(reader.position(), 0);
+    for (std::size_t at = 0; at < message.fields.size(); ++at) {
+      if (occurrences[at] != 0) continue;
+      const FieldDescriptor& field = message.fields[at];
+      enterField(pathSize, &field, field.number);
+      if (!sink_.record({.type = field.type,
+                         .field = &field,
+                         .tag = {},
+                         .path = path_,
+                         .header = none,
+                         .value = none,
+                         .number = 0,
+                         .level = static_cast<std::size_t>(nesting)}))
+        return End::stopped;
+    }
+    return End::ofInput;
+  }
+
   // Reads what stands behind the record's tag, into the record. False for what is malformed.
   static bool readValue(WireReader& reader, const std::byte* start, int nesting, TracedRecord& record) {
     const std::byte* const valueStart = reader.position();
@@ -96,14 +142,15 @@ class Tracer {
   }
 
   TraceSink& sink_;
+  AbsentFields absent_;
   std::string path_;  // of the message or field that is being read
 };
 
 }  // namespace
 
 std::expected<bool, DecodeError> trace(const MessageType& type, std::span<const std::byte> bytes,
-                                       TraceSink& sink) {
-  const End end = Tracer(sink).traceMessage(*type.descriptor, bytes, 0);
+                                       TraceSink& sink, AbsentFields absent) {
+  const End end = Tracer(sink, absent).traceMessage(*type.descriptor, bytes, 0);
   if (end != End::malformed) return end == End::ofInput;
   const auto parsed = parseMessage(type, bytes, PayloadPairing::closed());
   assert(!parsed);

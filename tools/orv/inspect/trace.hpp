@@ -14,7 +14,7 @@
 
 namespace orv::tool {
 
-// One record of the wire, as the message's decoding takes it.
+// One record of the wire, as the message's decoding takes it; or a field that has none, where its message ends.
 struct TracedRecord {
   // What the field that takes the record holds; none for a record that is kept as unknown.
   std::optional<ValueType> type;
@@ -27,6 +27,10 @@ struct TracedRecord {
   std::span<const std::byte> header;  // the tag, and the length if there is one
   std::span<const std::byte> value;   // what is behind it; for a message, its records follow on their own
   std::uint64_t number;               // of a varint or a fixed-size number
+  std::size_t level;                  // how many messages it is in, beside the outermost
+
+  // A field without a record: without a tag, and all its bytes are none, at the end of its message.
+  bool isAbsent() const { return tag.value == 0; }
 
   // Of the enumeration's case; empty for a number without a name.
   std::string_view caseName() const {
@@ -46,8 +50,9 @@ class TraceSink {
 
 // Reads the bytes as a message of the type, by its descriptor. Answers whether the sink saw them to their end;
 // the error of malformed bytes is the one that parsing them gives, and the records before it were handed out.
-// Nothing of the message is kept, so memory does not grow with the input.
+// Nothing of the message is kept, so memory does not grow with the input. Fields without a record are told on demand.
+enum class AbsentFields : bool { leaveOut, tell };
 std::expected<bool, DecodeError> trace(const MessageType& type, std::span<const std::byte> bytes,
-                                       TraceSink& sink);
+                                       TraceSink& sink, AbsentFields absent = AbsentFields::leaveOut);
 
 }  // namespace orv::tool

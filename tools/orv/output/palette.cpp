@@ -42,15 +42,10 @@ void Palette::append(std::string& output, Colour colour, std::string_view text) 
   stop(output);
 }
 
-void Palette::start(std::string& output, Colour colour) const {
-  if (!isOn_) return;
+void Palette::startColour(std::string& output, Colour colour) {
   output += "\033[";
   output += codes[static_cast<std::size_t>(colour)];
   output += 'm';
-}
-
-void Palette::stop(std::string& output) const {
-  if (isOn_) output += "\033[0m";
 }
 
 }  // namespace orv::tool

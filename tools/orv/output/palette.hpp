@@ -38,10 +38,16 @@ class Palette {
   void append(std::string& output, Colour colour, std::string_view text) const;
 
   // What is appended from the start to the stop is in the colour.
-  void start(std::string& output, Colour colour) const;
-  void stop(std::string& output) const;
+  void start(std::string& output, Colour colour) const {
+    if (isOn_) startColour(output, colour);
+  }
+  void stop(std::string& output) const {
+    if (isOn_) output += "\033[0m";
+  }
 
  private:
+  static void startColour(std::string& output, Colour colour);
+
   bool isOn_;
 };
 

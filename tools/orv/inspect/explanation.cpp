@@ -1,0 +1,196 @@
+#include "tools/orv/inspect/explanation.hpp"
+
+#include <algorithm>
+#include <array>
+#include <charconv>
+
+#include <orv/byte_view.hpp>
+#include <orv/spelling/value_text.hpp>
+#include "tools/orv/input/frame_reader.hpp"
+#include "tools/orv/inspect/renderers.hpp"
+
+namespace orv::tool {
+
+namespace {
+
+// In the order of ValueType; what is unknown is called by its wire type.
+constexpr std::array<std::string_view, 6> typeNames{"string", "bytes", "bool", "uint32", "enum", "message"};
+
+// In the order of WireType.
+constexpr std::array<std::string_view, 6> wireTypeNames{"varint", "fixed64", "bytes",
+                                                        "group",  "group",   "fixed32"};
+
+template <class Number>
+void appendNumber(Number number, std::string& output) {
+  char digits[20];
+  output.append(digits, std::to_chars(digits, digits + sizeof digits, number).ptr);
+}
+
+// How many bytes, and which, if they can be read.
+void appendBytes(std::string_view bytes, std::string& output) {
+  appendByteCount(bytes.size(), output);
+  if (bytes.empty() || !spelling::isReadable(bytes)) return;
+  output += ' ';
+  spelling::appendQuotedText(bytes, output);
+}
+
+void appendUnknown(const TracedRecord& record, std::string& output) {
+  output += record.field != nullptr ? "another wire type than the field's, kept as unknown: " : "unknown: ";
+  switch (record.tag.wireType()) {
+    case WireType::lengthDelimited: return appendBytes(charactersOf(record.value), output);
+    case WireType::startGroup: return appendByteCount(record.value.size(), output);
+    default: return appendNumber(record.number, output);
+  }
+}
+
+// Goes through one message, and the payload of an envelope in its place.
+class Explainer final : public TraceSink {
+ public:
+  Explainer(const ExplainedMessage& message, const Options& options, Renderer& renderer, OutputFile& output)
+      : message_(message),
+        renderer_(renderer),
+        output_(output),
+        absent_(options.showsDefaults ? AbsentFields::tell : AbsentFields::leaveOut),
+        shownUpTo_(message.bytes.data()) {
+    if (!message.type.isEnvelope()) return;
+    const EnvelopeOutline outline = outlineOf(message.bytes);
+    payload_ = outline.data ? options.payloads.payloadOf(outline.type) : nullptr;
+    if (payload_ != nullptr) payloadStart_ = outline.data->data();
+  }
+
+  Outcome<std::optional<DecodeError>> run() {
+    renderer_.beginMessage(message_);
+    if (const auto traced = trace(message_.type, message_.bytes, *this, absent_); !traced)
+      error_ = traced.error();
+    if (error_) showError();
+    renderer_.endMessage();
+    if (auto written = writeOutput(0); !written) return std::unexpected(written.error());
+    return error_;
+  }
+
+  bool record(const TracedRecord& record) override {
+    const bool isPayload = level_ == 0 && record.level == 0 && payload_ != nullptr &&
+                           record.type == ValueType::bytes && record.value.data() == payloadStart_ &&
+                           !record.isAbsent();
+    const MessageDescriptor* const opened = isPayload ? payload_->descriptor
+                                            : record.type == ValueType::message && !record.isAbsent()
+                                                ? record.field->message
+                                                : nullptr;
+    const ExplainedRecord explained{.record = record,
+                                    .offset = offsetOf(record.header.data()),
+                                    .message = opened,
+                                    .payloadPath = payloadPath_,
+                                    .level = level_ + record.level};
+    renderer_.record(explained);
+    shownUpTo_ = record.value.data() + explained.shownValue().size();
+    // A long message is written piece by piece.
+    constexpr std::size_t enough = std::size_t{64} << 10;
+    return writeOutput(enough).has_value() && (!isPayload || showPayload(record));
+  }
+
+ private:
+  bool showPayload(const TracedRecord& data) {
+    payloadPath_ = data.path;
+    level_ = 1;
+    const auto traced = trace(*payload_, data.value, *this, absent_);
+    payloadPath_ = {};
+    if (traced) {
+      level_ = 0;
+      return *traced;
+    }
+    error_ = traced.error();
+    error_->offset += static_cast<std::size_t>(data.value.data() - message_.bytes.data());
+    return false;
+  }
+
+  void showError() {
+    const auto rest = message_.bytes.subspan(static_cast<std::size_t>(shownUpTo_ - message_.bytes.data()));
+    const std::ptrdiff_t good = message_.bytes.data() + error_->offset - shownUpTo_;
+    renderer_.error({.error = *error_,
+                     .offset = offsetOf(shownUpTo_),
+                     .rest = rest,
+                     .good = static_cast<std::size_t>(std::clamp<std::ptrdiff_t>(good, 0, std::ssize(rest))),
+                     .isInPayload = level_ != 0,
+                     .text = "error at " + bytePlace(message_.offset + error_->offset) + ": " +
+                             error_->path.text() + ": " + error_->reason()});
+  }
+
+  // What the renderer has, if it is more than this.
+  Outcome<void> writeOutput(std::size_t enough) {
+    std::string& text = renderer_.output();
+    if (!written_ || text.size() <= enough) return written_;
+    written_ = output_.write(text);
+    text.clear();
+    return written_;
+  }
+
+  std::uint64_t offsetOf(const std::byte* at) const {
+    return message_.offset + static_cast<std::uint64_t>(at - message_.bytes.data());
+  }
+
+  const ExplainedMessage& message_;
+  Renderer& renderer_;
+  OutputFile& output_;
+  AbsentFields absent_;
+  const std::byte* shownUpTo_;
+  const MessageType* payload_ = nullptr;  // of the envelope that is shown
+  const std::byte* payloadStart_ = nullptr;
+  std::string_view payloadPath_;
+  std::size_t level_ = 0;  // of the payload's fields
+  std::optional<DecodeError> error_;
+  Outcome<void> written_;
+};
+
+}  // namespace
+
+void appendByteCount(std::size_t count, std::string& output) {
+  appendNumber(count, output);
+  output += count == 1 ? " byte" : " bytes";
+}
+
+std::string_view ExplainedRecord::kind() const {
+  if (record.type) return typeNames[static_cast<std::size_t>(*record.type)];
+  return wireTypeNames[static_cast<std::size_t>(record.tag.wireType())];
+}
+
+void ExplainedRecord::appendValue(std::string& output) const {
+  if (record.isAbsent() && record.field->kind != FieldKind::implicitPresence) {
+    output += record.field->kind == FieldKind::repeated ? "empty" : "absent";
+    return;
+  }
+  if (message != nullptr) {
+    appendByteCount(record.value.size(), output);
+    output.append(", ").append(message->fullName);
+    return;
+  }
+  if (!record.type) return appendUnknown(record, output);
+  switch (*record.type) {
+    case ValueType::string: spelling::appendQuotedText(charactersOf(record.value), output); break;
+    case ValueType::bytes: appendBytes(charactersOf(record.value), output); break;
+    case ValueType::boolean: output += record.number != 0 ? "true" : "false"; break;
+    case ValueType::uint32: appendNumber(static_cast<std::uint32_t>(record.number), output); break;
+    case ValueType::message: break;  // is told by its type
+    case ValueType::enumeration: {
+      const std::string_view name = record.caseName();
+      if (!name.empty()) output.append(name).append(" (");
+      appendNumber(static_cast<std::int32_t>(record.number), output);
+      if (!name.empty()) output += ')';
+    }
+  }
+  if (record.isAbsent()) output += ", by default";
+}
+
+std::unique_ptr<Renderer> Renderer::make(const Options& options) {
+  switch (options.to.value_or(Format::text)) {
+    case Format::json: return makeJsonRenderer(options);
+    case Format::html: return makeHtmlRenderer(options);
+    default: return makeTextRenderer(options);
+  }
+}
+
+Outcome<std::optional<DecodeError>> explain(const ExplainedMessage& message, const Options& options,
+                                            Renderer& renderer, OutputFile& output) {
+  return Explainer(message, options, renderer, output).run();
+}
+
+}  // namespace orv::tool

@@ -1,0 +1,124 @@
+#include <orv/byte_view.hpp>
+#include <orv/json/renderer.hpp>
+#include <orv/spelling/base64.hpp>
+#include <orv/spelling/value_text.hpp>
+#include "tools/orv/inspect/renderers.hpp"
+
+namespace orv::tool {
+
+namespace {
+
+// A document for each message, and in a stream a line. Values are what the JSON mapping has.
+class JsonRenderer final : public Renderer {
+ public:
+  explicit JsonRenderer(const Options& options) : options_(options) {}
+
+  void beginMessage(const ExplainedMessage& message) override {
+    output_ += '{';
+    add("file", spelling::printable(message.path));
+    if (message.number != 0) add("message", message.number);
+    add("type", message.type.fullName());
+    add("offset", message.offset);
+    add("length", message.bytes.size());
+    output_ += ",\"fields\":[";
+    isFirst_ = true;
+    message_ = &message;
+  }
+
+  void record(const ExplainedRecord& explained) override {
+    const TracedRecord& record = explained.record;
+    if (!isFirst_) output_ += ',';
+    isFirst_ = false;
+    output_ += options_.isDelimited ? "{" : "\n  {";
+    path_ = explained.payloadPath;
+    if (!path_.empty()) path_ += '.';
+    path_ += record.path;
+    add("path", path_);
+    if (!record.isAbsent()) {
+      add("number", record.tag.fieldNumber());
+      add("offset", explained.offset);
+      add("header", record.header.size());
+      add("length", record.value.size());
+    }
+    add("kind", explained.kind());
+    if (!record.type) addLiteral("unknown", "true");
+    if (record.isAbsent()) addLiteral("absent", "true");
+    if (explained.message != nullptr) {
+      add("message", explained.message->fullName);
+    } else if (!record.isAbsent() || record.field->kind == FieldKind::implicitPresence) {
+      addValue(record);
+    }
+    output_ += '}';
+  }
+
+  void error(const ExplainedError& error) override {
+    output_ += "],\"error\":{";
+    add("offset", message_->offset + error.error.offset);
+    add("path", error.error.path.text());
+    add("reason", error.error.reason());
+    output_ += '}';
+    hasError_ = true;
+  }
+
+  void endMessage() override {
+    if (!hasError_) output_ += ']';
+    hasError_ = false;
+    output_ += "}\n";
+  }
+
+ private:
+  void addName(std::string_view name) {
+    if (!output_.ends_with('{')) output_ += ',';
+    output_.append("\"").append(name).append("\":");
+  }
+  void add(std::string_view name, std::string_view text) {
+    addName(name);
+    json::appendQuoted(text, output_);
+  }
+  void add(std::string_view name, std::uint64_t number) { addLiteral(name, std::to_string(number)); }
+  void addLiteral(std::string_view name, std::string_view literal) {
+    addName(name);
+    output_ += literal;
+  }
+  void addBytes(std::span<const std::byte> bytes) {
+    addName("value");
+    output_ += '"';
+    spelling::appendBase64(charactersOf(bytes), output_);
+    output_ += '"';
+  }
+
+  void addValue(const TracedRecord& record) {
+    // Numbers of 64 bits are more than a script may take.
+    if (!record.type) {
+      const bool isNumber =
+          record.tag.wireType() != WireType::lengthDelimited && record.tag.wireType() != WireType::startGroup;
+      return isNumber ? add("value", std::string_view(std::to_string(record.number)))
+                      : addBytes(record.value);
+    }
+    switch (*record.type) {
+      case ValueType::string: return add("value", charactersOf(record.value));
+      case ValueType::bytes: return addBytes(record.value);
+      case ValueType::boolean: return addLiteral("value", record.number != 0 ? "true" : "false");
+      case ValueType::uint32:
+        return addLiteral("value", std::to_string(static_cast<std::uint32_t>(record.number)));
+      case ValueType::message: return;
+      case ValueType::enumeration:
+        if (const std::string_view name = record.caseName(); !name.empty()) return add("value", name);
+        addLiteral("value", std::to_string(static_cast<std::int32_t>(record.number)));
+    }
+  }
+
+  const Options& options_;
+  const ExplainedMessage* message_ = nullptr;
+  std::string path_;
+  bool isFirst_ = true;
+  bool hasError_ = false;
+};
+
+}  // namespace
+
+std::unique_ptr<Renderer> makeJsonRenderer(const Options& options) {
+  return std::make_unique<JsonRenderer>(options);
+}
+
+}  // namespace orv::tool
