@@ -22,10 +22,15 @@ enum class ExitStatus : std::uint8_t {
   fileError = 4,  // a file that cannot be read or written
 };
 
-// What ends the work on a file, or all of it: a status, and the one line that says why.
+// How much of the input is lost by a failure: what is nested in a message, a message, or all that follows.
+enum class Extent : std::uint8_t { part, message, rest };
+
+// Why something could not be done: a status, and the one line that says it.
 struct Failure {
   ExitStatus status;
   std::string line;
+  Extent extent = Extent::rest;
+  std::string reason{};  // the line's end, behind file and message, where there is a message
 };
 
 template <class T>

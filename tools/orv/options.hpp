@@ -31,6 +31,7 @@ struct Options {
   std::optional<Format> from;  // none: to be seen from the input
   std::optional<Format> to;    // none: the command writes no messages
   bool isDelimited = false;
+  bool keepsGoing = false;
   bool showsUnknownFields = false;
   bool showsDefaults = false;
   bool comparesEncodings = false;

@@ -94,6 +94,7 @@ std::expected<bool, Failure> readWords(const Command& command, std::span<char*> 
 // Says which of the options changes nothing, if one does.
 std::optional<std::string> withoutEffect(const Options& options) {
   const PayloadPairing& payloads = options.payloads;
+  if (options.keepsGoing && !options.isDelimited) return "--keep-going is for streams, with --delimited";
   if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
   if (!payloads.isClosed() && !payloads.hasOverrides()) return std::nullopt;
   if (payloads.isClosed() && payloads.hasOverrides())

@@ -105,6 +105,8 @@ constexpr OptionDescription to{
     noLetter, "--to", "FORMAT", "the output's format", takeFormat<&Options::to, &Command::to>, &Command::to};
 constexpr OptionDescription delimited{'d', "--delimited", flag, "read and write streams of messages",
                                       set<&Options::isDelimited>};
+constexpr OptionDescription keepGoing{
+    'k', "--keep-going", flag, "go on behind malformed messages of a stream", set<&Options::keepsGoing>};
 constexpr OptionDescription unknown{noLetter, "--unknown", flag, "show unknown fields in JSON",
                                     set<&Options::showsUnknownFields>};
 constexpr OptionDescription defaults{noLetter, "--defaults", flag,
@@ -131,13 +133,13 @@ constexpr std::array<const OptionDescription*, sizeof...(Options)> list(const Op
 }
 constexpr auto generalOptions = list(help, version);
 constexpr auto decodeOptions =
-    list(type, payload, noUnwrap, from, to, delimited, unknown, maximumSize, output, help);
-constexpr auto encodeOptions = list(type, payload, from, to, delimited, maximumSize, output, help);
-constexpr auto inspectOptions =
-    list(type, payload, noUnwrap, from, to, delimited, defaults, colour, maximumSize, output, help);
+    list(type, payload, noUnwrap, from, to, delimited, keepGoing, unknown, maximumSize, output, help);
+constexpr auto encodeOptions = list(type, payload, from, to, delimited, keepGoing, maximumSize, output, help);
+constexpr auto inspectOptions = list(type, payload, noUnwrap, from, to, delimited, keepGoing, defaults,
+                                     colour, maximumSize, output, help);
 constexpr auto diffOptions =
     list(type, payload, noUnwrap, from, delimited, bytes, quiet, colour, maximumSize, output, help);
-constexpr auto identifyOptions = list(from, delimited, maximumSize, output, help);
+constexpr auto identifyOptions = list(from, delimited, keepGoing, maximumSize, output, help);
 constexpr auto printingOptions = list(help);
 
 constexpr std::array allFormats{Format::binary, Format::hex, Format::base64, Format::text, Format::json};

@@ -3,6 +3,7 @@
 #include <string_view>
 
 #include <orv/delimited_stream.hpp>
+#include <orv/json/renderer.hpp>
 #include <orv/spelling/base64.hpp>
 #include <orv/spelling/hex.hpp>
 #include "tools/orv/command_line/command.hpp"
@@ -19,18 +20,29 @@ class Conversion final : public MessageWork {
   Conversion(const Options& options, OutputFile& output)
       : options_(options), format_(*options.to), output_(output) {}
 
-  // A message that came as bytes is written to bytes as it came, once it was checked.
+  // A message that came as bytes is written to bytes as it came, once it was checked. What is malformed is
+  // written as bytes, with the error beside it where the format has a place for it.
   Outcome<void> take(const MessageInput& input) override {
-    if (isBytes(format_)) return writeEncoding(input);
+    if (isBytes(format_)) return takeEncoding(input);
     const auto message = input.message();
-    if (!message) return std::unexpected(message.error());
-    return output_.write(format_ == Format::json ? json(**message) : text(input, **message));
+    if (message) return write(input, message->get(), {});
+    const Failure& failure = message.error();
+    if (failure.extent == Extent::message && !options_.keepsGoing) return std::unexpected(failure);
+    const auto closed = input.message(PayloadPairing::closed());
+    if (auto written = write(input, closed ? closed->get() : nullptr, failure.reason); !written)
+      return written;
+    return std::unexpected(failure);
   }
 
  private:
-  Outcome<void> writeEncoding(const MessageInput& input) {
-    if (auto checked = input.check(); !checked) return checked;
-    std::string_view bytes = input.encoding();
+  Outcome<void> takeEncoding(const MessageInput& input) {
+    const auto checked = input.check();
+    if (!checked && !options_.keepsGoing) return checked;
+    if (auto written = writeEncoding(input.encoding()); !written) return written;
+    return checked;
+  }
+
+  Outcome<void> writeEncoding(std::string_view bytes) {
     std::string piece;
     if (options_.isDelimited) {
       appendDelimited(bytes, piece);
@@ -43,13 +55,36 @@ class Conversion final : public MessageWork {
     return output_.write(spelled + '\n');
   }
 
-  std::string json(const MessageValue& message) const {
-    return message.json(
-               {.isIndented = !options_.isDelimited, .showsUnknownFields = options_.showsUnknownFields}) +
-           '\n';
+  // Without a message, the bytes that are none.
+  Outcome<void> write(const MessageInput& input, const MessageValue* message, std::string_view error) {
+    return output_.write(format_ == Format::json ? json(input, message, error) : text(input, message, error));
   }
 
-  std::string text(const MessageInput& input, const MessageValue& message) {
+  std::string json(const MessageInput& input, const MessageValue* message, std::string_view error) const {
+    const bool isIndented = !options_.isDelimited;
+    std::string document = "{}";
+    if (message != nullptr)
+      document = message->json({.isIndented = isIndented, .showsUnknownFields = options_.showsUnknownFields});
+    const auto addMember = [&](std::string_view name, std::string_view value) {
+      document.resize(document.size() - (isIndented && document.size() > 2 ? 2 : 1));
+      if (document.size() > 1) document += ',';
+      document += isIndented ? "\n  " : "";
+      json::appendQuoted(name, document);
+      document += isIndented ? ": " : ":";
+      json::appendQuoted(value, document);
+      document += isIndented ? "\n}" : "}";
+    };
+    if (!error.empty()) addMember("error", error);
+    if (message == nullptr) {
+      std::string bytes;
+      spelling::appendBase64(input.encoding(), bytes);
+      addMember("bytes", bytes);
+    }
+    return document + '\n';
+  }
+
+  // What is no field is a comment.
+  std::string text(const MessageInput& input, const MessageValue* message, std::string_view error) {
     std::string piece;
     if (options_.isDelimited) {
       if (!isFirst_) piece += '\n';
@@ -57,7 +92,11 @@ class Conversion final : public MessageWork {
       piece += ' ' + std::to_string(input.frame().number) + ", at " + bytePlace(input.frame().offset) + '\n';
     }
     isFirst_ = false;
-    return piece + message.text();
+    if (!error.empty()) piece.append("# error at ").append(error) += '\n';
+    if (message != nullptr) return piece + message->text();
+    piece += "# bytes ";
+    spelling::appendHex(input.encoding(), piece, " ");
+    return piece + '\n';
   }
 
   const Options& options_;

@@ -94,7 +94,7 @@ Failure FrameReader::malformed(const Frame& frame, std::string_view reason) cons
   if (frame.number != 0) line += ": message " + std::to_string(frame.number);
   line += ": ";
   line += reason;
-  return {ExitStatus::malformed, std::move(line)};
+  return {ExitStatus::malformed, std::move(line), Extent::rest, std::string(reason)};
 }
 
 Failure FrameReader::malformedBytes(const Frame& frame, std::uint64_t offset, std::string_view reason) const {

@@ -17,21 +17,50 @@ Format guessFormat(InputFile& file) {
   return first == '{' || first == '[' ? Format::json : Format::text;
 }
 
+// Tells of what failed, behind the output that came before it.
+Outcome<void> reportInPlace(const Failure& failure, OutputFile& output, Progress& progress) {
+  progress.clear();
+  if (auto flushed = output.flush(); !flushed) return flushed;
+  report(failure);
+  return {};
+}
+
+// A failure of which only a part was lost leaves the output as it should be.
 Outcome<void> takeMessages(const std::string& path, const Options& options, OutputFile& output,
                            MessageWork& work, Progress& progress) {
   const auto opened = MessageInput::open(path, options, output);
   if (!opened) return std::unexpected(opened.error());
   MessageInput& input = **opened;
-  for (;;) {
+  const Extent passable = options.keepsGoing ? Extent::message : Extent::part;
+  std::uint64_t messages = 0;
+  std::uint64_t malformed = 0;
+  Outcome<void> outcome;
+  for (;; ++messages) {
     const auto hasNext = input.next();
-    if (!hasNext) {
+    if (hasNext && !*hasNext) break;
+    outcome = hasNext ? work.take(input) : std::unexpected(hasNext.error());
+    if (!outcome && outcome.error().extent > passable) {
+      if (hasNext) break;
       if (auto taken = work.takeEnd(hasNext.error()); !taken) return taken;
-      return std::unexpected(hasNext.error());
+      break;
     }
-    if (!*hasNext) return {};
-    if (auto taken = work.take(input); !taken) return taken;
+    if (!outcome) {
+      ++malformed;
+      outcome.error().extent = Extent::part;
+      if (!options.isDelimited) break;
+      outcome = reportInPlace(outcome.error(), output, progress);
+      if (!outcome) return outcome;
+    }
     progress.update(input.frame().number, input.frame().offset);
   }
+  if (malformed == 0 || !options.isDelimited || output.hasFailed()) return outcome;
+  const Extent extent = outcome ? Extent::part : Extent::rest;
+  if (!outcome) outcome = reportInPlace(outcome.error(), output, progress);
+  if (!outcome) return outcome;
+  return std::unexpected(Failure{ExitStatus::malformed,
+                                 input.name() + ": " + std::to_string(malformed) + " of " +
+                                     std::to_string(messages) + " messages malformed",
+                                 extent});
 }
 
 }  // namespace
@@ -58,7 +87,10 @@ Outcome<bool> MessageInput::next() {
   encoding_ = frame_.content;
   if (isBytes(format_)) return true;
   auto encoded = format_ == Format::json ? encodeJson() : encodeText();
-  if (!encoded) return std::unexpected(std::move(encoded.error()));
+  if (!encoded) {
+    encoded.error().extent = Extent::message;
+    return std::unexpected(std::move(encoded.error()));
+  }
   encoded_ = std::move(*encoded);
   encoding_ = encoded_;
   return true;
@@ -91,8 +123,8 @@ Outcome<void> MessageInput::check() const {
   return {};
 }
 
-Outcome<OwnedMessage> MessageInput::message() const {
-  auto message = parseMessage(*options_.type, bytesOf(encoding_), options_.payloads);
+Outcome<OwnedMessage> MessageInput::message(const PayloadPairing& payloads) const {
+  auto message = parseMessage(*options_.type, bytesOf(encoding_), payloads);
   if (!message && !isBytes(format_)) {
     message = parseMessage(*options_.type, bytesOf(encoding_), PayloadPairing::closed());
   }
@@ -102,22 +134,31 @@ Outcome<OwnedMessage> MessageInput::message() const {
 
 Failure MessageInput::failureOf(const DecodeError& error) const {
   const std::string path = error.path.text();
-  return reader_->malformedBytes(frame_, error.offset, (path.empty() ? "" : path + ": ") + error.reason());
+  Failure failure =
+      reader_->malformedBytes(frame_, error.offset, (path.empty() ? "" : path + ": ") + error.reason());
+  const bool isMessage =
+      parseMessage(*options_.type, bytesOf(encoding_), PayloadPairing::closed()).has_value();
+  failure.extent = isMessage ? Extent::part : Extent::message;
+  return failure;
 }
 
 ExitStatus forEachMessage(const Options& options, OutputFile& output, MessageWork& work) {
   Progress progress(output.isTerminal());
   ExitStatus status = ExitStatus::done;
+  bool isComplete = true;
   for (const std::string& path : options.files) {
-    Outcome<void> outcome = takeMessages(path, options, output, work, progress);
+    const Outcome<void> outcome = takeMessages(path, options, output, work, progress);
     progress.clear();
     if (outcome) continue;
-    if (auto flushed = output.flush(); !flushed) outcome = std::unexpected(flushed.error());
-    report(outcome.error());
-    if (output.hasFailed()) return outcome.error().status;
+    isComplete = isComplete && outcome.error().extent == Extent::part;
+    const auto told = output.hasFailed() ? outcome : reportInPlace(outcome.error(), output, progress);
+    if (!told) {
+      report(told.error());
+      return told.error().status;
+    }
     if (status == ExitStatus::done) status = outcome.error().status;
   }
-  const bool isKept = status == ExitStatus::done || (status == ExitStatus::malformed && work.showsErrors());
+  const bool isKept = isComplete || (status == ExitStatus::malformed && work.showsErrors());
   auto finished = work.finish();
   if (finished) finished = isKept ? output.finish() : output.flush();
   if (!finished) {

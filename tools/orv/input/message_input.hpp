@@ -31,6 +31,8 @@ class MessageInput {
 
   // As the command line names the file.
   const std::string& path() const { return path_; }
+  // As errors name it.
+  const std::string& name() const { return file_.name(); }
   const Frame& frame() const { return frame_; }
 
   // The message's binary encoding: as it came if it came as bytes, and then not yet checked.
@@ -44,9 +46,10 @@ class MessageInput {
 
   // The message with its envelope opened. Where an envelope in text or JSON has its data as a string of bytes
   // that are not the payload they should be, it stays closed.
-  Outcome<OwnedMessage> message() const;
+  Outcome<OwnedMessage> message() const { return message(options_.payloads); }
+  Outcome<OwnedMessage> message(const PayloadPairing& payloads) const;
 
-  // The failure for an error in the encoding.
+  // The failure for an error in the encoding: in a part of it, where the message without the part is none.
   Failure failureOf(const DecodeError& error) const;
 
  private:
@@ -79,9 +82,10 @@ class MessageWork {
   ~MessageWork() = default;
 };
 
-// Hands out the messages of all files, one after the other, and writes what the work left in the output. A
-// file that fails is reported, behind the output that came before, and the others go on; the first failure
-// gives the status.
+// Hands out the messages of all files, one after the other, and writes what the work left in the output. What
+// fails is reported, behind the output that came before. A file ends with its first malformed message, or goes on
+// behind it where that was asked for or only a part is malformed, and the malformed ones of a stream are counted in
+// the end. Files go on behind one that fails; the first failure gives the status.
 ExitStatus forEachMessage(const Options& options, OutputFile& output, MessageWork& work);
 
 }  // namespace orv::tool
