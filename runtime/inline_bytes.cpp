@@ -6,6 +6,8 @@
 #include <new>
 #include <string>
 
+#include <orv/utf8.hpp>
+
 namespace orv::inline v0::internal {
 
 namespace {
@@ -13,31 +15,34 @@ namespace {
 // Unlike memmove and memcpy, these take a null pointer where there is nothing to copy.
 using std::char_traits;
 
-// Copies up to objectSize bytes, which may overlap, without a call: in two pieces of a fixed size, or three.
-void copyShort(char* target, const char* source, std::size_t size) {
-  const auto copyEnds = [&]<class Piece>(Piece) {
-    Piece first;
-    Piece last;
-    std::memcpy(&first, source, sizeof first);
-    std::memcpy(&last, source + size - sizeof last, sizeof last);
-    std::memcpy(target, &first, sizeof first);
-    std::memcpy(target + size - sizeof last, &last, sizeof last);
-  };
-  using Sixteen = std::array<std::uint64_t, 2>;
-  if (size > 32) {
-    Sixteen middle;
-    std::memcpy(&middle, source + sizeof middle, sizeof middle);
-    copyEnds(Sixteen());
-    std::memcpy(target + sizeof middle, &middle, sizeof middle);
-  } else if (size >= 16) {
-    copyEnds(Sixteen());
-  } else if (size >= 8) {
-    copyEnds(std::uint64_t());
-  } else if (size >= 4) {
-    copyEnds(std::uint32_t());
-  } else {
-    char_traits<char>::move(target, source, size);
+// Copies bytes in three pieces of one size, which may overlap: the first, the last and, where these do not meet, the
+// one in between. `mayTake` is given all of their bits before any is stored; what it answers is the answer.
+template <class Word, std::size_t words>
+[[gnu::always_inline]] inline bool copyPieces(char* target, const char* source, std::size_t size,
+                                              auto mayTake) {
+  using Piece = std::array<Word, words>;
+  const std::array<std::size_t, 3> places{0, size > 2 * sizeof(Piece) ? sizeof(Piece) : 0,
+                                          size - sizeof(Piece)};
+  std::array<Piece, 3> pieces;
+  Word bits = 0;
+  for (std::size_t at = 0; at < places.size(); ++at) {
+    std::memcpy(&pieces[at], source + places[at], sizeof(Piece));
+    for (const Word word : pieces[at]) bits |= word;
   }
+  if (!mayTake(bits)) return false;
+  for (std::size_t at = 0; at < places.size(); ++at)
+    std::memcpy(target + places[at], &pieces[at], sizeof(Piece));
+  return true;
+}
+
+// Copies up to objectSize bytes, which may overlap, without a call.
+[[gnu::always_inline]] inline bool copyShort(char* target, const char* source, std::size_t size,
+                                             auto mayTake) {
+  if (size >= 16) return copyPieces<std::uint64_t, 2>(target, source, size, mayTake);
+  if (size >= 8) return copyPieces<std::uint64_t, 1>(target, source, size, mayTake);
+  if (size >= 4) return copyPieces<std::uint32_t, 1>(target, source, size, mayTake);
+  if (size >= 1) return copyPieces<std::uint8_t, 1>(target, source, size, mayTake);
+  return true;
 }
 
 char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size)); }
@@ -53,7 +58,7 @@ void InlineBytes::assign(std::string_view bytes) {
       return;
     }
   } else if (bytes.size() <= inlineCapacity) {
-    copyShort(inlineData(), bytes.data(), bytes.size());
+    copyShort(inlineData(), bytes.data(), bytes.size(), [](auto) { return true; });
     raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
     return;
   }
@@ -61,6 +66,20 @@ void InlineBytes::assign(std::string_view bytes) {
   char_traits<char>::copy(block.data, bytes.data(), bytes.size());
   if (isOnHeap()) freeBlock();
   holdBlock(block);
+}
+
+bool InlineBytes::assignShortText(std::string_view text) {
+  const bool isWellFormed =
+      copyShort(isOnHeap() ? heapBlock().data : inlineData(), text.data(), text.size(), [&](auto bits) {
+        return (bits & static_cast<decltype(bits)>(highBits)) == 0 || utf8::isWellFormed(text);
+      });
+  if (!isWellFormed) return false;
+  if (isOnHeap()) {
+    setBlockSize(text.size());
+  } else {
+    raw_[tagOffset] = static_cast<unsigned char>(text.size());
+  }
+  return true;
 }
 
 void InlineBytes::append(std::string_view bytes) {

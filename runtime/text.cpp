@@ -10,6 +10,7 @@
 namespace orv::inline v0 {
 
 Text::Text(std::string_view utf8) {
+  if (utf8.size() <= internal::InlineBytes::inlineCapacity && bytes_.assignShortText(utf8)) return;
   std::size_t wellFormed = utf8::wellFormedPrefix(utf8);
   if (wellFormed == utf8.size()) [[likely]] {
     bytes_.assign(utf8);

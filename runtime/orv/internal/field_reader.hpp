@@ -256,6 +256,12 @@ class FieldReader {
     return {};
   }
 
+  [[gnu::always_inline]] Step takeUpTo(const std::byte* end) {
+    at_ = end;
+    isTaken_ = true;
+    return {};
+  }
+
   static bool isShortTag(std::uint32_t first) { return first - 8 < 0x80 - 8; }
 
   // Whether there are as many bytes of input from here on as fit inside an object.
@@ -352,23 +358,35 @@ class FieldReader {
     if (const std::byte* const bodyEnd = bodyEndIfShort(); bodyEnd != nullptr) [[likely]] {
       const std::byte* const start = at_ + 1;
       const auto size = static_cast<std::size_t>(bodyEnd - start);
-      // The common case: a short text with more input behind it is checked and copied in steps of a fixed
-      // size.
-      if (size <= InlineBytes::inlineCapacity && isReadableWithin(start) &&
-          (InlineBytes::isAsciiWithin(start, size) || utf8::isWellFormedWithin(start, size))) [[likely]] {
-        presentValue(slot).bytes_.assignWithin(start, size);
-        at_ = bodyEnd;
-        isTaken_ = true;
-        return {};
+      // With more input behind it, a short text is checked and copied in steps of a fixed size.
+      if (size <= InlineBytes::inlineCapacity) [[likely]] {
+        if (isReadableWithin(start)) {
+          if (InlineBytes::isAsciiWithin(start, size) || utf8::isWellFormedWithin(start, size)) [[likely]] {
+            presentValue(slot).bytes_.assignWithin(start, size);
+            return takeUpTo(bodyEnd);
+          }
+        } else if (takeShortText(slot, {reinterpret_cast<const char*>(start), size})) {
+          return takeUpTo(bodyEnd);
+        }
       }
     }
     const std::string_view text = readLongText(at_, end_, *frame_, tag_);
     if (text.data() == nullptr) [[unlikely]]
       return std::unexpected(Failed());
     presentValue(slot).bytes_.assign(text);
-    at_ = reinterpret_cast<const std::byte*>(text.data() + text.size());
-    isTaken_ = true;
-    return {};
+    return takeUpTo(reinterpret_cast<const std::byte*>(text.data() + text.size()));
+  }
+
+  // Whether it is well-formed; if not, the field stays as it was.
+  [[gnu::noinline]] static bool takeShortText(Text& value, std::string_view text) {
+    return value.bytes_.assignShortText(text);
+  }
+  [[gnu::noinline]] static bool takeShortText(std::optional<Text>& value, std::string_view text) {
+    if (value.has_value()) return takeShortText(*value, text);
+    if (takeShortText(value.emplace(), text)) [[likely]]
+      return true;
+    value.reset();
+    return false;
   }
 
   template <class Slot>

@@ -113,6 +113,9 @@ class InlineBytes {
   void assign(std::string_view bytes);
   void append(std::string_view bytes);
 
+  // Takes bytes that fit inside if they are well-formed UTF-8, and says whether they are.
+  bool assignShortText(std::string_view text);
+
   // Takes the first `size` bytes, which fit inside, of objectSize that may be read and are not this object's
   // own: one step of a fixed size, whatever their number.
   void assignWithin(const std::byte* bytes, std::size_t size) {
