@@ -285,8 +285,9 @@ constinit const CommandTable commandTable{
         "and so is no file. The payload of an envelope is shown as the message that the envelope's type "
         "names; that of a connectionResponse is a ConnectionResponse.Content.",
     .formats =
-        "The formats are binary, hex (digits with white space and 0x between bytes, as xxd -p prints "
-        "them), base64, text (the text format of Protocol Buffers) and json (its JSON mapping). With "
+        "The formats are binary, hex (digits however they are pasted: with commas, colons or 0x between "
+        "them, as an array or a string with escapes, as a dump of xxd or hexdump -C), base64, text (the text "
+        "format of Protocol Buffers) and json (its JSON mapping). With "
         "--delimited, input and output are streams: in the first three formats each message stands "
         "behind its length as a varint, JSON documents follow one another, one a line in the output, and "
         "messages in the text format each follow a line that begins with \"# message\".",

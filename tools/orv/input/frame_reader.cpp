@@ -102,6 +102,7 @@ Failure FrameReader::malformedBytes(const Frame& frame, std::uint64_t offset, st
 }
 
 Failure FrameReader::malformedText(const Frame& frame, spelling::TextError error) const {
+  if (error.line == 1) error.column += frame.column - 1;
   error.line += frame.line - 1;
   return malformed(frame, error.message());
 }

@@ -23,7 +23,9 @@ struct Frame {
   std::string_view content{};  // valid until the next frame is read
   std::uint64_t number = 0;    // of the message in a stream, from 1; 0 for input that is one message
   std::uint64_t offset = 0;  // of the content, in bytes of the input (of what it spells, for hex and base64)
-  std::size_t line = 1;      // of the content's beginning, from 1, in text
+  // Of the content's beginning in text, both from 1.
+  std::size_t line = 1;
+  std::size_t column = 1;
 };
 
 // Reads frame after frame, and keeps one of them in memory.
@@ -39,7 +41,7 @@ class FrameReader {
   // A failure in this frame: "file: message 3: byte 140 (0x008c): reason". The offset counts from the frame's
   // first byte.
   Failure malformedBytes(const Frame& frame, std::uint64_t offset, std::string_view reason) const;
-  // "file: message 3: line 17, column 4: reason"; the error's line counts from the frame's first.
+  // "file: message 3: line 17, column 4: reason"; the error's place counts from the frame's.
   Failure malformedText(const Frame& frame, spelling::TextError error) const;
   // "file: message 3: reason"
   Failure malformed(const Frame& frame, std::string_view reason) const;

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <cstddef>
-#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -17,9 +16,9 @@ namespace orv::tool {
 // comment.
 inline constexpr std::string_view textSeparator = "# message";
 
-// Cuts a stream into the texts of its messages. A JSON document ends with the line in which its last bracket
-// is closed, so one document a line and documents of several lines will both do; a message in the text format
-// ends before a line that begins with textSeparator.
+// Cuts a stream into the texts of its messages. A JSON document ends where its last bracket is closed, so several
+// on one line and one on several lines will both do; a message in the text format begins with a line that begins
+// with textSeparator, or with what stands before the first of these, and ends before the next.
 class TextStream final : public FrameReader {
  public:
   // The file must outlive the stream.
@@ -29,23 +28,28 @@ class TextStream final : public FrameReader {
   Outcome<std::optional<Frame>> next() override;
 
  private:
-  // Both gather the lines of the next message; false at the end of the stream.
-  Outcome<bool> gatherDocument();
-  Outcome<bool> gatherText();
-  // Puts the next line into `line`, with its end; false at the end of the stream.
-  Outcome<bool> readLine(std::string& line);
-  void startAtNextLine();
-  Outcome<void> add(std::string_view line);
+  // What was read and not handed out.
+  std::string_view rest() const { return std::string_view(buffer_).substr(taken_); }
+  // How long the first message in the rest is; none if it does not end there. Where it was looked for once, it is
+  // not looked for again.
+  std::optional<std::size_t> findEnd();
+  std::optional<std::size_t> findEndOfDocument();
+  // Reads more behind the rest; false at the end of the stream.
+  Outcome<bool> readMore();
+  // Leaves so many bytes of the rest behind.
+  void drop(std::size_t size);
 
   InputFile& file_;
   bool isJson_;
-  std::string buffer_;  // read, from taken_ on not yet cut into lines
+  std::string buffer_;
   std::size_t taken_ = 0;
-  std::uint64_t nextOffset_ = 0;  // of the line that is read next
-  std::size_t nextLine_ = 1;
-  Frame frame_;  // the message that is being gathered in text_
-  std::string text_;
-  bool isBehindSeparator_ = false;  // the separator before the next message has been read
+  std::size_t searched_ = 0;  // of the rest
+  bool isAtEnd_ = false;
+  Frame frame_;  // the one that was handed out; its place is that of the rest
+  // In a document, behind what was searched.
+  std::size_t depth_ = 0;
+  bool isInString_ = false;
+  bool isEscaped_ = false;
 };
 
 }  // namespace orv::tool

@@ -36,6 +36,9 @@ constexpr std::size_t characterStart(std::string_view utf8, std::size_t at) {
 // Where the next character stands.
 class TextPosition {
  public:
+  TextPosition() = default;
+  TextPosition(std::size_t line, std::size_t column) : line_(line), column_(column) {}
+
   void advance(char character) {
     if (character == '\n') {
       ++line_;
@@ -44,6 +47,10 @@ class TextPosition {
       ++column_;
     }
   }
+
+  // Both count from 1, columns in characters.
+  std::size_t line() const { return line_; }
+  std::size_t column() const { return column_; }
 
   TextError error(std::string reason) const { return {std::move(reason), line_, column_}; }
 
