@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "tools/orv/messages/message_type.hpp"
+#include "tools/orv/messages/selection.hpp"
 
 namespace orv::tool {
 
@@ -28,6 +29,7 @@ enum class ColourChoice : std::uint8_t { automatic, always, never };
 struct Options {
   const MessageType* type = &typeOf<SessionMessage>();
   PayloadPairing payloads;
+  Selection selection;
   std::optional<Format> from;  // none: to be seen from the input
   std::optional<Format> to;    // none: the command writes no messages
   bool isDelimited = false;

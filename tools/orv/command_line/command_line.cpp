@@ -95,6 +95,9 @@ std::expected<bool, Failure> readWords(const Command& command, std::span<char*> 
 std::optional<std::string> withoutEffect(const Options& options) {
   const PayloadPairing& payloads = options.payloads;
   if (options.keepsGoing && !options.isDelimited) return "--keep-going is for streams, with --delimited";
+  if (options.selection.hasNumbers() && !options.isDelimited) return "-n is for streams, with --delimited";
+  if (const auto* const condition = options.selection.unmeetable(*options.type))
+    return "--only: \"" + *condition + "\" is no field of " + std::string(options.type->fullName());
   if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
   if (!payloads.isClosed() && !payloads.hasOverrides()) return std::nullopt;
   if (payloads.isClosed() && payloads.hasOverrides())

@@ -76,6 +76,15 @@ Taken takeOutput(Options& options, const Command&, std::string_view path) {
   return {};
 }
 
+Taken takeNumbers(Options& options, const Command&, std::string_view range) {
+  return options.selection.addNumbers(range);
+}
+
+Taken takeCondition(Options& options, const Command&, std::string_view condition) {
+  options.selection.addCondition(condition);
+  return {};
+}
+
 Taken leaveClosed(Options& options, const Command&, std::string_view) {
   options.payloads.leaveClosed();
   return {};
@@ -105,6 +114,11 @@ constexpr OptionDescription to{
     noLetter, "--to", "FORMAT", "the output's format", takeFormat<&Options::to, &Command::to>, &Command::to};
 constexpr OptionDescription delimited{'d', "--delimited", flag, "read and write streams of messages",
                                       set<&Options::isDelimited>};
+constexpr OptionDescription messages{'n', "--messages", "N[-[M]]",
+                                     "take the messages of a stream from the Nth to the Mth", takeNumbers};
+constexpr OptionDescription only{
+    noLetter, "--only", "KIND|FIELD[=VALUE]",
+    "take envelopes of the kind, or messages with the field, or with the value in it", takeCondition};
 constexpr OptionDescription keepGoing{
     'k', "--keep-going", flag, "go on behind malformed messages of a stream", set<&Options::keepsGoing>};
 constexpr OptionDescription unknown{noLetter, "--unknown", flag, "show unknown fields in JSON",
@@ -132,14 +146,15 @@ constexpr std::array<const OptionDescription*, sizeof...(Options)> list(const Op
   return {&options...};
 }
 constexpr auto generalOptions = list(help, version);
-constexpr auto decodeOptions =
-    list(type, payload, noUnwrap, from, to, delimited, keepGoing, unknown, maximumSize, output, help);
-constexpr auto encodeOptions = list(type, payload, from, to, delimited, keepGoing, maximumSize, output, help);
-constexpr auto inspectOptions = list(type, payload, noUnwrap, from, to, delimited, keepGoing, defaults,
-                                     colour, maximumSize, output, help);
-constexpr auto diffOptions =
-    list(type, payload, noUnwrap, from, delimited, bytes, quiet, colour, maximumSize, output, help);
-constexpr auto identifyOptions = list(from, delimited, keepGoing, maximumSize, output, help);
+constexpr auto decodeOptions = list(type, payload, noUnwrap, from, to, delimited, messages, only, keepGoing,
+                                    unknown, maximumSize, output, help);
+constexpr auto encodeOptions =
+    list(type, payload, from, to, delimited, messages, only, keepGoing, maximumSize, output, help);
+constexpr auto inspectOptions = list(type, payload, noUnwrap, from, to, delimited, messages, only, keepGoing,
+                                     defaults, colour, maximumSize, output, help);
+constexpr auto diffOptions = list(type, payload, noUnwrap, from, delimited, messages, only, bytes, quiet,
+                                  colour, maximumSize, output, help);
+constexpr auto identifyOptions = list(from, delimited, messages, keepGoing, maximumSize, output, help);
 constexpr auto printingOptions = list(help);
 
 constexpr std::array allFormats{Format::binary, Format::hex, Format::base64, Format::text, Format::json};

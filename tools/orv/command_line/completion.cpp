@@ -46,11 +46,12 @@ constexpr const char* types = "_orv_types";
 // What bash runs for the words that an option's value can be; files are its own affair.
 std::string valuesOf(const OptionDescription& option, const Command& command) {
   if (option.valueName == "TYPE") return types;
-  if (option.valueName == "[KIND=]TYPE") {
-    std::string kinds;
+  if (option.valueName.find("KIND") != std::string_view::npos) {
+    const bool isPairing = option.valueName.ends_with("TYPE");
+    std::string kinds = "echo";
     for (const auto& kind : VessaSessionMessageType::_protobuf_nameMap().entries())
-      kinds += ' ' + std::string(kind.name) + '=';
-    return "echo" + kinds + "; " + types;
+      kinds += ' ' + std::string(kind.name) + (isPairing ? "=" : "");
+    return isPairing ? kinds + "; " + types : kinds;
   }
   std::string words(option.words);
   if (option.formats != nullptr) {

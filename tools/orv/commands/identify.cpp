@@ -8,6 +8,7 @@
 #include <string>
 #include <string_view>
 #include <tuple>
+#include <utility>
 #include <vector>
 
 #include <orv/byte_view.hpp>
@@ -140,7 +141,7 @@ class Identification final : public MessageWork {
   Outcome<void> take(const MessageInput& message) override {
     const auto ranked = rankTypes(bytesOf(message.encoding()));
     if (!ranked) return std::unexpected(message.failureOf(ranked.error()));
-    std::string text = message.frame().number > 1 ? "\n" : "";
+    std::string text = std::exchange(isBehindMessage_, true) && message.frame().number > 1 ? "\n" : "";
     if (options_.files.size() > 1) text += spelling::printable(message.path()) + ":\n";
     if (options_.isDelimited) text += "message " + std::to_string(message.frame().number) + ":\n";
     return output_.write(text + describe(*ranked));
@@ -149,6 +150,7 @@ class Identification final : public MessageWork {
  private:
   const Options& options_;
   OutputFile& output_;
+  bool isBehindMessage_ = false;
 };
 
 }  // namespace

@@ -80,10 +80,28 @@ Outcome<std::unique_ptr<MessageInput>> MessageInput::open(const std::string& pat
 }
 
 Outcome<bool> MessageInput::next() {
-  const auto frame = reader_->next();
-  if (!frame) return std::unexpected(frame.error());
-  if (!frame->has_value()) return false;
-  frame_ = **frame;
+  for (;;) {
+    auto isRead = nextFrame();
+    if (!isRead || !*isRead || isSelected()) return isRead;
+  }
+}
+
+// What is malformed is selected, so that it is told of.
+bool MessageInput::isSelected() const {
+  if (!options_.selection.hasConditions()) return true;
+  auto read = message();
+  if (!read) read = message(PayloadPairing::closed());
+  return !read || options_.selection.takes(**read);
+}
+
+Outcome<bool> MessageInput::nextFrame() {
+  do {
+    if (options_.selection.isLast(frame_.number)) return false;
+    const auto frame = reader_->next();
+    if (!frame) return std::unexpected(frame.error());
+    if (!frame->has_value()) return false;
+    frame_ = **frame;
+  } while (!options_.selection.takesNumber(frame_.number));
   encoding_ = frame_.content;
   if (isBytes(format_)) return true;
   auto encoded = format_ == Format::json ? encodeJson() : encodeText();

@@ -26,7 +26,7 @@ class MessageInput {
   static Outcome<std::unique_ptr<MessageInput>> open(const std::string& path, const Options& options,
                                                      OutputFile& output);
 
-  // The next message; false at the end of the input.
+  // The next message that the options select; false at the end of the input, or behind the last that they take.
   Outcome<bool> next();
 
   // As the command line names the file.
@@ -54,6 +54,8 @@ class MessageInput {
 
  private:
   MessageInput(InputFile file, const std::string& path, const Options& options);
+  Outcome<bool> nextFrame();
+  bool isSelected() const;
   Outcome<std::string> encodeText() const;
   Outcome<std::string> encodeJson() const;
 

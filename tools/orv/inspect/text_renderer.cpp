@@ -1,6 +1,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <utility>
 
 #include <orv/spelling/value_text.hpp>
 #include "tools/orv/inspect/dump_layout.hpp"
@@ -18,7 +19,7 @@ class TextRenderer final : public Renderer {
 
   void beginMessage(const ExplainedMessage& message) override {
     std::string text;
-    if (message.number > 1) output_ += '\n';
+    if (std::exchange(isBehindMessage_, true) && message.number > 1) output_ += '\n';
     if (options_.files.size() > 1) text += spelling::printable(message.path) + ": ";
     if (options_.isDelimited) text += "message " + std::to_string(message.number) + ": ";
     text += message.type.fullName();
@@ -75,6 +76,7 @@ class TextRenderer final : public Renderer {
   const Options& options_;
   DumpLayout layout_;
   std::string value_;
+  bool isBehindMessage_ = false;
 };
 
 }  // namespace

@@ -26,14 +26,6 @@ constexpr NameMap kindNames = VessaSessionMessageType::_protobuf_nameMap();
 constexpr auto typeNumber = SessionMessage::_protobuf_nameMap().number("type");
 constexpr auto dataNumber = SessionMessage::_protobuf_nameMap().number("data");
 
-std::optional<std::int64_t> kindNumber(std::string_view kind) {
-  if (const auto number = kindNames.number(kind)) return number;
-  std::int32_t number = 0;
-  const auto [end, status] = std::from_chars(kind.data(), kind.data() + kind.size(), number);
-  if (status != std::errc() || end != kind.data() + kind.size()) return std::nullopt;
-  return number;
-}
-
 std::string_view lastWord(std::string_view name) { return name.substr(name.rfind('.') + 1); }
 
 }  // namespace
@@ -62,6 +54,14 @@ std::expected<const MessageType*, std::string> findMessageType(std::string_view 
     error += type->shortName();
   }
   return std::unexpected(error);
+}
+
+std::optional<std::int64_t> kindNumber(std::string_view kind) {
+  if (const auto number = kindNames.number(kind)) return number;
+  std::int32_t number = 0;
+  const auto [end, status] = std::from_chars(kind.data(), kind.data() + kind.size(), number);
+  if (status != std::errc() || end != kind.data() + kind.size()) return std::nullopt;
+  return number;
 }
 
 const MessageType* PayloadPairing::payloadOf(VessaSessionMessageType type) const {

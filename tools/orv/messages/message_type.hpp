@@ -38,6 +38,9 @@ const MessageType& typeOf() {
 // type's alone. The error says what is wrong with the name.
 std::expected<const MessageType*, std::string> findMessageType(std::string_view name);
 
+// A type of envelopes by its name or its number.
+std::optional<std::int64_t> kindNumber(std::string_view kind);
+
 // The pairing of orv::envelope, with what the command line changes in it.
 class PayloadPairing {
  public:
