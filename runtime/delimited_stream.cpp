@@ -110,7 +110,7 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   while (message_.size() < length) {
     constexpr std::size_t firstPiece = std::size_t{64} << 10;
     const std::size_t had = message_.size();
-    const std::size_t piece = std::min<std::size_t>(length - had, std::max(firstPiece, had));
+    const std::size_t piece = std::min(static_cast<std::size_t>(length) - had, std::max(firstPiece, had));
     message_.resize(had + piece);
     if (!input->ReadRaw(message_.data() + had, static_cast<int>(piece)))
       return fail(StreamError::Cause::truncated);

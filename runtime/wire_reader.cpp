@@ -64,8 +64,9 @@ WireResult<std::span<const std::byte>> WireReader::readLengthDelimited() {
                                        static_cast<std::uint32_t>(length),
                                        static_cast<std::uint32_t>(length - available)});
     }
-    cursor_ = at + length;
-    return std::span(at, length);
+    const std::span contents(at, static_cast<std::size_t>(length));
+    cursor_ = at + contents.size();
+    return contents;
   }
   return fault(DecodeCause::lengthTooLarge, cursor_);
 }

@@ -19,7 +19,9 @@ class Random {
   }
 
   // How many rounds a random test runs: ORV_TEST_ROUNDS, or what the test gives.
-  static std::size_t rounds(std::size_t enough) { return fromEnvironment("ORV_TEST_ROUNDS", enough); }
+  static std::size_t rounds(std::size_t enough) {
+    return static_cast<std::size_t>(fromEnvironment("ORV_TEST_ROUNDS", enough));
+  }
 
   std::uint64_t number() { return engine_(); }
   std::size_t below(std::size_t limit) { return static_cast<std::size_t>(engine_() % limit); }

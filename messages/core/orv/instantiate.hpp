@@ -181,7 +181,7 @@ template <class M>
 std::size_t Message<M>::encodedSize() const {
   SizeCounter counter;
   (void)traverse(counter);
-  return counter.size();
+  return static_cast<std::size_t>(counter.size());  // no encoding is larger than its message in memory
 }
 
 }  // namespace orv
