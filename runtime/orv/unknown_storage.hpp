@@ -32,7 +32,14 @@ class UnknownStorage {
   UnknownStorage(const UnknownStorage& other) {
     if (!other.isEmpty()) appendRecords(other.records());
   }
+#if defined(__GNUC__) && !defined(__clang__)
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wmaybe-uninitialized"  // as of InlineBytes
+#endif
   UnknownStorage(UnknownStorage&& other) noexcept : block_(other.block_) { other.block_ = nullptr; }
+#if defined(__GNUC__) && !defined(__clang__)
+#pragma GCC diagnostic pop
+#endif
   UnknownStorage& operator=(const UnknownStorage& other) {
     if (this != &other) *this = UnknownStorage(other);
     return *this;

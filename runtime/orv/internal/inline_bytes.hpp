@@ -25,6 +25,12 @@ inline std::uint64_t wordAt(const void* bytes) {
 // Set in each byte of a word that is not ASCII.
 inline constexpr std::uint64_t highBits = 0x8080808080808080;
 
+// Where sanitizers keep it from following what is moved, g++ believes that an empty std::optional's value is read.
+#if defined(__GNUC__) && !defined(__clang__)
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wmaybe-uninitialized"
+#endif
+
 // Owned bytes. Up to 39 of them live inside the object, which covers a 36-character identifier, a 16-byte
 // UUID and a typical handle without an allocation; longer contents live in one heap block of their own.
 // docs/decisions/inline-bytes.md weighs the size.
@@ -207,5 +213,9 @@ class InlineBytes {
   // The bytes and, in the last place, their number; or a Block and, in the last place, heapTag.
   alignas(Block) unsigned char raw_[objectSize];
 };
+
+#if defined(__GNUC__) && !defined(__clang__)
+#pragma GCC diagnostic pop
+#endif
 
 }  // namespace orv::internal

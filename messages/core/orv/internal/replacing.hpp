@@ -94,7 +94,10 @@ class Replacing {
         if (countRead < storage.size())
           storage.erase(storage.begin() + static_cast<std::ptrdiff_t>(countRead), storage.end());
       } else if (countRead == 0) {
-        storage = Storage();
+        if constexpr (requires { storage.reset(); })
+          storage.reset();
+        else
+          storage = Storage();
       }
     }
   }
