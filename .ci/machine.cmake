@@ -1,0 +1,19 @@
+# A toolchain file: builds for the machine that the environment names in ORV_MACHINE, with Debian's cross compiler
+# and the packages that .ci/platforms has unpacked into ORV_SYSROOT. What is linked is linked statically, so that
+# it runs under qemu as it is.
+set(CMAKE_SYSTEM_NAME Linux)
+set(CMAKE_C_COMPILER $ENV{ORV_TRIPLET}-gcc)
+set(CMAKE_CXX_COMPILER $ENV{ORV_TRIPLET}-g++)
+set(CMAKE_CROSSCOMPILING_EMULATOR $ENV{ORV_EMULATOR})
+set(CMAKE_CXX_FLAGS_INIT $ENV{ORV_FLAGS})
+set(CMAKE_EXE_LINKER_FLAGS_INIT -static)
+set(CMAKE_LIBRARY_ARCHITECTURE $ENV{ORV_MULTIARCH})
+
+set(CMAKE_FIND_ROOT_PATH $ENV{ORV_SYSROOT})
+set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
+set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
+set(CMAKE_FIND_LIBRARY_SUFFIXES .a)
+set(ENV{PKG_CONFIG_SYSROOT_DIR} $ENV{ORV_SYSROOT})
+set(ENV{PKG_CONFIG_LIBDIR} $ENV{ORV_SYSROOT}/usr/lib/$ENV{ORV_MULTIARCH}/pkgconfig)
