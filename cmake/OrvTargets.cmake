@@ -29,6 +29,16 @@ function(orv_warnings target)
   endif()
 endfunction()
 
+# How the library's own code is compiled: docs/decisions/exception-neutral.md. Without unwind tables no exception
+# gets through it and leaves a message half changed: running out of memory ends the program where it happens.
+option(ORV_EXCEPTIONS "Let exceptions pass through the library; OFF: running out of memory ends the program" ON)
+set(ORV_WITHOUT_EXCEPTIONS -fno-exceptions -fno-rtti -fno-unwind-tables -fno-asynchronous-unwind-tables)
+function(orv_exceptions target)
+  if(NOT ORV_EXCEPTIONS)
+    target_compile_options(${target} PRIVATE ${ORV_WITHOUT_EXCEPTIONS})
+  endif()
+endfunction()
+
 # A layer of the library: the folder `name` beside the calling CMakeLists.txt (or that folder itself), whose
 # headers are the `orv` folder in it. It sees its own headers and those of the layers that it uses, no others,
 # so that an include that turns an arrow does not compile.
@@ -41,7 +51,7 @@ function(orv_layer name)
   add_library(orv_${name} OBJECT ${layer_SOURCES})
   set_target_properties(orv_${name} PROPERTIES ORV_FOLDER ${folder})
   orv_warnings(orv_${name})
-  target_compile_options(orv_${name} PRIVATE -fno-exceptions -fno-rtti)
+  orv_exceptions(orv_${name})
   target_compile_features(orv_${name} PUBLIC cxx_std_23)
   target_include_directories(orv_${name} PUBLIC ${folder})
   list(TRANSFORM layer_USES PREPEND orv_)

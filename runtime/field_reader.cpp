@@ -8,7 +8,7 @@ namespace orv::inline v0::internal {
 
 // Outside the fast path what is wrong is found by a WireReader, which says it.
 
-OutermostFrame& FieldReader::outermost(Frame& frame) {
+OutermostFrame& FieldReader::outermost(Frame& frame) noexcept {
   Frame* at = &frame;
   while (at->outer != nullptr) at = at->outer;
   // Only an OutermostFrame has none outside, and there is no type information to ask.
@@ -26,7 +26,7 @@ Step FieldReader::askHook(Frame& frame) {
 }
 
 void FieldReader::note(DecodeCause cause, const std::byte* at, std::uint32_t length, std::uint32_t detail,
-                       Frame& frame, std::uint32_t number) {
+                       Frame& frame, std::uint32_t number) noexcept {
   OutermostFrame& outermost = FieldReader::outermost(frame);
   outermost.end = OutermostFrame::End::fault;
   outermost.cause = cause;
@@ -78,7 +78,8 @@ const std::byte* FieldReader::keepUnknown(Place place, Tag tag, Frame& frame,
   return record;
 }
 
-FieldReader::Read<Tag> FieldReader::readLongTag(const std::byte* at, const std::byte* end, Frame& frame) {
+FieldReader::Read<Tag> FieldReader::readLongTag(const std::byte* at, const std::byte* end,
+                                                Frame& frame) noexcept {
   WireReader reader(std::span(at, end));
   const auto tag = reader.readTag();
   if (tag) return {reader.position(), *tag};
@@ -87,7 +88,7 @@ FieldReader::Read<Tag> FieldReader::readLongTag(const std::byte* at, const std::
 }
 
 FieldReader::Read<std::uint64_t> FieldReader::readLongVarint(const std::byte* at, const std::byte* end,
-                                                             Frame& frame, Tag tag) {
+                                                             Frame& frame, Tag tag) noexcept {
   WireReader reader(std::span(at, end));
   const auto varint = reader.readVarint();
   if (varint) return {reader.position(), *varint};
@@ -96,7 +97,7 @@ FieldReader::Read<std::uint64_t> FieldReader::readLongVarint(const std::byte* at
 }
 
 std::span<const std::byte> FieldReader::readLongBody(const std::byte* at, const std::byte* end, Frame& frame,
-                                                     Tag tag) {
+                                                     Tag tag) noexcept {
   // A length of two bytes is common.
   if (end - at >= 2) {
     const auto low = std::to_integer<std::size_t>(at[0]);
@@ -112,7 +113,8 @@ std::span<const std::byte> FieldReader::readLongBody(const std::byte* at, const 
   return {};
 }
 
-std::string_view FieldReader::readLongText(const std::byte* at, const std::byte* end, Frame& frame, Tag tag) {
+std::string_view FieldReader::readLongText(const std::byte* at, const std::byte* end, Frame& frame,
+                                           Tag tag) noexcept {
   const std::span<const std::byte> body = readLongBody(at, end, frame, tag);
   if (body.data() == nullptr) return {};
   const std::string_view text(reinterpret_cast<const char*>(body.data()), body.size());
@@ -123,7 +125,7 @@ std::string_view FieldReader::readLongText(const std::byte* at, const std::byte*
   return {};
 }
 
-Step FieldReader::failTooDeep(const std::byte* record, Frame& frame, Tag tag) {
+Step FieldReader::failTooDeep(const std::byte* record, Frame& frame, Tag tag) noexcept {
   note(DecodeCause::nestingTooDeep, record, 0, 0, frame, tag.fieldNumber());
   return std::unexpected(Failed());
 }

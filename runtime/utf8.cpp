@@ -8,7 +8,7 @@
 
 namespace orv::inline v0::utf8 {
 
-Step step(std::string_view text) {
+Step step(std::string_view text) noexcept {
   const auto byteAt = [&](std::size_t at) { return static_cast<unsigned char>(text[at]); };
   const unsigned char lead = byteAt(0);
   if (lead < 0x80) return {lead, 1, true};
@@ -123,7 +123,7 @@ std::size_t wellFormedBlocks(std::string_view text) {
 
 }  // namespace
 
-bool isWellFormedWithin(const std::byte* bytes, std::size_t size) {
+bool isWellFormedWithin(const std::byte* bytes, std::size_t size) noexcept {
   const char* const characters = reinterpret_cast<const char*>(bytes);
 #ifdef ORV_HAS_BYTE_BLOCKS
   const ByteBlock<3> block{{sixteenAt(characters), sixteenAt(characters + 16), eightAt(characters + 32)}};
@@ -133,7 +133,7 @@ bool isWellFormedWithin(const std::byte* bytes, std::size_t size) {
 #endif
 }
 
-std::size_t wellFormedPrefix(std::string_view text) {
+std::size_t wellFormedPrefix(std::string_view text) noexcept {
   if (isAscii(text)) [[likely]]
     return text.size();
   const char* const bytes = text.data();

@@ -18,10 +18,10 @@ struct Step {
 };
 
 // `text` is not empty.
-Step step(std::string_view text);
+Step step(std::string_view text) noexcept;
 
 // How many bytes at the start of `text` are well-formed.
-std::size_t wellFormedPrefix(std::string_view text);
+std::size_t wellFormedPrefix(std::string_view text) noexcept;
 
 // Checks eight bytes at a time.
 inline bool isAscii(std::string_view text) {
@@ -46,7 +46,7 @@ inline bool isAscii(std::string_view text) {
 
 // Whether the first `size` bytes, which fit inside a text, are well-formed, of InlineBytes::objectSize that may be
 // read.
-bool isWellFormedWithin(const std::byte* bytes, std::size_t size);
+bool isWellFormedWithin(const std::byte* bytes, std::size_t size) noexcept;
 
 inline bool isWellFormed(std::string_view text) { return wellFormedPrefix(text) == text.size(); }
 

@@ -20,8 +20,7 @@ const std::string unknownRecord = hex("F8 00 81 00");
 static_assert([] {
   bool holds = true;
   AllMessages::forEach([&]<class M>() {
-    holds = holds && std::regular<M> && std::is_nothrow_move_constructible_v<M> &&
-            std::is_nothrow_move_assignable_v<M> && std::is_nothrow_default_constructible_v<M> &&
+    holds = holds && std::regular<M> &&
             std::is_same_v<std::invoke_result_t<std::hash<M>, const M&>, std::size_t> &&
             DecoderOf<BinaryDecoder, M> && VisitorOf<BinaryEncoder, M> && VisitorOf<TextRenderer, M>;
   });
@@ -52,6 +51,17 @@ TEST(AllMessages, AreEmptyByDefault) {
     EXPECT_EQ(*message->parse(std::span<const std::byte>()).value(), *message);
     EXPECT_EQ(faultOfEncoding(*message), "");
   }
+}
+
+TEST(AllMessages, HaveADefaultThatNobodyMade) {
+  AllMessages::forEach([]<class M>() {
+    SCOPED_TRACE(M::protoMessageName);
+    const M& shared = internal::defaultInstance<M>();
+    EXPECT_EQ(shared, M());
+    EXPECT_EQ(M(shared), M());
+    EXPECT_EQ(encoded(shared), "");
+    EXPECT_EQ(shared.hashValue(), M().hashValue());
+  });
 }
 
 TEST(AllMessages, RoundTrip) {
@@ -158,6 +168,8 @@ TEST(AllMessages, AreValuesThatShareNothing) {
     EXPECT_EQ(encoded(*original), changed);
 
     assigned->assign(*assigned);
+    EXPECT_EQ(encoded(*assigned), kept);
+    assigned->assignMoved(*assigned);
     EXPECT_EQ(encoded(*assigned), kept);
     const MessagePointer moved = assigned->moved();
     EXPECT_EQ(encoded(*moved), kept);

@@ -16,6 +16,10 @@ class ConnectionRequest final : public Message<ConnectionRequest> {
   static constexpr std::string_view protoMessageName = "orv.ConnectionRequest";
 
   ConnectionRequest() noexcept {}
+  ConnectionRequest(const ConnectionRequest&) = default;
+  ConnectionRequest(ConnectionRequest&&) noexcept = default;
+  ConnectionRequest& operator=(const ConnectionRequest& other) { return assign(other); }
+  ConnectionRequest& operator=(ConnectionRequest&& other) noexcept { return assign(std::move(other)); }
 
   const Text& identifier() const { return identifier_; }
   Text& mutableIdentifier() { return identifier_; }

@@ -33,6 +33,10 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
       static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content.ApprovalContent";
 
       ApprovalContent() noexcept {}
+      ApprovalContent(const ApprovalContent&) = default;
+      ApprovalContent(ApprovalContent&&) noexcept = default;
+      ApprovalContent& operator=(const ApprovalContent& other) { return assign(other); }
+      ApprovalContent& operator=(ApprovalContent&& other) noexcept { return assign(std::move(other)); }
 
       // Bytes that the device needs to take part; what they hold is between the peers.
       const ByteBuffer& invitationData() const { return invitationData_; }
@@ -52,6 +56,10 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
     static constexpr std::string_view protoMessageName = "orv.ConnectionResponse.Content";
 
     Content() noexcept {}
+    Content(const Content&) = default;
+    Content(Content&&) noexcept = default;
+    Content& operator=(const Content& other) { return assign(other); }
+    Content& operator=(Content&& other) noexcept { return assign(std::move(other)); }
 
     const Text& identifier() const { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }

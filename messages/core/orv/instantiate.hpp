@@ -47,6 +47,44 @@ std::expected<void, DecodeError> readInto(M& message, std::span<const std::byte>
   return result;
 }
 
+// The oneofs of a message that hold nothing before it is read into. Where memory runs out they hold nothing again,
+// and not a part of a payload. In the functions that are called, not in the loop, which an exception's way out of it
+// would slow down (docs/decisions/exception-neutral.md).
+template <class Table, class M>
+class UnsetOneofs {
+ public:
+  explicit UnsetOneofs(M& message) : message_(message) {
+    forEachOneof([&](const auto& group, std::size_t index) { areSet_[index] = group.has_value(); });
+  }
+  UnsetOneofs(const UnsetOneofs&) = delete;
+  UnsetOneofs& operator=(const UnsetOneofs&) = delete;
+  ~UnsetOneofs() {
+    if (hasReturned_) [[likely]]
+      return;
+    forEachOneof([&](auto& group, std::size_t index) {
+      if (!areSet_[index]) group.reset();
+    });
+  }
+
+  template <class Result>
+  Result afterReturn(Result result) {
+    hasReturned_ = true;
+    return result;
+  }
+
+ private:
+  void forEachOneof(auto visit) {
+    Table::forEachIndex([&]<std::size_t index>() {
+      if constexpr (Table::template isCase<index> && Table::template isFirstRow<index>)
+        visit(Table::template storage<index>(message_), index);
+    });
+  }
+
+  M& message_;
+  std::array<bool, Table::size> areSet_;
+  bool hasReturned_ = false;
+};
+
 // The walk over a whole message, once for each type. Answers the encoding's size, or that it does not fit.
 inline constexpr std::size_t doesNotFit = std::numeric_limits<std::size_t>::max();
 template <class M>
@@ -61,8 +99,15 @@ template <class M>
 }  // namespace internal
 
 template <class M>
+M& Message<M>::assign(const M& other) {
+  if (this != &other) assign(M(other));
+  return self();
+}
+
+template <class M>
 std::expected<void, DecodeError> Message<M>::decodeMessage(BinaryDecoder& decoder) {
-  return decoder.readWith(self(), internal::DecodeMessage());
+  internal::UnsetOneofs<Table<M>, M> unset(self());
+  return unset.afterReturn(decoder.readWith(self(), internal::DecodeMessage()));
 }
 
 template <class M>
@@ -131,7 +176,8 @@ template <class Reader>
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
-  return internal::readInto<internal::DecodeMessage>(self(), bytes);
+  internal::UnsetOneofs<Table<M>, M> unset(self());
+  return unset.afterReturn(internal::readInto<internal::DecodeMessage>(self(), bytes));
 }
 
 template <class M>

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <expected>
 #include <functional>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -37,7 +38,9 @@ class Step;
 // The base of every message type M: a regular value that owns all that it holds. M adds its full name, its
 // accessors, its storage and, in a private table `fields`, one row per field in ascending order of the
 // numbers; everything here derives from that table. M's constructor is best written empty, `M() noexcept {}`:
-// a defaulted one takes longer (docs/decisions/inline-bytes.md).
+// a defaulted one takes longer (docs/decisions/inline-bytes.md). Its assignments are best those of assign, since
+// defaulted ones leave M half changed where memory runs out. In M's default every byte that has a meaning is 0:
+// it holds nothing but its fields.
 //
 // What is only declared here is compiled once for each type, by the line `template class orv::Message<M>;` in
 // a source that includes <orv/instantiate.hpp>.
@@ -150,6 +153,18 @@ class Message {
   Message& operator=(const Message&) = default;
   Message& operator=(Message&&) noexcept = default;
   ~Message() = default;
+
+  // What M's assignments do. A copy is made whole before anything changes, so that M is left as it was where
+  // memory runs out; a message that is assigned to itself keeps its value.
+  M& assign(const M& other);
+  M& assign(M&& other) noexcept {
+    static_assert(std::is_nothrow_move_constructible_v<M>);
+    if (this != &other) {
+      std::destroy_at(&self());
+      std::construct_at(&self(), std::move(other));
+    }
+    return self();
+  }
 
  private:
   M& self() { return static_cast<M&>(*this); }

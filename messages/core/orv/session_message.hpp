@@ -54,6 +54,10 @@ class SessionMessage final : public Message<SessionMessage> {
   static constexpr std::string_view protoMessageName = "orv.SessionMessage";
 
   SessionMessage() noexcept {}
+  SessionMessage(const SessionMessage&) = default;
+  SessionMessage(SessionMessage&&) noexcept = default;
+  SessionMessage& operator=(const SessionMessage& other) { return assign(other); }
+  SessionMessage& operator=(SessionMessage&& other) noexcept { return assign(std::move(other)); }
 
   std::uint32_t version() const { return version_.value_or(0); }
   std::uint32_t& mutableVersion() { return internal::presentValue(version_); }

@@ -23,6 +23,10 @@ class Group final : public Message<Group> {
     static constexpr std::string_view protoMessageName = "orv.Group.Initialization";
 
     Initialization() noexcept {}
+    Initialization(const Initialization&) = default;
+    Initialization(Initialization&&) noexcept = default;
+    Initialization& operator=(const Initialization& other) { return assign(other); }
+    Initialization& operator=(Initialization&& other) noexcept { return assign(std::move(other)); }
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
@@ -76,6 +80,10 @@ class Group final : public Message<Group> {
     static constexpr std::string_view protoMessageName = "orv.Group.MemberAdded";
 
     MemberAdded() noexcept {}
+    MemberAdded(const MemberAdded&) = default;
+    MemberAdded(MemberAdded&&) noexcept = default;
+    MemberAdded& operator=(const MemberAdded& other) { return assign(other); }
+    MemberAdded& operator=(MemberAdded&& other) noexcept { return assign(std::move(other)); }
   };
 
   // A member was removed from the group.
@@ -84,6 +92,10 @@ class Group final : public Message<Group> {
     static constexpr std::string_view protoMessageName = "orv.Group.MemberRemoved";
 
     MemberRemoved() noexcept {}
+    MemberRemoved(const MemberRemoved&) = default;
+    MemberRemoved(MemberRemoved&&) noexcept = default;
+    MemberRemoved& operator=(const MemberRemoved& other) { return assign(other); }
+    MemberRemoved& operator=(MemberRemoved&& other) noexcept { return assign(std::move(other)); }
   };
 
   // A member left the group of its own accord. The event does not name the member.
@@ -92,6 +104,10 @@ class Group final : public Message<Group> {
     static constexpr std::string_view protoMessageName = "orv.Group.MemberLeft";
 
     MemberLeft() noexcept {}
+    MemberLeft(const MemberLeft&) = default;
+    MemberLeft(MemberLeft&&) noexcept = default;
+    MemberLeft& operator=(const MemberLeft& other) { return assign(other); }
+    MemberLeft& operator=(MemberLeft&& other) noexcept { return assign(std::move(other)); }
 
     const ByteBuffer& groupUuid() const { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
@@ -115,6 +131,10 @@ class Group final : public Message<Group> {
   static constexpr std::string_view protoMessageName = "orv.Group";
 
   Group() noexcept {}
+  Group(const Group&) = default;
+  Group(Group&&) noexcept = default;
+  Group& operator=(const Group& other) { return assign(other); }
+  Group& operator=(Group&& other) noexcept { return assign(std::move(other)); }
 
   // The event as a whole: none, or one case with its payload.
   const std::optional<OneOf_Event>& event() const { return event_; }

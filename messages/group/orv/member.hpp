@@ -16,6 +16,10 @@ class Member final : public Message<Member> {
   static constexpr std::string_view protoMessageName = "orv.Member";
 
   Member() noexcept {}
+  Member(const Member&) = default;
+  Member(Member&&) noexcept = default;
+  Member& operator=(const Member& other) { return assign(other); }
+  Member& operator=(Member&& other) noexcept { return assign(std::move(other)); }
 
   // How the member is addressed.
   const Text& handle() const { return handle_; }

@@ -19,6 +19,10 @@ class JoinRequest final : public Message<JoinRequest> {
     static constexpr std::string_view protoMessageName = "orv.JoinRequest.Content";
 
     Content() noexcept {}
+    Content(const Content&) = default;
+    Content(Content&&) noexcept = default;
+    Content& operator=(const Content& other) { return assign(other); }
+    Content& operator=(Content&& other) noexcept { return assign(std::move(other)); }
 
     const Text& identifier() const { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
@@ -63,6 +67,10 @@ class JoinRequest final : public Message<JoinRequest> {
   static constexpr std::string_view protoMessageName = "orv.JoinRequest";
 
   JoinRequest() noexcept {}
+  JoinRequest(const JoinRequest&) = default;
+  JoinRequest(JoinRequest&&) noexcept = default;
+  JoinRequest& operator=(const JoinRequest& other) { return assign(other); }
+  JoinRequest& operator=(JoinRequest&& other) noexcept { return assign(std::move(other)); }
 
   const ByteBuffer& publicKey() const { return internal::valueOrDefault(publicKey_); }
   ByteBuffer& mutablePublicKey() { return internal::presentValue(publicKey_); }

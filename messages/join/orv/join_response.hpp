@@ -33,6 +33,10 @@ class JoinResponse final : public Message<JoinResponse> {
       static constexpr std::string_view protoMessageName = "orv.JoinResponse.Content.ApprovalContent";
 
       ApprovalContent() noexcept {}
+      ApprovalContent(const ApprovalContent&) = default;
+      ApprovalContent(ApprovalContent&&) noexcept = default;
+      ApprovalContent& operator=(const ApprovalContent& other) { return assign(other); }
+      ApprovalContent& operator=(ApprovalContent&& other) noexcept { return assign(std::move(other)); }
 
       const Text& sessionIdentifier() const { return sessionIdentifier_; }
       Text& mutableSessionIdentifier() { return sessionIdentifier_; }
@@ -68,6 +72,10 @@ class JoinResponse final : public Message<JoinResponse> {
     static constexpr std::string_view protoMessageName = "orv.JoinResponse.Content";
 
     Content() noexcept {}
+    Content(const Content&) = default;
+    Content(Content&&) noexcept = default;
+    Content& operator=(const Content& other) { return assign(other); }
+    Content& operator=(Content&& other) noexcept { return assign(std::move(other)); }
 
     const Text& identifier() const { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
@@ -102,6 +110,10 @@ class JoinResponse final : public Message<JoinResponse> {
   static constexpr std::string_view protoMessageName = "orv.JoinResponse";
 
   JoinResponse() noexcept {}
+  JoinResponse(const JoinResponse&) = default;
+  JoinResponse(JoinResponse&&) noexcept = default;
+  JoinResponse& operator=(const JoinResponse& other) { return assign(other); }
+  JoinResponse& operator=(JoinResponse&& other) noexcept { return assign(std::move(other)); }
 
   const ByteBuffer& encryptedData() const { return internal::valueOrDefault(encryptedData_); }
   ByteBuffer& mutableEncryptedData() { return internal::presentValue(encryptedData_); }

@@ -429,6 +429,7 @@ class FieldReader {
   [[gnu::always_inline]] void makeRoom(std::vector<T>& list) const {
     if (list.size() == list.capacity()) [[unlikely]]
       grow(list, at_, end_, tag_);
+    if (list.size() == list.capacity()) __builtin_unreachable();
   }
   template <class T>
   [[gnu::noinline]] static void grow(std::vector<T>& list, const std::byte* at, const std::byte* end,
@@ -447,21 +448,23 @@ class FieldReader {
     __builtin_prefetch(list.data() + std::min(list.size() + ahead, list.capacity()), 1);
   }
 
-  static OutermostFrame& outermost(Frame& frame);
+  static OutermostFrame& outermost(Frame& frame) noexcept;
   static Step askHook(Frame& frame);
 
   // What is called when the common case does not hold. Each answers none after it has noted the fault.
   static const std::byte* keepUnknown(Place place, Tag tag, Frame& frame, const MessageDescriptor& message,
                                       UnknownStorage& unknownFields);
-  static Read<Tag> readLongTag(const std::byte* at, const std::byte* end, Frame& frame);
-  static Read<std::uint64_t> readLongVarint(const std::byte* at, const std::byte* end, Frame& frame, Tag tag);
+  static Read<Tag> readLongTag(const std::byte* at, const std::byte* end, Frame& frame) noexcept;
+  static Read<std::uint64_t> readLongVarint(const std::byte* at, const std::byte* end, Frame& frame,
+                                            Tag tag) noexcept;
   static std::span<const std::byte> readLongBody(const std::byte* at, const std::byte* end, Frame& frame,
-                                                 Tag tag);
-  static std::string_view readLongText(const std::byte* at, const std::byte* end, Frame& frame, Tag tag);
-  static Step failTooDeep(const std::byte* record, Frame& frame, Tag tag);
+                                                 Tag tag) noexcept;
+  static std::string_view readLongText(const std::byte* at, const std::byte* end, Frame& frame,
+                                       Tag tag) noexcept;
+  static Step failTooDeep(const std::byte* record, Frame& frame, Tag tag) noexcept;
   static void note(DecodeCause cause, const std::byte* at, std::uint32_t length, std::uint32_t detail,
-                   Frame& frame, std::uint32_t number);
-  static void note(const WireFault& fault, Frame& frame, std::uint32_t number) {
+                   Frame& frame, std::uint32_t number) noexcept;
+  static void note(const WireFault& fault, Frame& frame, std::uint32_t number) noexcept {
     note(fault.cause, fault.at, fault.length, fault.detail, frame, number);
   }
 
