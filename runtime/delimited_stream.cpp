@@ -6,9 +6,14 @@
 #include <algorithm>
 #include <array>
 #include <cassert>
+#include <cstring>
+#include <functional>
 #include <limits>
 #include <string_view>
 #include <vector>
+
+#include <orv/binary_encoder.hpp>
+#include <orv/internal/varint.hpp>
 
 namespace orv::inline v0 {
 
@@ -34,8 +39,9 @@ class ReadFunctionStream final : public io::CopyingInputStream {
   int Read(void* buffer, int size) override {
     const std::ptrdiff_t count =
         read_(std::span(static_cast<std::byte*>(buffer), static_cast<std::size_t>(size)));
-    hasFailed_ = hasFailed_ || count < 0;
-    return static_cast<int>(count);
+    const bool isPossible = count >= 0 && count <= size;
+    hasFailed_ = hasFailed_ || !isPossible;
+    return isPossible ? static_cast<int>(count) : -1;
   }
   bool hasFailed() const { return hasFailed_; }
 
@@ -86,6 +92,8 @@ class DelimitedReader::Source {
 std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedReader::Source::next() {
   if (error_.has_value()) return std::unexpected(*error_);
   messageOffset_ = nextOffset_;
+  // It stands if memory runs out on the way, or the read function throws: nobody knows then where the stream is.
+  error_ = StreamError{.cause = StreamError::Cause::readFailed, .offset = messageOffset_};
 
   // One stream for the length and one for the message: each counts what it reads in an int.
   std::optional<io::CodedInputStream> input(std::in_place, &buffered_);
@@ -95,7 +103,10 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   for (std::uint8_t byte = 0x80; byte >= 0x80; ++lengthSize) {
     if (lengthSize == longestLength) return fail(StreamError::Cause::malformedLength);
     if (!input->ReadRaw(&byte, 1)) {
-      if (lengthSize == 0 && !stream_.hasFailed()) return std::nullopt;
+      if (lengthSize == 0 && !stream_.hasFailed()) {
+        error_.reset();
+        return std::nullopt;
+      }
       return fail(StreamError::Cause::truncated);
     }
     length |= std::uint64_t{byte & 0x7FU} << (7 * lengthSize);
@@ -117,6 +128,7 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   }
   messageOffset_ += static_cast<std::uint64_t>(lengthSize);
   nextOffset_ = messageOffset_ + length;
+  error_.reset();
   return std::span<const std::byte>(message_);
 }
 
@@ -143,11 +155,22 @@ StreamError DelimitedReader::malformedMessage(const DecodeError& error) const {
           .decodeError = error};
 }
 
-void appendDelimited(std::string_view bytes, std::string& output) {
-  std::array<std::uint8_t, 10> length;
-  const auto* const end = io::CodedOutputStream::WriteVarint64ToArray(bytes.size(), length.data());
-  output.append(reinterpret_cast<const char*>(length.data()), static_cast<std::size_t>(end - length.data()));
-  output += bytes;
+std::expected<void, EncodeError> appendDelimited(std::string_view bytes, std::string& output) {
+  if (bytes.size() > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
+  // The bytes may be the output's own, which move when it grows.
+  const std::size_t before = output.size();
+  const bool areOwn = std::greater_equal<>()(bytes.data(), output.data()) &&
+                      std::less_equal<>()(bytes.data(), output.data() + before);
+  const std::size_t ownAt = areOwn ? static_cast<std::size_t>(bytes.data() - output.data()) : 0;
+  const auto length = static_cast<std::uint32_t>(bytes.size());
+  const std::size_t size = before + internal::varintSize(length) + bytes.size();
+  output.resize_and_overwrite(size, [&](char* begin, std::size_t) {
+    auto* const lengthAt = reinterpret_cast<std::uint8_t*>(begin + before);
+    auto* const target = io::CodedOutputStream::WriteVarint32ToArray(length, lengthAt);
+    if (!bytes.empty()) std::memcpy(target, areOwn ? begin + ownAt : bytes.data(), bytes.size());
+    return size;
+  });
+  return {};
 }
 
 }  // namespace orv

@@ -19,13 +19,13 @@ namespace orv::inline v0 {
 
 // Fills the front of a buffer from a file, a socket or the like. Answers how many bytes it put there, 0 at
 // the end of the stream, and a negative number when reading failed. It may give fewer bytes than there is
-// room for, and throws nothing.
+// room for; an answer of more counts as a failure.
 using ReadFunction = std::move_only_function<std::ptrdiff_t(std::span<std::byte>)>;
 
 // Why no message could be read from a stream.
 struct StreamError {
   enum class Cause : std::uint8_t {
-    readFailed,        // the read function answered a negative number
+    readFailed,        // the read function answered a negative number, or more than there was room for
     truncated,         // the stream ends inside a length or a message
     malformedLength,   // a length of 2^31 or more, or spelled in more than five bytes
     tooLarge,          // a length above the reader's limit
@@ -50,7 +50,7 @@ struct StreamError {
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
 // are announced. After a malformed message the next one can be read; after any other error every further call
-// answers that error. A reader that was moved from may only be assigned to or destroyed.
+// answers that error, and after an exception of the allocator's or the read function's, readFailed. A reader that was moved from may only be assigned to or destroyed.
 class DelimitedReader {
  public:
   static constexpr std::size_t defaultMaximumSize = std::size_t{64} << 20;
@@ -87,8 +87,9 @@ class DelimitedReader {
   std::unique_ptr<Source> source_;
 };
 
-// Appends the number of bytes as a varint, and the bytes.
-void appendDelimited(std::string_view bytes, std::string& output);
+// Appends the number of bytes as a varint, and the bytes, which may be the output's own. It fails only above
+// 2^31-1 bytes. After an error nothing is appended.
+[[nodiscard]] std::expected<void, EncodeError> appendDelimited(std::string_view bytes, std::string& output);
 
 // Appends a message behind its length. After an error nothing is appended.
 template <class M>
@@ -96,8 +97,7 @@ requires requires(const M& message) { message.serialize(); }
 [[nodiscard]] std::expected<void, EncodeError> appendDelimited(const M& message, std::string& output) {
   const auto bytes = message.serialize();
   if (!bytes) return std::unexpected(bytes.error());
-  appendDelimited(std::string_view(*bytes), output);
-  return {};
+  return appendDelimited(std::string_view(*bytes), output);
 }
 
 }  // namespace orv

@@ -124,8 +124,54 @@ TEST(DelimitedStream, AppendsMessagesBehindTheirLengths) {
   ASSERT_TRUE(appendDelimited(message, stream));
   message.setData(ByteBuffer(std::string(200, 'd')));
   ASSERT_TRUE(appendDelimited(message, stream));
-  appendDelimited(std::string("y"), stream);
+  ASSERT_TRUE(appendDelimited("y", stream));
   EXPECT_EQ(toHex(stream), toHex("x" + hex("00 CB 01") + record(3, std::string(200, 'd')) + "\x01y"));
+}
+
+TEST(DelimitedStream, AppendsItsOwnBytes) {
+  for (const std::size_t size : {std::size_t{1}, std::size_t{15}, std::size_t{16}, std::size_t{200}}) {
+    const std::string before(size, 's');
+    std::string stream = before;
+    ASSERT_TRUE(appendDelimited(std::string_view(stream).substr(size / 2), stream));
+    EXPECT_EQ(stream, before + varint(size - size / 2) + before.substr(size / 2));
+    ASSERT_TRUE(appendDelimited(std::string_view(stream).substr(0, 0), stream));
+    EXPECT_TRUE(stream.ends_with('\0'));
+  }
+}
+
+TEST(DelimitedStream, EndsWhereTheReadFunctionLies) {
+  constexpr std::ptrdiff_t lies[] = {PTRDIFF_MIN, -1,         PTRDIFF_MIN + 1, 1 << 20,
+                                     PTRDIFF_MAX, 0xFFFFFFFF, 0x100000001};
+  for (const std::ptrdiff_t lie : lies) {
+    SCOPED_TRACE(lie);
+    DelimitedReader reader([&](std::span<std::byte> room) {
+      std::ranges::fill(room, std::byte{0x01});
+      return lie;
+    });
+    EXPECT_EQ(reader.next().error().cause, Cause::readFailed);
+  }
+}
+
+TEST(DelimitedStream, ReadsNothingAfterAnExceptionFromInside) {
+  // A message takes memory as its bytes arrive and when it is made of them; where it ran out while the stream was
+  // read nobody knows where the stream is.
+  const std::string first = record(3, std::string(100'000, 'd'));
+  const std::string stream = varint(first.size()) + first + hex("02 08 07");
+  std::size_t broken = 0;
+  const std::size_t failures =
+      runOutOfMemory([&] { return DelimitedReader(readerOf(stream, SIZE_MAX)); },
+                     [](DelimitedReader& reader) { EXPECT_TRUE(reader.read<SessionMessage>()); },
+                     [&](DelimitedReader& reader) {
+                       const auto next = reader.read<SessionMessage>();
+                       broken += !next;
+                       if (next) {
+                         EXPECT_EQ((*next)->version(), 7U);
+                       } else {
+                         EXPECT_EQ(next.error().cause, Cause::readFailed);
+                       }
+                     });
+  EXPECT_GT(broken, 1U);
+  EXPECT_LT(broken, failures);
 }
 
 TEST(DelimitedStream, GoesOnInAReaderThatWasMovedTo) {

@@ -45,7 +45,8 @@ class Conversion final : public MessageWork {
   Outcome<void> writeEncoding(std::string_view bytes) {
     std::string piece;
     if (options_.isDelimited) {
-      appendDelimited(bytes, piece);
+      if (auto appended = appendDelimited(bytes, piece); !appended)
+        return fail(ExitStatus::malformed, input.path() + ": " + std::string(describe(appended.error())));
       bytes = piece;
     }
     if (format_ == Format::binary) return output_.write(bytes);
