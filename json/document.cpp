@@ -80,13 +80,40 @@ std::string reasonOf(std::string_view sentence, char at) {
   return find(expectations, sentence).value_or("expected JSON") + ", found " + found;
 }
 
+}  // namespace
+
+struct Document::Contents {
+  Contents() = default;
+  Contents(const Contents&) = delete;
+  Contents& operator=(const Contents&) = delete;
+  ~Contents() { empty(root); }
+
+  // The library's own destructor allocates, for what a list or an object holds, and memory may have run out.
+  // Values are nested no deeper than maximumNesting.
+  static void empty(Node& node) noexcept {
+    if (node.is_array()) {
+      auto& items = node.get_ref<Node::array_t&>();
+      for (Node& item : items) empty(item);
+      items.clear();
+    } else if (node.is_object()) {
+      auto& members = node.get_ref<Node::object_t&>();
+      for (auto& [name, value] : members) empty(value);
+      members.clear();
+    }
+  }
+
+  Node root;
+};
+
+namespace {
+
 // Builds a document from the parser's events. The library's own builder would keep one of two members of the
 // same name; this refuses them, and nesting that is too deep, while the text is read.
 class DocumentBuilder final : public nlohmann::json_sax<Node> {
  public:
-  explicit DocumentBuilder(std::string_view text) : text_(text) {}
+  // The document becomes `root`, which is null before.
+  DocumentBuilder(std::string_view text, Node& root) : text_(text), root_(root) {}
 
-  Node takeRoot() { return std::move(root_); }
   // What ended the parsing early.
   const std::optional<Error>& error() const { return error_; }
 
@@ -175,7 +202,7 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
   }
 
   std::string_view text_;
-  Node root_;
+  Node& root_;
   std::vector<Open> open_;
   std::optional<Error> error_;
 };
@@ -199,10 +226,6 @@ std::string Error::message() const {
   return spelling::TextError{reason, line, column}.message();
 }
 
-struct Document::Contents {
-  Node root;
-};
-
 Document::Document(std::unique_ptr<Contents> contents) : contents_(std::move(contents)) {}
 Document::Document(Document&&) noexcept = default;
 Document& Document::operator=(Document&&) noexcept = default;
@@ -211,13 +234,14 @@ Document::~Document() = default;
 Value Document::root() const { return Value(&contents_->root); }
 
 std::expected<Document, Error> Document::parse(std::string_view text) {
-  DocumentBuilder builder(text);
+  auto contents = std::make_unique<Contents>();
+  DocumentBuilder builder(text, contents->root);
   Node::sax_parse(text.begin(), text.end(), &builder);
   // The library takes a NUL for the end.
   if (const auto nul = text.find('\0'); nul != std::string_view::npos && !builder.error().has_value())
     builder.failAt(nul, reasonOf({}, '\0'));
   if (builder.error().has_value()) return std::unexpected(*builder.error());
-  return Document(std::make_unique<Contents>(builder.takeRoot()));
+  return Document(std::move(contents));
 }
 
 Value::Kind Value::kind() const {

@@ -6,6 +6,7 @@
 #include <string>
 
 #include <orv/all_messages.hpp>
+#include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 
 namespace orv::test {
@@ -220,6 +221,30 @@ TEST(Json, ShowsUnknownFieldsOnDemand) {
       R"({"number":9,"wireType":"fixed64","value":"2"},)"
       R"({"number":10,"wireType":"lengthDelimited","value":"/w=="},)"
       R"({"number":11,"wireType":"startGroup","value":[{"number":1,"wireType":"varint","value":"1"}]}]})");
+}
+
+TEST(Json, LeaksNothingWhereverMemoryRunsOut) {
+  const std::string longName(50, 'n');
+  const std::string documents[] = {
+      R"({"initialize":{"groupUUID":"AQID","members":[{"handle":")" + longName +
+          R"("},{},{"tokenID":"a"}]}})",
+      R"({"initialize":{"members":[[[1.5,{"a":[null,true]}]]]}})",
+      R"({"initialize":{},")" + longName + R"(":{"x":[1,2,3]}})",
+      R"({"memberAdded":{"member":{"handle":"a","handle":)",
+      R"({"memberLeft":{"usesToken":[[[{"a":[)" + longName,
+  };
+  for (const std::string& document : documents) {
+    SCOPED_TRACE(document);
+    const auto nothing = [](auto&&...) { return 0; };
+    EXPECT_GT(runOutOfMemory(
+                  nothing, [&](int) { (void)json::parse<Group>(document); }, nothing),
+              5U);
+    const auto group = json::parse<Group>(document);
+    if (!group) continue;
+    EXPECT_GT(runOutOfMemory(
+                  nothing, [&](int) { (void)json::render(*group); }, nothing),
+              1U);
+  }
 }
 
 }  // namespace
