@@ -38,11 +38,12 @@ class Conversion final : public MessageWork {
   Outcome<void> takeEncoding(const MessageInput& input) {
     const auto checked = input.check();
     if (!checked && !options_.keepsGoing) return checked;
-    if (auto written = writeEncoding(input.encoding()); !written) return written;
+    if (auto written = writeEncoding(input); !written) return written;
     return checked;
   }
 
-  Outcome<void> writeEncoding(std::string_view bytes) {
+  Outcome<void> writeEncoding(const MessageInput& input) {
+    std::string_view bytes = input.encoding();
     std::string piece;
     if (options_.isDelimited) {
       if (auto appended = appendDelimited(bytes, piece); !appended)
