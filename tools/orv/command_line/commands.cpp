@@ -173,6 +173,7 @@ constexpr Example encodeExamples[] = {
 };
 constexpr Example inspectExamples[] = {
     {"orv inspect --delimited capture.bin", "explains the messages of a capture"},
+    {"orv inspect --to html message.bin -o message.html", "a page to attach to a report"},
     {"orv inspect --color always message.bin | less -R", "keeps the colours for a pager"},
 };
 constexpr Example convertExamples[] = {

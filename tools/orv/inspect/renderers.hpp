@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <memory>
 #include <string>
+#include <string_view>
 
 #include "tools/orv/inspect/explanation.hpp"
 
@@ -15,6 +16,10 @@ std::unique_ptr<Renderer> makeTextRenderer(const Options& options);
 std::unique_ptr<Renderer> makeJsonRenderer(const Options& options);
 // One page that stands alone.
 std::unique_ptr<Renderer> makeHtmlRenderer(const Options& options);
+
+// page.html, as it was when the command was built, with "{{…}}" for what is put into it, in this order: the title,
+// twice, the messages, the version.
+std::string_view page();
 
 // "1 byte", "2 bytes"
 void appendByteCount(std::size_t count, std::string& output);
