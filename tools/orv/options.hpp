@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -30,8 +31,9 @@ struct Options {
   const MessageType* type = &typeOf<SessionMessage>();
   PayloadPairing payloads;
   Selection selection;
-  std::optional<Format> from;  // none: to be seen from the input
-  std::optional<Format> to;    // none: the command writes no messages
+  std::optional<Format> from;  // none: to be seen from the input, as one of these
+  std::span<const Format> possibleFormats;
+  std::optional<Format> to;  // none: the command writes no messages
   bool isDelimited = false;
   bool keepsGoing = false;
   bool showsUnknownFields = false;

@@ -20,7 +20,7 @@ namespace orv::tool {
 struct FormatChoice {
   std::span<const Format> allowed{};
   std::optional<Format> byDefault{};
-  bool isGuessed = false;  // where it is not said; without this and a default it must be said
+  bool isGuessed = false;  // where it is not said
 };
 
 struct Command;

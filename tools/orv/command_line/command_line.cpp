@@ -114,9 +114,8 @@ std::optional<std::string> withoutEffect(const Options& options) {
 // together, if anything is.
 std::optional<std::string> complete(const Command& command, Options& options) {
   if (!options.from) options.from = command.from.byDefault;
+  options.possibleFormats = command.from.allowed;
   if (!options.to) options.to = command.to.byDefault;
-  if (!command.from.allowed.empty() && !command.from.isGuessed && !options.from)
-    return "--from must be given";
   if (const auto reason = withoutEffect(options)) return reason;
   auto& files = options.files;
   if (command.operands == Operands::twoFiles) {

@@ -177,8 +177,8 @@ constexpr Example inspectExamples[] = {
     {"orv inspect --color always message.bin | less -R", "keeps the colours for a pager"},
 };
 constexpr Example convertExamples[] = {
-    {"orv convert --from hex --to binary dump.txt -o message.bin", "bytes out of a hexadecimal dump"},
-    {"orv convert --from json --to text message.json", "JSON as text"},
+    {"orv convert --to binary dump.txt -o message.bin", "bytes out of a hexadecimal dump"},
+    {"orv convert message.json", "JSON as text"},
 };
 constexpr Example diffExamples[] = {
     {"orv diff before.bin after.bin", "the fields that differ"},
@@ -230,7 +230,7 @@ constexpr Command commands[] = {
      .text = "Reads messages in one format and writes them in another. Bytes that stay bytes are checked and "
              "kept as they are.",
      .operands = Operands::files,
-     .from = {.allowed = allFormats},
+     .from = {.allowed = allFormats, .isGuessed = true},
      .to = {.allowed = allFormats, .byDefault = Format::text},
      .options = decodeOptions,
      .examples = convertExamples},

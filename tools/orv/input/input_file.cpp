@@ -39,17 +39,16 @@ std::ptrdiff_t InputFile::read(std::span<std::byte> buffer) {
   return static_cast<std::ptrdiff_t>(count);
 }
 
-std::optional<char> InputFile::firstVisibleCharacter() {
+std::string_view InputFile::beginning() {
   constexpr std::size_t limit = std::size_t{64} << 10;
-  for (;;) {
-    const auto at = lookedAt_.find_first_not_of(" \t\r\n");
-    if (at != std::string::npos) return lookedAt_[at];
+  while (lookedAt_.find_first_not_of(" \t\r\n") == std::string::npos && lookedAt_.size() < limit) {
     std::byte piece[4096];
-    const std::ptrdiff_t count = lookedAt_.size() < limit ? readDescriptor(piece) : 0;
+    const std::ptrdiff_t count = readDescriptor(piece);
     // A failure shows again when the input is read.
-    if (count <= 0) return std::nullopt;
+    if (count <= 0) break;
     lookedAt_.append(charactersOf(std::span(piece).first(static_cast<std::size_t>(count))));
   }
+  return lookedAt_;
 }
 
 std::ptrdiff_t InputFile::readDescriptor(std::span<std::byte> buffer) {

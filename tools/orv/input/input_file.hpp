@@ -35,9 +35,8 @@ class InputFile {
   std::ptrdiff_t read(std::span<std::byte> buffer);
   const Failure& failure() const { return *failure_; }
 
-  // The first character that is no white space, which stays to be read; none if there is none near the
-  // beginning.
-  std::optional<char> firstVisibleCharacter();
+  // What it begins with, white space and more, which stays to be read. Only white space if there is much of it.
+  std::string_view beginning();
 
  private:
   InputFile(std::string name, int descriptor, OutputFile& output)

@@ -1,9 +1,12 @@
 #include "tools/orv/input/message_input.hpp"
 
+#include <algorithm>
+#include <span>
 #include <utility>
 
 #include <orv/byte_view.hpp>
 #include <orv/json/document.hpp>
+#include <orv/utf8.hpp>
 #include "tools/orv/messages/text_form.hpp"
 #include "tools/orv/output/progress.hpp"
 
@@ -11,10 +14,31 @@ namespace orv::tool {
 
 namespace {
 
-// An array is no message, but more likely meant for JSON than for an extension in the text format.
-Format guessFormat(InputFile& file) {
-  const auto first = file.firstVisibleCharacter();
-  return first == '{' || first == '[' ? Format::json : Format::text;
+template <class Reader>
+bool isSpelledFor(Reader reader, std::string_view text) {
+  std::string bytes;
+  return reader.take(text, bytes) && (!bytes.empty() || reader.finish(bytes)) && !bytes.empty();
+}
+
+// By what it begins with. An array is no message, but more likely meant for JSON than for an extension in the text
+// format.
+Format guessFormat(std::string_view beginning, std::span<const Format> possible) {
+  constexpr std::string_view blanks = " \t\r\n";
+  constexpr std::string_view hexDigits = "0123456789abcdefABCDEF";
+  const auto isControl = [&](char c) { return c >= 0 && c < ' ' && !blanks.contains(c); };
+  const std::string_view text =
+      beginning.substr(std::min(beginning.size(), beginning.find_first_not_of(blanks)));
+  if (text.starts_with('{') || text.starts_with('[')) return Format::json;
+  if (std::ranges::find(possible, Format::binary) == possible.end()) return Format::text;
+  if (std::ranges::any_of(beginning, isControl) || !utf8::isWellFormed(text)) return Format::binary;
+  const std::string_view word = text.substr(0, text.find_first_of(" \t\r\n:{<"));
+  const auto behind = text.find_first_not_of(" \t", word.size());
+  const bool isField = behind != std::string_view::npos && std::string_view(":{<").contains(text[behind]);
+  if (text.starts_with('#') || (isField && word.find_first_not_of(hexDigits) != std::string_view::npos))
+    return Format::text;
+  if (isSpelledFor(spelling::HexReader(), text)) return Format::hex;
+  const bool isOneWord = text.substr(0, text.find('\n')).find(' ') == std::string_view::npos;
+  return isOneWord && isSpelledFor(spelling::Base64Reader(), text) ? Format::base64 : Format::text;
 }
 
 // Tells of what failed, behind the output that came before it.
@@ -69,7 +93,7 @@ MessageInput::MessageInput(InputFile file, const std::string& path, const Option
     : file_(std::move(file)),
       path_(path),
       options_(options),
-      format_(options.from ? *options.from : guessFormat(file_)),
+      format_(options.from ? *options.from : guessFormat(file_.beginning(), options.possibleFormats)),
       reader_(FrameReader::make(file_, format_, options)) {}
 
 Outcome<std::unique_ptr<MessageInput>> MessageInput::open(const std::string& path, const Options& options,

@@ -21,7 +21,7 @@ namespace orv::tool {
 class MessageInput {
  public:
   // The options, which must outlive the input, say type, payloads and format; without a format it is guessed
-  // from the input's first character, text or JSON. So must the output, which is written before more input is
+  // from what the input begins with. So must the output, which is written before more input is
   // waited for.
   static Outcome<std::unique_ptr<MessageInput>> open(const std::string& path, const Options& options,
                                                      OutputFile& output);
