@@ -49,6 +49,10 @@ char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size
 
 }  // namespace
 
+bool InlineBytes::haveEqualContents(const InlineBytes& left, const InlineBytes& right) {
+  return left.view() == right.view();
+}
+
 void InlineBytes::assign(std::string_view bytes) {
   if (isOnHeap()) {
     const Block block = heapBlock();

@@ -93,12 +93,9 @@ class InlineBytes {
   }
   std::size_t size() const { return isOnHeap() ? heapBlock().size : raw_[tagOffset]; }
 
-  // Compares all of the objects; what is behind the contents does not count.
+  // Where all bytes of the objects are the same, as in a copy, so are their contents.
   friend bool operator==(const InlineBytes& left, const InlineBytes& right) {
-    if (left.isOnHeap() || right.isOnHeap()) [[unlikely]]
-      return left.view() == right.view();
-    const std::size_t size = left.raw_[tagOffset];
-    return size == right.raw_[tagOffset] && areEqualWithin(left.raw_, right.raw_, size);
+    return (!left.isOnHeap() && areSame(left.raw_, right.raw_)) || haveEqualContents(left, right);
   }
 
   // Whether the first `size` bytes are ASCII, of objectSize that may be read; `size` is what fits inside.
@@ -137,17 +134,20 @@ class InlineBytes {
   static constexpr std::size_t tagOffset = objectSize - 1;
   static constexpr unsigned char heapTag = 0xFF;
 
-  static bool areEqualWithin(const unsigned char* left, const unsigned char* right, std::size_t size) {
+  static bool areSame(const unsigned char* left, const unsigned char* right) {
 #ifdef __SSE2__
-    const std::uint64_t same =
-        signs(_mm_cmpeq_epi8(part<0>(left), part<0>(right)), _mm_cmpeq_epi8(part<16>(left), part<16>(right)),
-              _mm_cmpeq_epi8(lastPart(left), lastPart(right)));
-    return (~same & lowBits(size)) == 0;
+    const __m128i same = _mm_and_si128(_mm_and_si128(_mm_cmpeq_epi8(part<0>(left), part<0>(right)),
+                                                     _mm_cmpeq_epi8(part<16>(left), part<16>(right))),
+                                       _mm_cmpeq_epi8(lastPart(left), lastPart(right)));
+    return _mm_movemask_epi8(same) == 0xFFFF;
 #else
-    const auto difference = [&](std::size_t at) { return wordAt(left + at) ^ wordAt(right + at); };
-    return anyBit(difference, size) == 0;
+    std::uint64_t difference = 0;
+    for (std::size_t at = 0; at < objectSize; at += sizeof difference)
+      difference |= wordAt(left + at) ^ wordAt(right + at);
+    return difference == 0;
 #endif
   }
+  static bool haveEqualContents(const InlineBytes& left, const InlineBytes& right);
 
 #ifdef __SSE2__
   template <std::size_t at>
