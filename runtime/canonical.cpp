@@ -77,7 +77,7 @@ std::vector<char32_t> canonicalDecomposition(std::string_view utf8) {
   return output;
 }
 
-bool areCanonicallyEquivalent(std::string_view left, std::string_view right) {
+std::strong_ordering canonicalOrder(std::string_view left, std::string_view right) {
   // What both share up to an ASCII character may be left out: no mark is ordered across it and nothing
   // composes with what stands before it.
   auto shared = static_cast<std::size_t>(std::ranges::mismatch(left, right).in1 - left.begin());
@@ -85,8 +85,8 @@ bool areCanonicallyEquivalent(std::string_view left, std::string_view right) {
   if (shared > 0) --shared;
   left.remove_prefix(shared);
   right.remove_prefix(shared);
-  if (utf8::isAscii(left) && utf8::isAscii(right)) return left == right;
-  return canonicalDecomposition(left) == canonicalDecomposition(right);
+  if (utf8::isAscii(left) && utf8::isAscii(right)) return left <=> right;
+  return canonicalDecomposition(left) <=> canonicalDecomposition(right);
 }
 
 }  // namespace orv

@@ -1,6 +1,7 @@
 // Canonical equivalence of texts (Unicode 15.0, D70): their canonical decompositions are the same.
 #pragma once
 
+#include <compare>
 #include <string_view>
 #include <vector>
 
@@ -10,7 +11,7 @@ namespace orv::inline v0 {
 // the length for any input, long runs of combining marks included.
 std::vector<char32_t> canonicalDecomposition(std::string_view utf8);
 
-// Both are well-formed UTF-8.
-bool areCanonicallyEquivalent(std::string_view left, std::string_view right);
+// The order of the canonical decompositions, code point by code point. Both are well-formed UTF-8.
+std::strong_ordering canonicalOrder(std::string_view left, std::string_view right);
 
 }  // namespace orv

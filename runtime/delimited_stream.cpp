@@ -52,9 +52,13 @@ class ReadFunctionStream final : public io::CopyingInputStream {
 
 }  // namespace
 
+std::string_view describe(StreamError::Cause cause) {
+  return streamSentences[static_cast<std::size_t>(cause)];
+}
+
 std::string StreamError::reason() const {
   if (decodeError.has_value()) return decodeError->reason();
-  std::string text(streamSentences[static_cast<std::size_t>(cause)]);
+  std::string text(describe(cause));
   if (cause == Cause::tooLarge) text += " (" + std::to_string(length) + " bytes)";
   return text;
 }

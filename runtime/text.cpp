@@ -34,6 +34,8 @@ std::expected<Text, IllFormedText> Text::checked(std::string_view utf8) {
   return text;
 }
 
+std::string IllFormedText::message() const { return "ill-formed UTF-8 at byte " + std::to_string(offset); }
+
 void Text::hash(Hasher& into) const {
   const std::string_view bytes = utf8();
   if (utf8::isAscii(bytes)) {
@@ -50,8 +52,8 @@ void Text::hash(Hasher& into) const {
   }
 }
 
-bool Text::isCanonicallyEqual(std::string_view left, std::string_view right) {
-  return areCanonicallyEquivalent(left, right);
+std::weak_ordering Text::canonicalOrder(std::string_view left, std::string_view right) {
+  return orv::canonicalOrder(left, right);
 }
 
 }  // namespace orv

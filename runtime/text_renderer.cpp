@@ -161,26 +161,30 @@ class TextRenderer::UnknownFieldsRenderer {
 };
 
 void TextRenderer::startLine(std::string_view name) {
-  output_.append(indentation_, ' ');
+  if (!style_.isOneLine) output_.append(indentation_, ' ');
   output_ += name;
 }
 
+void TextRenderer::endLine() { output_ += style_.isOneLine ? ' ' : '\n'; }
+
 void TextRenderer::open(std::string_view name) {
   startLine(name);
-  output_ += " {\n";
+  output_ += " {";
+  endLine();
   indentation_ += 2;
 }
 
 void TextRenderer::close() {
   indentation_ -= 2;
-  startLine("}\n");
+  startLine("}");
+  endLine();
 }
 
 TextRenderer::Result TextRenderer::plain(std::string_view name, std::string_view value) {
   startLine(name);
   output_ += ": ";
   output_ += value;
-  output_ += '\n';
+  endLine();
   return {};
 }
 
@@ -188,7 +192,7 @@ TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_vie
   startLine(name);
   output_ += ": ";
   appendQuoted(bytes);
-  output_ += '\n';
+  endLine();
   return {};
 }
 
@@ -209,6 +213,10 @@ void TextRenderer::appendQuoted(std::string_view bytes) {
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
   UnknownFieldsRenderer renderer(*this);
   for (const UnknownField& field : unknownFields) {
+    if (style_.hidesSecrets) {
+      (void)redacted(std::to_string(field.tag.fieldNumber()));
+      continue;
+    }
     LenientReader input(field.record);
     (void)renderer.renderRecords(input, {unknownLevels, internal::maximumNesting});
   }

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <expected>
+#include <iosfwd>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -15,6 +16,8 @@
 #include <orv/connection_request.hpp>
 #include <orv/connection_response.hpp>
 #include <orv/group.hpp>
+#include <orv/internal/bad_access.hpp>
+#include <orv/internal/printing.hpp>
 #include <orv/join_request.hpp>
 #include <orv/join_response.hpp>
 #include <orv/session_message.hpp>
@@ -133,6 +136,10 @@ struct Error {
 
   // What is wrong, in a line: "an envelope of the type unknown carries no payload".
   std::string message() const;
+
+  friend std::ostream& operator<<(std::ostream& out, const Error& error) {
+    return internal::print(out, error.message());
+  }
 };
 
 // The payload that the envelope's type names.
@@ -142,3 +149,8 @@ struct Error {
 std::string nameOf(VessaSessionMessageType type);
 
 }  // namespace orv::envelope
+
+template <>
+class std::bad_expected_access<orv::envelope::Error> : public orv::internal::BadAccess<orv::envelope::Error> {
+  using BadAccess::BadAccess;
+};

@@ -8,7 +8,7 @@
 #include <vector>
 
 #include <orv/byte_buffer.hpp>
-#include <orv/name_map.hpp>
+#include <orv/descriptor.hpp>
 #include <orv/text.hpp>
 #include <orv/unknown_storage.hpp>
 #include <orv/visitor.hpp>
@@ -65,32 +65,34 @@ class AnyValueVisitor {
 
   template <class M>
   Result beginMessage(const M&, std::size_t) {
-    names_ = M::_protobuf_nameMap();
+    message_ = &M::descriptor();
     return {};
   }
 
  protected:
-  // Walks a message inside the one that is being walked, whose names hold again afterwards.
+  // Walks a message inside the one that is being walked, which fields belong to again afterwards.
   template <class M>
   Result walkNested(const M& message) {
-    const NameMap outer = names_;
+    const MessageDescriptor* const outer = message_;
     auto walked = message.traverse(self());
-    names_ = outer;
+    message_ = outer;
     return walked;
   }
 
-  // Of the message that is being walked.
-  NameMap names() const { return names_; }
-  // A field's name there, or its number where it has none.
+  // A field of the message that is being walked; none for a number that the message does not define.
+  const FieldDescriptor* field(std::uint32_t number) const {
+    return message_ != nullptr ? message_->field(number) : nullptr;
+  }
+  // The field's name, or its number where it has none.
   std::string fieldName(std::uint32_t number) const {
-    const auto name = names_.name(number);
-    return name ? std::string(*name) : std::to_string(number);
+    const FieldDescriptor* const named = field(number);
+    return named != nullptr ? std::string(named->name) : std::to_string(number);
   }
 
  private:
   Derived& self() { return static_cast<Derived&>(*this); }
 
-  NameMap names_;
+  const MessageDescriptor* message_ = nullptr;  // that is being walked
 };
 
 }  // namespace orv

@@ -3,8 +3,8 @@
 
 #include <cstddef>
 #include <expected>
-#include <span>
 
+#include <orv/byte_buffer.hpp>
 #include <orv/conflict_hook.hpp>
 #include <orv/decode_error.hpp>
 #include <orv/internal/field_reader.hpp>
@@ -23,8 +23,9 @@ namespace orv::inline v0 {
 // succeeded; error() says what was wrong.
 class BinaryDecoder : private internal::OutermostFrame, public internal::FieldReader {
  public:
-  explicit BinaryDecoder(std::span<const std::byte> bytes, ConflictHook hook = {})
-      : OutermostFrame(bytes.data(), hook), FieldReader(bytes, bytes.data() + bytes.size(), *this) {}
+  explicit BinaryDecoder(ByteView input, ConflictHook hook = {})
+      : OutermostFrame(input.bytes().data(), hook),
+        FieldReader(input.bytes(), input.bytes().data() + input.size(), *this) {}
   BinaryDecoder(const BinaryDecoder&) = delete;
   BinaryDecoder& operator=(const BinaryDecoder&) = delete;
 

@@ -4,11 +4,14 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <expected>
+#include <iosfwd>
 #include <span>
 #include <string>
 #include <string_view>
 
 #include <orv/descriptor.hpp>
+#include <orv/internal/bad_access.hpp>
 
 namespace orv::inline v0 {
 
@@ -32,6 +35,7 @@ enum class DecodeCause : std::uint8_t {
 // A sentence without its full stop, for instance "varint of more than ten bytes". It lasts as long as the
 // program.
 std::string_view describe(DecodeCause cause);
+std::ostream& operator<<(std::ostream& out, DecodeCause cause);
 
 // Where a field stands in a message tree: the outermost message, then field numbers. A plain value that
 // allocates nothing and owns nothing: names are looked up when they are asked for.
@@ -55,6 +59,7 @@ class FieldPath {
   std::string text() const;
 
   friend bool operator==(const FieldPath&, const FieldPath&) = default;
+  friend std::ostream& operator<<(std::ostream& out, const FieldPath& path);
 
  private:
   const MessageDescriptor* outermost_ = nullptr;
@@ -81,6 +86,12 @@ struct DecodeError {
   std::string message() const;
 
   friend bool operator==(const DecodeError&, const DecodeError&) = default;
+  friend std::ostream& operator<<(std::ostream& out, const DecodeError& error);
 };
 
 }  // namespace orv
+
+template <>
+class std::bad_expected_access<orv::DecodeError> : public orv::internal::BadAccess<orv::DecodeError> {
+  using BadAccess::BadAccess;
+};

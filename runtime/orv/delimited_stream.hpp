@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <expected>
 #include <functional>
+#include <iosfwd>
 #include <memory>
 #include <optional>
 #include <span>
@@ -14,6 +15,7 @@
 
 #include <orv/decode_error.hpp>
 #include <orv/encode_error.hpp>
+#include <orv/internal/bad_access.hpp>
 
 namespace orv::inline v0 {
 
@@ -46,7 +48,12 @@ struct StreamError {
   std::string message() const;
 
   friend bool operator==(const StreamError&, const StreamError&) = default;
+  friend std::ostream& operator<<(std::ostream& out, const StreamError& error);
 };
+
+// A sentence without its full stop. It lasts as long as the program.
+std::string_view describe(StreamError::Cause cause);
+std::ostream& operator<<(std::ostream& out, StreamError::Cause cause);
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
 // are announced. After a malformed message the next one can be read; after any other error every further call
@@ -101,3 +108,8 @@ requires requires(const M& message) { message.serialize(); }
 }
 
 }  // namespace orv
+
+template <>
+class std::bad_expected_access<orv::StreamError> : public orv::internal::BadAccess<orv::StreamError> {
+  using BadAccess::BadAccess;
+};

@@ -32,6 +32,7 @@ struct FieldDescriptor {
   std::uint8_t oneof;                // of a oneof member: which of the message's oneofs, counted from 0
   const MessageDescriptor* message;  // the type of a message; none for other values
   NameMap cases;                     // the named cases of an enumeration; empty for other values
+  bool isSecret = false;             // whether its value is to be kept out of logs
 };
 
 // One constant per message type; all that it refers to lasts as long as the program.

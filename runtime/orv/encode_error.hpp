@@ -2,7 +2,11 @@
 #pragma once
 
 #include <cstdint>
+#include <expected>
+#include <iosfwd>
 #include <string_view>
+
+#include <orv/internal/bad_access.hpp>
 
 namespace orv::inline v0 {
 
@@ -16,5 +20,11 @@ constexpr std::string_view describe(EncodeError error) {
   return error == EncodeError::bufferTooSmall ? "the buffer is too small for the encoding"
                                               : "the encoding would have more than 2^31-1 bytes";
 }
+std::ostream& operator<<(std::ostream& out, EncodeError error);
 
 }  // namespace orv
+
+template <>
+class std::bad_expected_access<orv::EncodeError> : public orv::internal::BadAccess<orv::EncodeError> {
+  using BadAccess::BadAccess;
+};

@@ -14,34 +14,27 @@
 
 namespace orv::inline v0 {
 
+// How a TextRenderer writes.
+struct TextStyle {
+  bool isOneLine = false;     // a space behind each field in place of a line's end
+  bool hidesSecrets = false;  // `<redacted>` for the values of secret fields, and of unknown ones
+};
+
 // A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format"), a field a line.
 // Unknown fields are written by number; one that is length-delimited and reads as a sequence of records is
 // shown as a message, as the official printer does, to ten levels.
 class TextRenderer : public AnyValueVisitor<TextRenderer> {
  public:
   // Appends to `output`.
-  explicit TextRenderer(std::string& output) : output_(output) {}
+  explicit TextRenderer(std::string& output, TextStyle style = {}) : output_(output), style_(style) {}
 
-  Result visitAnyValue(const Text& value, std::uint32_t number) {
-    return quoted(fieldName(number), value.utf8());
-  }
-  Result visitAnyValue(const ByteBuffer& value, std::uint32_t number) {
-    return quoted(fieldName(number), value.characters());
-  }
-  Result visitAnyValue(bool value, std::uint32_t number) {
-    return plain(fieldName(number), value ? "true" : "false");
-  }
-  Result visitAnyValue(std::uint32_t value, std::uint32_t number) {
-    return plain(fieldName(number), std::to_string(value));
-  }
-  // By name, or by number where the raw value has none.
-  template <class Enumeration>
-  Result visitAnyValue(const Enumeration& value, std::uint32_t number) {
-    const auto name = Enumeration::_protobuf_nameMap().name(value.rawValue());
-    return plain(fieldName(number), name ? std::string(*name) : std::to_string(value.rawValue()));
+  template <class T>
+  Result visitAnyValue(const T& value, std::uint32_t number) {
+    return hides(number) ? redacted(fieldName(number)) : write(fieldName(number), value);
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
+    if (hides(number)) return redacted(fieldName(number));
     open(fieldName(number));
     (void)walkNested(message);
     close();
@@ -50,9 +43,26 @@ class TextRenderer : public AnyValueVisitor<TextRenderer> {
   Result visitUnknownFields(const UnknownStorage& unknownFields);
 
  private:
+  bool hides(std::uint32_t number) const {
+    return style_.hidesSecrets && (field(number) == nullptr || field(number)->isSecret);
+  }
+
+  Result write(std::string_view name, const Text& value) { return quoted(name, value.utf8()); }
+  Result write(std::string_view name, const ByteBuffer& value) { return quoted(name, value.characters()); }
+  Result write(std::string_view name, bool value) { return plain(name, value ? "true" : "false"); }
+  Result write(std::string_view name, std::uint32_t value) { return plain(name, std::to_string(value)); }
+  // By name, or by number where the raw value has none.
+  template <class Enumeration>
+  Result write(std::string_view name, const Enumeration& value) {
+    const auto caseName = Enumeration::_protobuf_nameMap().name(value.rawValue());
+    return plain(name, caseName ? std::string(*caseName) : std::to_string(value.rawValue()));
+  }
+  Result redacted(std::string_view name) { return plain(name, "<redacted>"); }
+
   void startLine(std::string_view name);
   void open(std::string_view name);
   void close();
+  void endLine();
   Result plain(std::string_view name, std::string_view value);
   Result quoted(std::string_view name, std::string_view bytes);
   void appendQuoted(std::string_view bytes);
@@ -60,6 +70,7 @@ class TextRenderer : public AnyValueVisitor<TextRenderer> {
   class UnknownFieldsRenderer;
 
   std::string& output_;
+  TextStyle style_;
   std::size_t indentation_ = 0;
 };
 

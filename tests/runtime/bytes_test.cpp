@@ -1,7 +1,14 @@
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <array>
+#include <cstdint>
+#include <utility>
+#include <vector>
+
 #include <orv/byte_buffer.hpp>
 #include <orv/internal/inline_bytes.hpp>
+#include <orv/text.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 
@@ -110,6 +117,55 @@ TEST(InlineBytes, AreCopiedToTheirOwnSizeWhateverTheirBlockHolds) {
   const internal::InlineBytes copy = shrunk;
   EXPECT_EQ(copy.view(), shorter);
   EXPECT_EQ(meter.allocations(), 0U);
+}
+
+TEST(ByteView, IsMadeOfAnyBytesInOnePiece) {
+  char characters[] = {'a', '\0'};
+  const unsigned char octets[] = {'a', 0};
+  std::array<std::byte, 2> array{std::byte{'a'}};
+  const std::string string("a\0", 2);
+  const std::vector<std::uint8_t> vector{'a', 0};
+  const ByteBuffer buffer = vector;
+  const std::pair<const char*, ByteView> views[] = {
+      {"array of characters", characters},
+      {"array of octets", octets},
+      {"std::array", array},
+      {"std::string", string},
+      {"std::string_view", std::string_view(string)},
+      {"std::vector", vector},
+      {"span of fixed size", std::span(array)},
+      {"span of octets", std::span<const std::uint8_t>(octets)},
+      {"ByteBuffer", buffer},
+      {"literal", "a\0"},
+      {"literal of UTF-8", u8"a\0"},
+      {"literal of bytes", "a\0"_bytes},
+  };
+  for (const auto& [name, view] : views) {
+    EXPECT_EQ(view.characters(), string) << name;
+    EXPECT_EQ(ByteBuffer(view), string) << name;
+  }
+  EXPECT_EQ(ByteBuffer(characters), string);
+  EXPECT_EQ(ByteBuffer(u8"a\0"), "a\0"_bytes);
+  EXPECT_EQ(ByteView().size(), 0U);
+  EXPECT_EQ(ByteView("").size(), 0U);
+
+  // A pointer has no end, numbers of several bytes no one order, and a bool is no byte.
+  static_assert(
+      !std::convertible_to<const char*, ByteView> && !std::convertible_to<std::nullptr_t, ByteView> &&
+      !std::constructible_from<ByteBuffer, const char*> && !std::convertible_to<std::vector<int>, ByteView> &&
+      !std::convertible_to<std::array<bool, 2>, ByteView> && !std::convertible_to<Text, ByteView>);
+}
+
+TEST(ByteBuffer, IsARangeAndComparesWithOthers) {
+  const ByteBuffer buffer = std::vector<std::uint8_t>{0, 0x7F, 0xFF};
+  const std::byte bytes[] = {std::byte{0}, std::byte{0x7F}, std::byte{0xFF}};
+  EXPECT_TRUE(std::ranges::equal(buffer, bytes));
+  EXPECT_EQ(buffer.data(), buffer.bytes().data());
+  EXPECT_TRUE(buffer == bytes && bytes == buffer && buffer == ByteView(bytes).bytes());
+  EXPECT_TRUE(buffer != "\0\x7F"_bytes && !buffer.empty());
+  // As unsigned bytes, a beginning before the whole.
+  const ByteBuffer ascending[] = {"", "\0"_bytes, "\0\0"_bytes, "\0\x7F"_bytes, buffer, "\x80"_bytes};
+  EXPECT_TRUE(std::ranges::is_sorted(ascending, std::ranges::less_equal()));
 }
 
 TEST(ByteBuffer, ComparesLengthAndBytes) {

@@ -5,6 +5,7 @@
 #include <fstream>
 #include <sstream>
 
+#include <orv/byte_buffer.hpp>
 #include "runtime/canonical.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/normal_form.hpp"
@@ -98,6 +99,8 @@ TEST(Text, EqualsTextsThatAreCanonicallyEquivalent) {
       EXPECT_EQ(left == right, row.areEqual) << around;
       EXPECT_EQ(right == left, row.areEqual) << around;
       EXPECT_EQ(hashOf(left) == hashOf(right), row.areEqual) << around;
+      EXPECT_EQ((left <=> right) == 0, row.areEqual) << around;
+      EXPECT_EQ(left<right, right> left) << around;
     }
   }
 }
@@ -146,7 +149,31 @@ TEST(Text, AgreesWithASlowNormalisation) {
     const bool areEqual = slowDecomposition(left) == slowDecomposition(right);
     EXPECT_EQ(Text(left) == Text(right), areEqual) << toHex(left) << " and " << toHex(right);
     EXPECT_EQ(hashOf(left) == hashOf(right), areEqual) << toHex(left) << " and " << toHex(right);
+    // UTF-8 is ordered as its code points are.
+    EXPECT_EQ(Text(left) <=> Text(right), slowDecomposition(left) <=> slowDecomposition(right))
+        << toHex(left) << " and " << toHex(right);
   }
+}
+
+TEST(Text, StandsBesideTheOtherStrings) {
+  const Text text = u8"zo\u00EB";
+  EXPECT_EQ(text, u8"zoe\u0308");
+  EXPECT_EQ(text, "zoe\u0308");
+  EXPECT_EQ(std::string("zoe\u0308"), text);
+  EXPECT_EQ(std::string_view("zo\u00EB"), text);
+  EXPECT_TRUE(text != std::string_view("zoe") && text > "zoe" && text < std::string("zof"));
+  const std::string_view view = text;
+  EXPECT_EQ(view, "zo\u00EB");
+  EXPECT_EQ("<" + text + std::string(">"), "<zo\u00EB>");
+  EXPECT_TRUE(text.size() == 4 && !text.empty() && Text(std::u8string()).empty());
+
+  // Zero is no text.
+  static_assert(!std::constructible_from<Text, std::nullptr_t> && !std::constructible_from<Text, ByteBuffer>);
+  constexpr auto takesZero = []<class T>(T*) {
+    return requires { T(0); }
+    || requires { T{0}; };
+  };
+  static_assert(!takesZero(static_cast<Text*>(nullptr)));
 }
 
 TEST(Text, GrowsByAppendingItself) {

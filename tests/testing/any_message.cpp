@@ -1,6 +1,7 @@
 #include "tests/testing/any_message.hpp"
 
 #include <algorithm>
+#include <sstream>
 
 #include <orv/all_messages.hpp>
 
@@ -15,6 +16,7 @@ class MessageOf final : public AnyMessage {
 
   std::string_view fullName() const override { return M::protoMessageName; }
   NameMap nameMap() const override { return M::_protobuf_nameMap(); }
+  const MessageDescriptor& descriptor() const override { return M::descriptor(); }
   bool isInitialized() const override { return M::isInitialized(); }
 
   MessagePointer copied() const override { return std::make_unique<MessageOf>(message_); }
@@ -32,8 +34,13 @@ class MessageOf final : public AnyMessage {
     });
     return isEqual;
   }
+  std::weak_ordering order(const AnyMessage& other) const override {
+    return message_ <=> static_cast<const MessageOf&>(other).message_;
+  }
   std::uint64_t hashValue() const override { return message_.hashValue(); }
   std::string debugDescription() const override { return message_.debugDescription(); }
+  std::string printed() const override { return (std::ostringstream() << message_).str(); }
+  std::string redactedDescription() const override { return message_.redactedDescription(); }
   UnknownStorage& mutableUnknownFields() override { return message_.mutableUnknownFields(); }
 
   std::expected<MessagePointer, DecodeError> parse(std::span<const std::byte> bytes) const override {

@@ -2,6 +2,7 @@
 // once for each type.
 #pragma once
 
+#include <compare>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
@@ -12,6 +13,7 @@
 #include <vector>
 
 #include <orv/decode_error.hpp>
+#include <orv/descriptor.hpp>
 #include <orv/encode_error.hpp>
 #include <orv/name_map.hpp>
 #include <orv/unknown_storage.hpp>
@@ -30,6 +32,7 @@ class AnyMessage {
 
   virtual std::string_view fullName() const = 0;
   virtual NameMap nameMap() const = 0;
+  virtual const MessageDescriptor& descriptor() const = 0;
   virtual bool isInitialized() const = 0;
 
   virtual MessagePointer copied() const = 0;
@@ -38,8 +41,11 @@ class AnyMessage {
   virtual void assignMoved(AnyMessage& other) = 0;
 
   virtual bool isEqualTo(const AnyMessage& other) const = 0;
+  virtual std::weak_ordering order(const AnyMessage& other) const = 0;  // with one of the same type
   virtual std::uint64_t hashValue() const = 0;
   virtual std::string debugDescription() const = 0;
+  virtual std::string printed() const = 0;
+  virtual std::string redactedDescription() const = 0;
   virtual UnknownStorage& mutableUnknownFields() = 0;
 
   // A new message.

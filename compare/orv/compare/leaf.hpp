@@ -130,7 +130,8 @@ class LeafCollector : public AnyValueVisitor<LeafCollector> {
   template <class T>
   void enter(std::uint32_t number, T value) {
     // What has no name are the unknown fields.
-    const std::string_view name = names().name(number).value_or("unknownFields");
+    const FieldDescriptor* const named = field(number);
+    const std::string_view name = named != nullptr ? named->name : "unknownFields";
     place_.push_back({number, std::exchange(itemIndex_, std::nullopt), name});
     leaves_.push_back({place_, std::move(value)});
   }

@@ -2,8 +2,13 @@
 #pragma once
 
 #include <cstddef>
+#include <expected>
+#include <iosfwd>
 #include <string>
 #include <string_view>
+
+#include <orv/internal/bad_access.hpp>
+#include <orv/internal/printing.hpp>
 
 namespace orv::inline v0::json {
 
@@ -22,6 +27,9 @@ struct Error {
   std::string message() const;
 
   friend bool operator==(const Error&, const Error&) = default;
+  friend std::ostream& operator<<(std::ostream& out, const Error& error) {
+    return internal::print(out, error.message());
+  }
 };
 
 // A step into an object, as paths write it: ".name", or ["na me"] for what is no plain word. Long names are
@@ -29,3 +37,8 @@ struct Error {
 std::string memberStep(std::string_view name);
 
 }  // namespace orv::json
+
+template <>
+class std::bad_expected_access<orv::json::Error> : public orv::internal::BadAccess<orv::json::Error> {
+  using BadAccess::BadAccess;
+};

@@ -47,7 +47,7 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
       ByteBuffer invitationData_;
 
       static constexpr std::tuple fields{
-          field<&ApprovalContent::invitationData_>(1, "invitationData"),
+          field<&ApprovalContent::invitationData_>(1, "invitationData", secret),
       };
     };
 

@@ -2,13 +2,16 @@
 #pragma once
 
 #include <array>
+#include <compare>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
+#include <iosfwd>
 #include <span>
 
 #include <orv/hasher.hpp>
+#include <orv/internal/printing.hpp>
 #include <orv/name_map.hpp>
 
 namespace orv::inline v0 {
@@ -34,6 +37,14 @@ class Enumeration {
 
   friend constexpr bool operator==(const E& left, const E& right) {
     return left.rawValue() == right.rawValue();
+  }
+  // By raw value.
+  friend constexpr std::strong_ordering operator<=>(const E& left, const E& right) {
+    return left.rawValue() <=> right.rawValue();
+  }
+  // By name, or by number where the raw value has none.
+  friend std::ostream& operator<<(std::ostream& out, const E& value) {
+    return internal::printName(out, _protobuf_nameMap(), value.rawValue());
   }
   void hash(Hasher& into) const { into.combine(static_cast<std::uint64_t>(rawValue_)); }
   std::uint64_t hashValue() const {

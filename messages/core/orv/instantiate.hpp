@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <array>
 #include <cassert>
+#include <compare>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
@@ -19,6 +20,7 @@
 #include <orv/binary_decoder.hpp>
 #include <orv/binary_encoder.hpp>
 #include <orv/hash_visitor.hpp>
+#include <orv/internal/printing.hpp>
 #include <orv/internal/replacing.hpp>
 #include <orv/message.hpp>
 #include <orv/size_counter.hpp>
@@ -85,6 +87,15 @@ class UnsetOneofs {
   bool hasReturned_ = false;
 };
 
+// A message on one line, behind its name.
+template <class M>
+std::string lineOf(const M& message, TextStyle style) {
+  std::string line = std::string(M::protoMessageName) + " { ";
+  TextRenderer renderer(line, style);
+  (void)message.traverse(renderer);
+  return line += '}';
+}
+
 // The walk over a whole message, once for each type. Answers the encoding's size, or that it does not fit.
 inline constexpr std::size_t doesNotFit = std::numeric_limits<std::size_t>::max();
 template <class M>
@@ -131,6 +142,14 @@ std::expected<void, NeverFails> Message<M>::traverse(TextRenderer& visitor) cons
 }
 
 template <class M>
+std::weak_ordering Message<M>::order(const M& other) const {
+  const std::weak_ordering order = internal::orderOfFields<Table<M>>(self(), other);
+  if (order != 0) return order;
+  return ByteView(unknownFields_.records()).characters() <=>
+         ByteView(other.unknownFields_.records()).characters();
+}
+
+template <class M>
 void Message<M>::hash(Hasher& into) const {
   HashVisitor visitor(into);
   (void)traverse(visitor);
@@ -152,10 +171,20 @@ std::string Message<M>::debugDescription() const {
 }
 
 template <class M>
-std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes) {
+void Message<M>::print(std::ostream& out) const {
+  internal::print(out, internal::lineOf(self(), {.isOneLine = true}));
+}
+
+template <class M>
+std::string Message<M>::redactedDescription() const {
+  return internal::lineOf(self(), {.isOneLine = true, .hidesSecrets = true});
+}
+
+template <class M>
+std::expected<M, DecodeError> Message<M>::parse(ByteView bytes) {
   std::expected<M, DecodeError> message;
-  internal::OutermostFrame frame(bytes.data(), {});
-  if (!internal::readAll<internal::DecodeMessage>(*message, bytes, frame)) [[unlikely]] {
+  internal::OutermostFrame frame(bytes.bytes().data(), {});
+  if (!internal::readAll<internal::DecodeMessage>(*message, bytes.bytes(), frame)) [[unlikely]] {
     message = std::unexpected(DecodeError());
     frame.describe(message.error());
   }
@@ -163,8 +192,8 @@ std::expected<M, DecodeError> Message<M>::parse(std::span<const std::byte> bytes
 }
 
 template <class M>
-std::expected<void, DecodeError> Message<M>::reparse(std::span<const std::byte> bytes) {
-  return internal::readInto<internal::Replace>(self(), bytes);
+std::expected<void, DecodeError> Message<M>::reparse(ByteView bytes) {
+  return internal::readInto<internal::Replace>(self(), bytes.bytes());
 }
 
 template <class M>
@@ -175,9 +204,9 @@ template <class Reader>
 }
 
 template <class M>
-std::expected<void, DecodeError> Message<M>::merge(std::span<const std::byte> bytes) {
+std::expected<void, DecodeError> Message<M>::merge(ByteView bytes) {
   internal::UnsetOneofs<Table<M>, M> unset(self());
-  return unset.afterReturn(internal::readInto<internal::DecodeMessage>(self(), bytes));
+  return unset.afterReturn(internal::readInto<internal::DecodeMessage>(self(), bytes.bytes()));
 }
 
 template <class M>

@@ -1,10 +1,12 @@
 // The rules of all messages: what every message type can do.
 #pragma once
 
+#include <compare>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
 #include <functional>
+#include <iosfwd>
 #include <memory>
 #include <span>
 #include <string>
@@ -12,6 +14,7 @@
 #include <type_traits>
 #include <utility>
 
+#include <orv/byte_buffer.hpp>
 #include <orv/decode_error.hpp>
 #include <orv/decoder.hpp>
 #include <orv/encode_error.hpp>
@@ -93,6 +96,10 @@ class Message {
     return false;
   }
 
+  // An order for sets and maps, which agrees with ==: field by field as they are compared there, what is
+  // absent first, and the unknown fields as bytes. It says nothing about the messages' meaning.
+  friend std::weak_ordering operator<=>(const M& left, const M& right) { return left.Message::order(right); }
+
   // Equal messages hash alike.
   void hash(Hasher& into) const;
   std::uint64_t hashValue() const;
@@ -100,25 +107,26 @@ class Message {
   // The message in the text format of Protocol Buffers, a field a line, unknown fields by number.
   std::string debugDescription() const;
 
-  // Reads a message from its binary encoding, the whole of `bytes`.
-  [[nodiscard]] static std::expected<M, DecodeError> parse(std::span<const std::byte> bytes);
-  [[nodiscard]] static std::expected<M, DecodeError> parse(std::string_view bytes) {
-    return parse(std::as_bytes(std::span(bytes)));
+  // The same on one line behind the full name: `orv.Member { handle: "anna@tablet" tokenID: "t1" }`.
+  friend std::ostream& operator<<(std::ostream& out, const M& message) {
+    message.Message::print(out);
+    return out;
   }
+
+  // For logs: on one line as well, with `<redacted>` for the values of the fields that are secret by M's table,
+  // and of the unknown ones, of which nobody knows.
+  std::string redactedDescription() const;
+
+  // Reads a message from its binary encoding, the whole of `bytes`.
+  [[nodiscard]] static std::expected<M, DecodeError> parse(ByteView bytes);
 
   // As parse, into this message, whose memory is used again: whatever it held is gone. After an error it
   // holds what was read before. The bytes must not be this message's own.
-  [[nodiscard]] std::expected<void, DecodeError> reparse(std::span<const std::byte> bytes);
-  [[nodiscard]] std::expected<void, DecodeError> reparse(std::string_view bytes) {
-    return reparse(std::as_bytes(std::span(bytes)));
-  }
+  [[nodiscard]] std::expected<void, DecodeError> reparse(ByteView bytes);
 
   // Reads fields into this message as decodeMessage does. After an error it holds what was read before. The
   // bytes must not be this message's own.
-  [[nodiscard]] std::expected<void, DecodeError> merge(std::span<const std::byte> bytes);
-  [[nodiscard]] std::expected<void, DecodeError> merge(std::string_view bytes) {
-    return merge(std::as_bytes(std::span(bytes)));
-  }
+  [[nodiscard]] std::expected<void, DecodeError> merge(ByteView bytes);
 
   // The binary encoding: fields in ascending order, unknown fields last. It fails only above 2^31-1 bytes.
   [[nodiscard]] std::expected<std::string, EncodeError> serialize() const;
@@ -126,6 +134,11 @@ class Message {
   // As serialize, into the start of `buffer`; what is behind the encoding may be cleared. Answers how many
   // bytes it wrote; encodedSize() of them are enough.
   [[nodiscard]] std::expected<std::size_t, EncodeError> serializeInto(std::span<std::byte> buffer) const;
+  template <internal::ByteRoom Buffer>
+  [[nodiscard]] std::expected<std::size_t, EncodeError> serializeInto(Buffer&& buffer) const {
+    const std::span<std::byte> room = std::as_writable_bytes(std::span(buffer));
+    return serializeInto(room);
+  }
 
   // How many bytes serialize gives.
   std::size_t encodedSize() const;
@@ -183,6 +196,9 @@ class Message {
   bool isEqual(const M& other) const {
     return internal::haveEqualFields<Table<M>>(self(), other) && unknownFields_ == other.unknownFields_;
   }
+
+  std::weak_ordering order(const M& other) const;
+  void print(std::ostream& out) const;
 
   UnknownStorage unknownFields_;
 };

@@ -87,7 +87,7 @@ class SessionMessage final : public Message<SessionMessage> {
   static constexpr std::tuple fields{
       field<&SessionMessage::version_>(1, "version"),
       field<&SessionMessage::type_>(2, "type"),
-      field<&SessionMessage::data_>(3, "data"),
+      field<&SessionMessage::data_>(3, "data", secret),
   };
 };
 

@@ -40,7 +40,7 @@ class Member final : public Message<Member> {
 
   static constexpr std::tuple fields{
       field<&Member::handle_>(1, "handle"),
-      field<&Member::tokenID_>(2, "tokenID"),
+      field<&Member::tokenID_>(2, "tokenID", secret),
   };
 };
 

@@ -90,8 +90,8 @@ class JoinRequest final : public Message<JoinRequest> {
   std::optional<ByteBuffer> encryptedData_;
 
   static constexpr std::tuple fields{
-      field<&JoinRequest::publicKey_>(1, "publicKey"),
-      field<&JoinRequest::encryptedData_>(2, "encryptedData"),
+      field<&JoinRequest::publicKey_>(1, "publicKey", secret),
+      field<&JoinRequest::encryptedData_>(2, "encryptedData", secret),
   };
 };
 

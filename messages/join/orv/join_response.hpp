@@ -126,7 +126,7 @@ class JoinResponse final : public Message<JoinResponse> {
   std::optional<ByteBuffer> encryptedData_;
 
   static constexpr std::tuple fields{
-      field<&JoinResponse::encryptedData_>(2, "encryptedData"),
+      field<&JoinResponse::encryptedData_>(2, "encryptedData", secret),
   };
 };
 

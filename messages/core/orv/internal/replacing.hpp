@@ -6,8 +6,8 @@
 #include <type_traits>
 #include <variant>
 
+#include <orv/field.hpp>
 #include <orv/internal/field_reader.hpp>
-#include <orv/internal/field_traits.hpp>
 #include <orv/internal/rules.hpp>
 
 namespace orv::inline v0::internal {

@@ -2,6 +2,7 @@
 // that stand in the loops of decoding and encoding are inlined: docs/decisions/position-in-registers.md.
 #pragma once
 
+#include <compare>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
@@ -12,7 +13,7 @@
 #include <vector>
 
 #include <orv/decoder.hpp>
-#include <orv/internal/field_traits.hpp>
+#include <orv/field.hpp>
 #include <orv/internal/table.hpp>
 #include <orv/visitor.hpp>
 
@@ -222,6 +223,22 @@ template <class Table, class M>
     return (areEqual.template operator()<indices>() && ...);
   }
   (std::make_index_sequence<Table::size>());
+}
+
+// The order of the first field that differs, each storage looked at once as in haveEqualFields.
+template <class Table, class M>
+std::weak_ordering orderOfFields(const M& left, const M& right) {
+  std::weak_ordering order = std::weak_ordering::equivalent;
+  const auto isDecided = [&]<std::size_t index>() {
+    if constexpr (Table::template isFirstRow<index>)
+      order = Table::template storage<index>(left) <=> Table::template storage<index>(right);
+    return order != 0;
+  };
+  [&]<std::size_t... indices>(std::index_sequence<indices...>) {
+    (void)(isDecided.template operator()<indices>() || ...);
+  }
+  (std::make_index_sequence<Table::size>());
+  return order;
 }
 
 // About how many bytes a field takes in the encoding, tag and length included. Lists are judged by the size

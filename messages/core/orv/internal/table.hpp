@@ -12,7 +12,6 @@
 
 #include <orv/descriptor.hpp>
 #include <orv/field.hpp>
-#include <orv/internal/field_traits.hpp>
 #include <orv/name_map.hpp>
 
 namespace orv::inline v0::internal {
@@ -155,7 +154,8 @@ class Table : public UncheckedTable<M, Rows> {
                           .type = valueTypeOf<Value>(),
                           .oneof = oneofIndex<index>(),
                           .message = nullptr,
-                          .cases = {}};
+                          .cases = {},
+                          .isSecret = std::get<index>(Base::rows).isSecret};
     if constexpr (IsMessage<Value>) field.message = &Value::descriptor();
     if constexpr (IsEnumeration<Value>) field.cases = Value::_protobuf_nameMap();
     return field;
