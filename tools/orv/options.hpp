@@ -4,6 +4,8 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
+#include <map>
 #include <optional>
 #include <span>
 #include <string>
@@ -31,6 +33,7 @@ struct Options {
   const MessageType* type = &typeOf<SessionMessage>();
   PayloadPairing payloads;
   Selection selection;
+  std::map<std::string, const MessageType*, std::less<>> innerTypes;  // of bytes fields, by their paths
   std::optional<Format> from;  // none: to be seen from the input, as one of these
   std::span<const Format> possibleFormats;
   std::optional<Format> to;  // none: the command writes no messages

@@ -98,6 +98,17 @@ std::optional<std::string> withoutEffect(const Options& options) {
   if (options.selection.hasNumbers() && !options.isDelimited) return "-n is for streams, with --delimited";
   if (const auto* const condition = options.selection.unmeetable(*options.type))
     return "--only: \"" + *condition + "\" is no field of " + std::string(options.type->fullName());
+  for (const auto& [path, type] : options.innerTypes) {
+    const MessageType* outer = options.type;
+    std::string_view rest = path;
+    for (const auto& [outerPath, outerType] : options.innerTypes) {
+      if (!path.starts_with(outerPath + '.')) continue;
+      outer = outerType;
+      rest = std::string_view(path).substr(outerPath.size() + 1);
+    }
+    if (!leadsToField(rest, *outer->descriptor))
+      return "--as: \"" + std::string(rest) + "\" is no field of " + std::string(outer->fullName());
+  }
   if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
   if (!payloads.isClosed() && !payloads.hasOverrides()) return std::nullopt;
   if (payloads.isClosed() && payloads.hasOverrides())

@@ -76,6 +76,15 @@ Taken takeOutput(Options& options, const Command&, std::string_view path) {
   return {};
 }
 
+Taken takeInnerType(Options& options, const Command&, std::string_view pairing) {
+  const auto equals = pairing.find('=');
+  if (equals == std::string_view::npos) return refuse(pairing, "is not FIELD=TYPE");
+  const auto type = findMessageType(pairing.substr(equals + 1));
+  if (!type) return std::unexpected(type.error());
+  options.innerTypes[std::string(pairing.substr(0, equals))] = *type;
+  return {};
+}
+
 Taken takeNumbers(Options& options, const Command&, std::string_view range) {
   return options.selection.addNumbers(range);
 }
@@ -105,6 +114,9 @@ constexpr OptionDescription type{'t', "--type", "TYPE",
 constexpr OptionDescription payload{
     noLetter, "--payload", "[KIND=]TYPE",
     "the type of an envelope's payload, for one kind or for all that have none", takePayload};
+constexpr OptionDescription as{
+    noLetter, "--as", "FIELD=TYPE",
+    "explain a field's bytes as a message, for instance data.encryptedData that is decrypted", takeInnerType};
 constexpr OptionDescription noUnwrap{noLetter, "--no-unwrap", flag, "leave the payloads of envelopes bytes",
                                      leaveClosed};
 constexpr OptionDescription from{
@@ -150,8 +162,8 @@ constexpr auto decodeOptions = list(type, payload, noUnwrap, from, to, delimited
                                     unknown, maximumSize, output, help);
 constexpr auto encodeOptions =
     list(type, payload, from, to, delimited, messages, only, keepGoing, maximumSize, output, help);
-constexpr auto inspectOptions = list(type, payload, noUnwrap, from, to, delimited, messages, only, keepGoing,
-                                     defaults, colour, maximumSize, output, help);
+constexpr auto inspectOptions = list(type, payload, as, noUnwrap, from, to, delimited, messages, only,
+                                     keepGoing, defaults, colour, maximumSize, output, help);
 constexpr auto diffOptions = list(type, payload, noUnwrap, from, delimited, messages, only, bytes, quiet,
                                   colour, maximumSize, output, help);
 constexpr auto identifyOptions = list(from, delimited, messages, keepGoing, maximumSize, output, help);

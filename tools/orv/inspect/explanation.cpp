@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <utility>
 
 #include <orv/byte_view.hpp>
 #include <orv/spelling/value_text.hpp>
@@ -50,6 +51,7 @@ class Explainer final : public TraceSink {
       : message_(message),
         renderer_(renderer),
         output_(output),
+        innerTypes_(options.innerTypes),
         absent_(options.showsDefaults ? AbsentFields::tell : AbsentFields::leaveOut),
         shownUpTo_(message.bytes.data()) {
     if (!message.type.isEnvelope()) return;
@@ -69,10 +71,8 @@ class Explainer final : public TraceSink {
   }
 
   bool record(const TracedRecord& record) override {
-    const bool isPayload = level_ == 0 && record.level == 0 && payload_ != nullptr &&
-                           record.type == ValueType::bytes && record.value.data() == payloadStart_ &&
-                           !record.isAbsent();
-    const MessageDescriptor* const opened = isPayload ? payload_->descriptor
+    const MessageType* const inner = innerTypeOf(record);
+    const MessageDescriptor* const opened = inner != nullptr ? inner->descriptor
                                             : record.type == ValueType::message && !record.isAbsent()
                                                 ? record.field->message
                                                 : nullptr;
@@ -85,17 +85,33 @@ class Explainer final : public TraceSink {
     shownUpTo_ = record.value.data() + explained.shownValue().size();
     // A long message is written piece by piece.
     constexpr std::size_t enough = std::size_t{64} << 10;
-    return writeOutput(enough).has_value() && (!isPayload || showPayload(record));
+    return writeOutput(enough).has_value() && (inner == nullptr || showInner(record, *inner));
   }
 
  private:
-  bool showPayload(const TracedRecord& data) {
-    payloadPath_ = data.path;
-    level_ = 1;
-    const auto traced = trace(*payload_, data.value, *this, absent_);
-    payloadPath_ = {};
+  // The type of the message that bytes are: an envelope's payload, or what they were said to be.
+  const MessageType* innerTypeOf(const TracedRecord& record) const {
+    if (record.type != ValueType::bytes || record.isAbsent()) return nullptr;
+    if (level_ == 0 && record.level == 0 && record.value.data() == payloadStart_) return payload_;
+    if (innerTypes_.empty()) return nullptr;
+    std::string path = fullPath(record);
+    for (std::size_t at; (at = path.find('[')) != std::string::npos;) path.erase(at, path.find(']') + 1 - at);
+    const auto found = innerTypes_.find(path);
+    return found == innerTypes_.end() ? nullptr : found->second;
+  }
+
+  std::string fullPath(const TracedRecord& record) const {
+    return (payloadPath_.empty() ? "" : std::string(payloadPath_) + ".") + std::string(record.path);
+  }
+
+  bool showInner(const TracedRecord& data, const MessageType& type) {
+    const std::string path = fullPath(data);
+    const std::string_view outerPath = std::exchange(payloadPath_, path);
+    const std::size_t outerLevel = std::exchange(level_, level_ + data.level + 1);
+    const auto traced = trace(type, data.value, *this, absent_);
+    payloadPath_ = outerPath;
     if (traced) {
-      level_ = 0;
+      level_ = outerLevel;
       return *traced;
     }
     error_ = traced.error();
@@ -131,6 +147,7 @@ class Explainer final : public TraceSink {
   const ExplainedMessage& message_;
   Renderer& renderer_;
   OutputFile& output_;
+  const std::map<std::string, const MessageType*, std::less<>>& innerTypes_;
   AbsentFields absent_;
   const std::byte* shownUpTo_;
   const MessageType* payload_ = nullptr;  // of the envelope that is shown

@@ -28,7 +28,8 @@ struct IsValue {
   bool operator()(const compare::UnknownRecord&) const { return false; }
 };
 
-// Whether the path leads to a field. What stands in an envelope's data can be of any type.
+}  // namespace
+
 bool leadsToField(std::string_view path, const MessageDescriptor& type) {
   const std::string_view name = path.substr(0, path.find_first_of(".["));
   const auto field = std::ranges::find(type.fields, name, &FieldDescriptor::name);
@@ -42,8 +43,6 @@ bool leadsToField(std::string_view path, const MessageDescriptor& type) {
            return leadsToField(rest, *payload.descriptor);
          });
 }
-
-}  // namespace
 
 std::expected<void, std::string> Selection::addNumbers(std::string_view range) {
   const char* const end = range.data() + range.size();

@@ -14,6 +14,9 @@
 
 namespace orv::tool {
 
+// Whether the path leads to a field. What stands in an envelope's data can be of any type.
+bool leadsToField(std::string_view path, const MessageDescriptor& type);
+
 // Messages by their numbers and by what they hold; all of them, unless it is said otherwise.
 class Selection {
  public:
