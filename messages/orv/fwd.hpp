@@ -5,6 +5,7 @@ namespace orv::inline v0 {
 
 class Text;
 class ByteBuffer;
+class ByteView;
 class UnknownStorage;
 class Hasher;
 class NameMap;
@@ -12,6 +13,7 @@ class NameMap;
 class BinaryDecoder;
 class BinaryEncoder;
 class DelimitedReader;
+class DelimitedParser;
 
 class VessaSessionMessageType;
 class SessionMessage;

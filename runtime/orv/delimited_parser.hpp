@@ -1,0 +1,91 @@
+// Takes a stream of messages apart whose bytes are pushed into it, and writes the parts of one.
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <expected>
+#include <memory>
+#include <optional>
+#include <span>
+#include <utility>
+
+#include <orv/byte_buffer.hpp>
+#include <orv/delimited_stream.hpp>
+
+namespace orv::inline v0 {
+
+// What a DelimitedReader is for streams that must not be waited for: bytes are pushed as they come, in pieces
+// of any size, and messages popped while there are any. That a read would block, or was interrupted, is
+// nothing to it; that the stream has ended is said by finish.
+//
+//   parser.push(received);
+//   for (auto message = parser.read<M>(); ; message = parser.read<M>()) …
+//
+// Memory grows with the bytes that were pushed and not popped. After a malformed message the next one can be
+// read; after any other error every further call answers that error.
+class DelimitedParser {
+ public:
+  // A message that is announced with more bytes than `maximumSizeInBytes` is an error, tooLarge.
+  explicit DelimitedParser(std::size_t maximumSizeInBytes = DelimitedReader::defaultMaximumSize)
+      : maximumSize_(maximumSizeInBytes) {}
+
+  // Takes a copy of the bytes that come next in the stream. They must not be the parser's own.
+  void push(ByteView bytes);
+
+  // The next message's bytes, which are valid until the next push; none where it has not arrived as a whole.
+  [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
+
+  // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
+  template <class M>
+  [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
+    const auto bytes = next();
+    if (!bytes) return std::unexpected(bytes.error());
+    if (!bytes->has_value()) return std::nullopt;
+    auto message = M::parse(**bytes);
+    if (!message) return std::unexpected(malformedMessage(message.error()));
+    return std::move(*message);
+  }
+
+  // To be asked where the stream has ended and every message is popped: whether it ended between two messages.
+  // If not, the error is truncated.
+  [[nodiscard]] std::expected<void, StreamError> finish();
+
+  // Where in the stream the message that was popped last begins, behind its length.
+  std::uint64_t messageOffset() const { return messageOffset_; }
+
+ private:
+  std::span<const std::byte> waiting() const { return {buffer_.get() + begin_, end_ - begin_}; }
+  void makeRoom(std::size_t size);
+  std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0);
+  StreamError malformedMessage(const DecodeError& error) const;
+
+  std::size_t maximumSize_;
+  // What was pushed and not popped stands from begin_ to end_.
+  std::unique_ptr<std::byte[]> buffer_;
+  std::size_t capacity_ = 0;
+  std::size_t begin_ = 0;
+  std::size_t end_ = 0;
+  std::uint64_t offset_ = 0;  // of begin_ in the stream
+  std::uint64_t messageOffset_ = 0;
+  std::optional<StreamError> error_;
+};
+
+// What stands before a message in a stream: the number of its bytes, as a varint. For writev, and whoever else
+// writes a message from where it is.
+class DelimitedHeader {
+ public:
+  // For a message of so many bytes, below 2^31.
+  explicit DelimitedHeader(std::size_t messageSizeInBytes);
+
+  const std::byte* data() const { return bytes_.data(); }
+  std::size_t size() const { return size_; }
+  const std::byte* begin() const { return data(); }
+  const std::byte* end() const { return data() + size(); }
+
+ private:
+  std::array<std::byte, 5> bytes_{};
+  std::uint8_t size_ = 0;
+};
+
+}  // namespace orv
