@@ -32,14 +32,14 @@ class ConnectionRequest final : public Message<ConnectionRequest> {
 
   // The name to show to people, if any.
   const Text& displayName() const { return internal::valueOrDefault(displayName_); }
-  Text& mutableDisplayName() { return internal::presentValue(displayName_); }
+  Text& mutableDisplayName() { return internal::presentValue(displayName_); }  // present from then on
   void setDisplayName(Text value) { displayName_ = std::move(value); }
   bool hasDisplayName() const { return displayName_.has_value(); }
   void clearDisplayName() { displayName_.reset(); }
 
   // Bytes of the application's own, if any.
   const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
-  ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }
+  ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }  // present from then on
   void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
   bool hasUserInfo() const { return userInfo_.has_value(); }
   void clearUserInfo() { userInfo_.reset(); }

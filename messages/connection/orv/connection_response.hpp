@@ -1,6 +1,7 @@
 // A host's answer to a request to connect.
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string_view>
 #include <tuple>
@@ -69,12 +70,17 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
     Text& mutableHandle() { return handle_; }
     void setHandle(Text value) { handle_ = std::move(value); }
 
+    // Which case is held, for a switch.
+    enum class OperationCase : std::uint8_t { none, denied, approved };
+    OperationCase operationCase() const { return internal::caseHeld<OperationCase>(operation_); }
+
     // The decision as a whole: none, or one case with its payload.
     const std::optional<OneOf_Operation>& operation() const { return operation_; }
     std::optional<OneOf_Operation>& mutableOperation() { return operation_; }
     void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
 
-    // A case reads as a default payload unless it is the one held; writing it replaces what was held.
+    // A case reads as a default payload unless it is the one held. Setting it, or calling its `mutable…`, makes it
+    // the one, and what was held is gone.
     const DeniedContent& denied() const { return internal::caseOrDefault<DeniedContent>(operation_); }
     DeniedContent& mutableDenied() { return internal::presentCase<DeniedContent>(operation_); }
     void setDenied(DeniedContent value) { operation_ = std::move(value); }

@@ -8,11 +8,13 @@
 #include <functional>
 #include <iosfwd>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
 #include <type_traits>
 #include <utility>
+#include <variant>
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_error.hpp>
@@ -44,6 +46,11 @@ class Step;
 // a defaulted one takes longer (docs/decisions/inline-bytes.md). Its assignments are best those of assign, since
 // defaulted ones leave M half changed where memory runs out. In M's default every byte that has a meaning is 0:
 // it holds nothing but its fields.
+//
+// A getter changes nothing: what is absent reads as its default. `mutable…` is for changing a field in place, and
+// makes it present by being called, even if nothing is changed. A reference that either gives is valid until the
+// message is assigned to or destroyed, or the field that it refers to is set or cleared: not beyond the full
+// expression in `M::parse(bytes)->field()`, whose message is a temporary.
 //
 // What is only declared here is compiled once for each type, by the line `template class orv::Message<M>;` in
 // a source that includes <orv/instantiate.hpp>.
@@ -202,6 +209,14 @@ class Message {
 
   UnknownStorage unknownFields_;
 };
+
+// The payload if a oneof holds this case, none otherwise. It lives as long as the oneof is unchanged.
+//
+//   if (const auto* added = orv::held<Group::MemberAdded>(group.event())) …
+template <class Case, class... Cases>
+const Case* held(const std::optional<std::variant<Cases...>>& oneof) {
+  return oneof.has_value() ? std::get_if<Case>(&*oneof) : nullptr;
+}
 
 }  // namespace orv
 

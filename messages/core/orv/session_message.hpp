@@ -60,20 +60,20 @@ class SessionMessage final : public Message<SessionMessage> {
   SessionMessage& operator=(SessionMessage&& other) noexcept { return assign(std::move(other)); }
 
   std::uint32_t version() const { return version_.value_or(0); }
-  std::uint32_t& mutableVersion() { return internal::presentValue(version_); }
+  std::uint32_t& mutableVersion() { return internal::presentValue(version_); }  // present from then on
   void setVersion(std::uint32_t value) { version_ = value; }
   bool hasVersion() const { return version_.has_value(); }
   void clearVersion() { version_.reset(); }
 
   VessaSessionMessageType type() const { return type_.value_or(VessaSessionMessageType()); }
-  VessaSessionMessageType& mutableType() { return internal::presentValue(type_); }
+  VessaSessionMessageType& mutableType() { return internal::presentValue(type_); }  // present from then on
   void setType(VessaSessionMessageType value) { type_ = value; }
   bool hasType() const { return type_.has_value(); }
   void clearType() { type_.reset(); }
 
   // The payload's own encoding, in a form that the peers agree on.
   const ByteBuffer& data() const { return internal::valueOrDefault(data_); }
-  ByteBuffer& mutableData() { return internal::presentValue(data_); }
+  ByteBuffer& mutableData() { return internal::presentValue(data_); }  // present from then on
   void setData(ByteBuffer value) { data_ = std::move(value); }
   bool hasData() const { return data_.has_value(); }
   void clearData() { data_.reset(); }

@@ -1,6 +1,7 @@
 // The events of a session's group.
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string_view>
 #include <tuple>
@@ -55,7 +56,7 @@ class Group final : public Message<Group> {
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
     const Member& member() const { return internal::valueOrDefault(member_); }
-    Member& mutableMember() { return internal::presentValue(member_); }
+    Member& mutableMember() { return internal::presentValue(member_); }  // present from then on
     void setMember(Member value) { member_ = std::move(value); }
     bool hasMember() const { return member_.has_value(); }
     void clearMember() { member_.reset(); }
@@ -136,12 +137,17 @@ class Group final : public Message<Group> {
   Group& operator=(const Group& other) { return assign(other); }
   Group& operator=(Group&& other) noexcept { return assign(std::move(other)); }
 
+  // Which case is held, for a switch.
+  enum class EventCase : std::uint8_t { none, initialize, memberAdded, memberRemoved, memberLeft };
+  EventCase eventCase() const { return internal::caseHeld<EventCase>(event_); }
+
   // The event as a whole: none, or one case with its payload.
   const std::optional<OneOf_Event>& event() const { return event_; }
   std::optional<OneOf_Event>& mutableEvent() { return event_; }
   void setEvent(std::optional<OneOf_Event> value) { event_ = std::move(value); }
 
-  // A case reads as a default payload unless it is the one held; writing it replaces what was held.
+  // A case reads as a default payload unless it is the one held. Setting it, or calling its `mutable…`, makes it
+  // the one, and what was held is gone.
   const Initialization& initialize() const { return internal::caseOrDefault<Initialization>(event_); }
   Initialization& mutableInitialize() { return internal::presentCase<Initialization>(event_); }
   void setInitialize(Initialization value) { event_ = std::move(value); }

@@ -26,9 +26,9 @@ class Member final : public Message<Member> {
   Text& mutableHandle() { return handle_; }
   void setHandle(Text value) { handle_ = std::move(value); }
 
-  // The token that the member joined with, if any. Changing it in place makes it present.
+  // The token that the member joined with, if any.
   const Text& tokenID() const { return internal::valueOrDefault(tokenID_); }
-  Text& mutableTokenID() { return internal::presentValue(tokenID_); }
+  Text& mutableTokenID() { return internal::presentValue(tokenID_); }  // present from then on
   void setTokenID(Text value) { tokenID_ = std::move(value); }
   bool hasTokenID() const { return tokenID_.has_value(); }
   void clearTokenID() { tokenID_.reset(); }

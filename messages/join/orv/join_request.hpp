@@ -30,21 +30,21 @@ class JoinRequest final : public Message<JoinRequest> {
 
     // The name to show to people, if any.
     const Text& displayName() const { return internal::valueOrDefault(displayName_); }
-    Text& mutableDisplayName() { return internal::presentValue(displayName_); }
+    Text& mutableDisplayName() { return internal::presentValue(displayName_); }  // present from then on
     void setDisplayName(Text value) { displayName_ = std::move(value); }
     bool hasDisplayName() const { return displayName_.has_value(); }
     void clearDisplayName() { displayName_.reset(); }
 
     // Bytes of the application's own, if any.
     const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
-    ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }
+    ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }  // present from then on
     void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
     bool hasUserInfo() const { return userInfo_.has_value(); }
     void clearUserInfo() { userInfo_.reset(); }
 
     // Whether the device asks for a token URI; absent, false and true are three different things.
     bool wantsTokenUri() const { return wantsTokenUri_.value_or(false); }
-    bool& mutableWantsTokenUri() { return internal::presentValue(wantsTokenUri_); }
+    bool& mutableWantsTokenUri() { return internal::presentValue(wantsTokenUri_); }  // present from then on
     void setWantsTokenUri(bool value) { wantsTokenUri_ = value; }
     bool hasWantsTokenUri() const { return wantsTokenUri_.has_value(); }
     void clearWantsTokenUri() { wantsTokenUri_.reset(); }
@@ -73,13 +73,15 @@ class JoinRequest final : public Message<JoinRequest> {
   JoinRequest& operator=(JoinRequest&& other) noexcept { return assign(std::move(other)); }
 
   const ByteBuffer& publicKey() const { return internal::valueOrDefault(publicKey_); }
-  ByteBuffer& mutablePublicKey() { return internal::presentValue(publicKey_); }
+  ByteBuffer& mutablePublicKey() { return internal::presentValue(publicKey_); }  // present from then on
   void setPublicKey(ByteBuffer value) { publicKey_ = std::move(value); }
   bool hasPublicKey() const { return publicKey_.has_value(); }
   void clearPublicKey() { publicKey_.reset(); }
 
   const ByteBuffer& encryptedData() const { return internal::valueOrDefault(encryptedData_); }
-  ByteBuffer& mutableEncryptedData() { return internal::presentValue(encryptedData_); }
+  ByteBuffer& mutableEncryptedData() {
+    return internal::presentValue(encryptedData_);
+  }  // present from then on
   void setEncryptedData(ByteBuffer value) { encryptedData_ = std::move(value); }
   bool hasEncryptedData() const { return encryptedData_.has_value(); }
   void clearEncryptedData() { encryptedData_.reset(); }

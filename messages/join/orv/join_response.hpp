@@ -1,6 +1,7 @@
 // A host's answer to a request to join.
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string_view>
 #include <tuple>
@@ -49,7 +50,7 @@ class JoinResponse final : public Message<JoinResponse> {
 
       // Bytes of the application's own, if any.
       const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
-      ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }
+      ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }  // present from then on
       void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
       bool hasUserInfo() const { return userInfo_.has_value(); }
       void clearUserInfo() { userInfo_.reset(); }
@@ -81,12 +82,17 @@ class JoinResponse final : public Message<JoinResponse> {
     Text& mutableIdentifier() { return identifier_; }
     void setIdentifier(Text value) { identifier_ = std::move(value); }
 
+    // Which case is held, for a switch.
+    enum class OperationCase : std::uint8_t { none, denied, approved };
+    OperationCase operationCase() const { return internal::caseHeld<OperationCase>(operation_); }
+
     // The decision as a whole: none, or one case with its payload.
     const std::optional<OneOf_Operation>& operation() const { return operation_; }
     std::optional<OneOf_Operation>& mutableOperation() { return operation_; }
     void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
 
-    // A case reads as a default payload unless it is the one held; writing it replaces what was held.
+    // A case reads as a default payload unless it is the one held. Setting it, or calling its `mutable…`, makes it
+    // the one, and what was held is gone.
     const DeniedContent& denied() const { return internal::caseOrDefault<DeniedContent>(operation_); }
     DeniedContent& mutableDenied() { return internal::presentCase<DeniedContent>(operation_); }
     void setDenied(DeniedContent value) { operation_ = std::move(value); }
@@ -116,7 +122,9 @@ class JoinResponse final : public Message<JoinResponse> {
   JoinResponse& operator=(JoinResponse&& other) noexcept { return assign(std::move(other)); }
 
   const ByteBuffer& encryptedData() const { return internal::valueOrDefault(encryptedData_); }
-  ByteBuffer& mutableEncryptedData() { return internal::presentValue(encryptedData_); }
+  ByteBuffer& mutableEncryptedData() {
+    return internal::presentValue(encryptedData_);
+  }  // present from then on
   void setEncryptedData(ByteBuffer value) { encryptedData_ = std::move(value); }
   bool hasEncryptedData() const { return encryptedData_.has_value(); }
   void clearEncryptedData() { encryptedData_.reset(); }

@@ -40,6 +40,12 @@ const Case& caseOrDefault(const std::optional<std::variant<Cases...>>& group) {
   return held != nullptr ? *held : defaultInstance<Case>();
 }
 
+// Which case the group holds, as an enumeration of none and of the cases in their order.
+template <class Enumeration, class... Cases>
+Enumeration caseHeld(const std::optional<std::variant<Cases...>>& group) {
+  return static_cast<Enumeration>(group.has_value() ? group->index() + 1 : 0);
+}
+
 // The payload for change in place; a group that holds another case, or none, is switched to a default payload
 // of this.
 template <class Case, class... Cases>

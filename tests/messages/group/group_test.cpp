@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <orv/join_response.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 
@@ -64,6 +65,25 @@ TEST(Group, ReadsACaseThatItDoesNotHoldAsDefault) {
   group.setEvent(std::nullopt);
   EXPECT_FALSE(group.memberLeft().usesToken());
   EXPECT_FALSE(group.event());
+}
+
+TEST(Group, NamesTheCaseThatItHolds) {
+  using Case = Group::EventCase;
+  const std::pair<std::string_view, Case> cases[] = {
+      {"", Case::none},
+      {"0A 00", Case::initialize},
+      {"12 00", Case::memberAdded},
+      {"1A 00", Case::memberRemoved},
+      {"22 00", Case::memberLeft},
+  };
+  for (const auto& [input, expected] : cases) {
+    const Group group = Group::parse(hex(input)).value();
+    EXPECT_EQ(group.eventCase(), expected) << input;
+    EXPECT_EQ(held<Group::MemberLeft>(group.event()) != nullptr, expected == Case::memberLeft) << input;
+  }
+  using Content = JoinResponse::Content;
+  EXPECT_EQ(Content::parse(hex("1A 00")).value().operationCase(), Content::OperationCase::denied);
+  EXPECT_EQ(Content::parse(hex("22 00")).value().operationCase(), Content::OperationCase::approved);
 }
 
 TEST(Group, SwitchesItsEventByWriting) {
