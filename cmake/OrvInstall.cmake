@@ -1,5 +1,5 @@
 # Installing the library: headers as <orv/…>, and find_package(orv) giving orv::messages. Its components come
-# with find_package(orv COMPONENTS compare envelope json), those that were built.
+# with find_package(orv COMPONENTS compare envelope json testing), those that were built.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
@@ -22,7 +22,7 @@ endfunction()
 
 orv_install(orv_messages orv_messagesTargets
   runtime runtime/spelling messages/core messages/connection messages/join messages/group messages)
-foreach(component IN ITEMS compare envelope json)
+foreach(component IN ITEMS compare envelope json testing)
   if(TARGET orv_${component})
     orv_install(orv_${component} orv_${component}Targets ${component})
   endif()
