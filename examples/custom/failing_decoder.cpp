@@ -5,10 +5,9 @@
 #include <expected>
 #include <optional>
 #include <string>
-#include <utility>
-#include <vector>
+#include <string_view>
 
-#include <orv/decoder.hpp>
+#include <orv/any_value_decoder.hpp>
 #include <orv/group.hpp>
 #include "word_decoder.hpp"
 
@@ -20,78 +19,35 @@ struct Broken {
   std::string reason;
 };
 
-template <orv::Decoder Inner>
-class FailingDecoder {
+template <class Inner>
+class FailingDecoder : public orv::AnyValueDecoder<FailingDecoder<Inner>, Broken> {
  public:
-  using Error = Broken;
-  using Result = std::expected<void, Broken>;
-
   FailingDecoder(Inner& inner, int failingCall) : inner_(inner), failingCall_(failingCall) {}
 
   template <class M>
   std::expected<std::optional<std::uint32_t>, Broken> nextFieldNumber(M& message) {
-    if (auto counted = count(); !counted) return std::unexpected(counted.error());
-    auto number = inner_.nextFieldNumber(message);
-    if (!number) return std::unexpected(Broken{calls_, number.error()});
-    return *number;
+    return call([&] { return inner_.nextFieldNumber(message); });
   }
-
-  template <class Slot>
-  Result decodeSingularStringField(Slot& slot) {
-    return call([&] { return inner_.decodeSingularStringField(slot); });
+  template <class T>
+  std::expected<bool, Broken> readAnyValue(T& value) {
+    return call([&] { return inner_.readAnyValue(value); });
   }
-  template <class Slot>
-  Result decodeSingularBytesField(Slot& slot) {
-    return call([&] { return inner_.decodeSingularBytesField(slot); });
-  }
-  template <class Slot>
-  Result decodeSingularBoolField(Slot& slot) {
-    return call([&] { return inner_.decodeSingularBoolField(slot); });
-  }
-  Result decodeSingularUInt32Field(std::optional<std::uint32_t>& slot) {
-    return call([&] { return inner_.decodeSingularUInt32Field(slot); });
-  }
-  template <class Enumeration>
-  Result decodeSingularEnumField(std::optional<Enumeration>& slot) {
-    return call([&] { return inner_.decodeSingularEnumField(slot); });
-  }
-  Result decodeRepeatedStringField(std::vector<orv::Text>& texts) {
-    return call([&] { return inner_.decodeRepeatedStringField(texts); });
-  }
-
   // Nested messages are read through this decoder, not through the inner one: their calls count too.
   template <class M>
-  Result decodeSingularMessageField(std::optional<M>& slot) {
-    if (auto counted = count(); !counted) return counted;
-    M message = slot.value_or(M{});
-    auto read = message.decodeMessage(*this);
-    if (read) slot = std::move(message);
-    return read;
-  }
-  template <class M>
-  Result decodeRepeatedMessageField(std::vector<M>& messages) {
-    if (auto counted = count(); !counted) return counted;
-    M message;
-    auto read = message.decodeMessage(*this);
-    if (read) messages.push_back(std::move(message));
-    return read;
-  }
-
-  Result handleConflictingOneOf() {
-    return call([&] { return inner_.handleConflictingOneOf(); });
+  std::expected<bool, Broken> readAnyMessage(M& message) {
+    if (++calls_ == failingCall_) return std::unexpected(Broken{calls_, "as ordered"});
+    if (auto read = message.decodeMessage(*this); !read) return std::unexpected(read.error());
+    return true;
   }
 
  private:
-  Result count() {
-    if (++calls_ == failingCall_) return std::unexpected(Broken{calls_, "as ordered"});
-    return {};
-  }
-
+  // What the inner decoder answers, with the error type of this one.
   template <class Operation>
-  Result call(Operation operation) {
-    if (auto counted = count(); !counted) return counted;
-    if (auto done = operation(); !done) return std::unexpected(Broken{calls_, done.error()});
-    return {};
+  auto call(Operation operation) -> std::expected<typename decltype(operation())::value_type, Broken> {
+    if (++calls_ == failingCall_) return std::unexpected(Broken{calls_, "as ordered"});
+    auto answer = operation();
+    if (!answer) return std::unexpected(Broken{calls_, answer.error()});
+    return *answer;
   }
 
   Inner& inner_;

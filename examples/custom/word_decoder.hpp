@@ -2,15 +2,15 @@
 #pragma once
 
 #include <algorithm>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <utility>
-#include <vector>
 
+#include <orv/any_value_decoder.hpp>
 #include <orv/byte_buffer.hpp>
 #include <orv/text.hpp>
 
@@ -21,11 +21,8 @@ namespace words {
 //   memberAdded{ groupUUID=0123 member{ handle=anna@tablet } }
 //
 // Fields go by their text names. A value holds no spaces. The error is a sentence.
-class WordDecoder {
+class WordDecoder : public orv::AnyValueDecoder<WordDecoder, std::string> {
  public:
-  using Error = std::string;
-  using Result = std::expected<void, Error>;
-
   explicit WordDecoder(std::string_view words) : words_(words) {}
 
   // A name that the message does not know is an error here, so nothing is ever left to the unknown fields.
@@ -41,54 +38,27 @@ class WordDecoder {
     return static_cast<std::uint32_t>(*number);
   }
 
-  // Each of these serves both forms: a plain value and a std::optional are assigned alike.
-  template <class Slot>
-  Result decodeSingularStringField(Slot& slot) {
-    slot = orv::Text(value_);
-    return {};
+  // The base asks for a value of each kind of field, and stores it.
+  template <class T>
+  std::expected<bool, Error> readAnyValue(T& value) {
+    if constexpr (std::same_as<T, orv::Text> || std::same_as<T, orv::ByteBuffer>) {
+      value = value_;
+      return true;
+    } else if constexpr (std::same_as<T, bool>) {
+      value = value_ == "true";
+      if (value || value_ == "false") return true;
+      return std::unexpected(std::string(value_) + " is no bool");
+    }
+    return std::unexpected("numbers cannot be written in words");
   }
-  template <class Slot>
-  Result decodeSingularBytesField(Slot& slot) {
-    slot = orv::ByteBuffer(value_);
-    return {};
-  }
-  template <class Slot>
-  Result decodeSingularBoolField(Slot& slot) {
-    if (value_ != "true" && value_ != "false") return std::unexpected(std::string(value_) + " is no bool");
-    slot = value_ == "true";
-    return {};
-  }
-  Result decodeSingularUInt32Field(std::optional<std::uint32_t>&) { return noNumbers(); }
-  template <class Enumeration>
-  Result decodeSingularEnumField(std::optional<Enumeration>&) {
-    return noNumbers();
-  }
-  Result decodeRepeatedStringField(std::vector<orv::Text>& texts) {
-    texts.emplace_back(value_);
-    return {};
-  }
-
   // A nested message is read by its own rules, from the words that follow.
   template <class M>
-  Result decodeSingularMessageField(std::optional<M>& slot) {
-    M message = slot.value_or(M{});
-    auto read = message.decodeMessage(*this);
-    if (read) slot = std::move(message);
-    return read;
+  std::expected<bool, Error> readAnyMessage(M& message) {
+    if (auto read = message.decodeMessage(*this); !read) return std::unexpected(read.error());
+    return true;
   }
-  template <class M>
-  Result decodeRepeatedMessageField(std::vector<M>& messages) {
-    M message;
-    auto read = message.decodeMessage(*this);
-    if (read) messages.push_back(std::move(message));
-    return read;
-  }
-
-  Result handleConflictingOneOf() { return {}; }
 
  private:
-  static Result noNumbers() { return std::unexpected("numbers cannot be written in words"); }
-
   std::string_view takeWord() {
     words_.remove_prefix(std::min(words_.find_first_not_of(' '), words_.size()));
     const std::string_view word = words_.substr(0, words_.find(' '));
