@@ -112,7 +112,8 @@ namespace {
 class DocumentBuilder final : public nlohmann::json_sax<Node> {
  public:
   // The document becomes `root`, which is null before.
-  DocumentBuilder(std::string_view text, Node& root) : text_(text), root_(root) {}
+  DocumentBuilder(std::string_view text, Node& root, const DecodeLimits& limits)
+      : text_(text), root_(root), limits_(limits) {}
 
   // What ended the parsing early.
   const std::optional<Error>& error() const { return error_; }
@@ -161,6 +162,10 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
 
   // Lists and objects grow at the end of what is open, so a pointer to an open one stays good.
   Node* add(Node value) {
+    if (valueCount_++ == limits_.listElements) {
+      fail("more values than the limit of " + std::to_string(limits_.listElements) + " allows");
+      return nullptr;
+    }
     if (open_.empty()) {
       root_ = std::move(value);
       return &root_;
@@ -176,10 +181,11 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
   }
 
   bool open(Node empty) {
-    if (open_.size() == Document::maximumNesting)
-      return fail("nested deeper than " + std::to_string(Document::maximumNesting));
-    open_.push_back({add(std::move(empty)), {}, {}});
-    return true;
+    const auto mostNesting = std::min<std::size_t>(limits_.nesting, Document::maximumNesting);
+    if (open_.size() == mostNesting) return fail("nested deeper than " + std::to_string(mostNesting));
+    Node* const added = add(std::move(empty));
+    if (added != nullptr) open_.push_back({added, {}, {}});
+    return added != nullptr;
   }
 
   bool close() {
@@ -203,6 +209,8 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
 
   std::string_view text_;
   Node& root_;
+  const DecodeLimits& limits_;
+  std::size_t valueCount_ = 0;
   std::vector<Open> open_;
   std::optional<Error> error_;
 };
@@ -233,9 +241,14 @@ Document::~Document() = default;
 
 Value Document::root() const { return Value(&contents_->root); }
 
-std::expected<Document, Error> Document::parse(std::string_view text) {
+std::expected<Document, Error> Document::parse(std::string_view text, const DecodeLimits& limits) {
+  if (text.size() > limits.inputBytes) {
+    return std::unexpected(Error{
+        .reason = "more bytes of input than the limit of " + std::to_string(limits.inputBytes) + " allows",
+        .path = "$"});
+  }
   auto contents = std::make_unique<Contents>();
-  DocumentBuilder builder(text, contents->root);
+  DocumentBuilder builder(text, contents->root, limits);
   Node::sax_parse(text.begin(), text.end(), &builder);
   // The library takes a NUL for the end.
   if (const auto nul = text.find('\0'); nul != std::string_view::npos && !builder.error().has_value())

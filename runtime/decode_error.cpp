@@ -7,7 +7,7 @@ namespace orv::inline v0 {
 namespace {
 
 // In the order of DecodeCause.
-constexpr std::array<std::string_view, 13> sentences{
+constexpr std::array<std::string_view, 16> sentences{
     "the input ends inside a record",
     "length runs past the end",
     "length of 2^31 or more, or spelled in more than five bytes",
@@ -21,8 +21,11 @@ constexpr std::array<std::string_view, 13> sentences{
     "ill-formed UTF-8",
     "messages and groups nested deeper than 100",
     "a second member of a oneof was refused",
+    "more bytes of input than the limit allows",
+    "more elements of lists than the limit allows",
+    "more bytes of unknown fields than the limit allows",
 };
-static_assert(sentences.size() == static_cast<std::size_t>(DecodeCause::conflictingOneOf) + 1);
+static_assert(sentences.size() == static_cast<std::size_t>(DecodeCause::tooMuchUnknown) + 1);
 
 }  // namespace
 
@@ -49,6 +52,8 @@ std::string DecodeError::reason() const {
              (detail == 1 ? " byte" : " bytes") + " past the end";
     case DecodeCause::illFormedText:
       return "ill-formed UTF-8 at byte " + std::to_string(detail) + " of a text of " + std::to_string(length);
+    case DecodeCause::nestingTooDeep:
+      return "messages and groups nested deeper than " + std::to_string(length);
     default: return std::string(describe(cause));
   }
 }

@@ -71,11 +71,12 @@ std::string StreamError::message() const {
 
 class DelimitedReader::Source {
  public:
-  Source(ReadFunction read, std::size_t maximumSize)
-      : stream_(std::move(read)), buffered_(&stream_), maximumSize_(maximumSize) {}
+  Source(ReadFunction read, const DecodeLimits& limits)
+      : stream_(std::move(read)), buffered_(&stream_), limits_(limits) {}
 
   std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
   std::uint64_t messageOffset() const { return messageOffset_; }
+  const DecodeLimits& limits() const { return limits_; }
 
  private:
   std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0) {
@@ -86,7 +87,7 @@ class DelimitedReader::Source {
 
   ReadFunctionStream stream_;
   io::CopyingInputStreamAdaptor buffered_;
-  std::size_t maximumSize_;
+  DecodeLimits limits_;
   std::uint64_t messageOffset_ = 0;
   std::uint64_t nextOffset_ = 0;
   std::vector<std::byte> message_;
@@ -116,7 +117,7 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
     length |= std::uint64_t{byte & 0x7FU} << (7 * lengthSize);
   }
   if (length > std::numeric_limits<std::int32_t>::max()) return fail(StreamError::Cause::malformedLength);
-  if (length > maximumSize_) return fail(StreamError::Cause::tooLarge, length);
+  if (length > limits_.inputBytes) return fail(StreamError::Cause::tooLarge, length);
 
   message_.clear();
   // The constructor reads ahead, which would wait for ever where nothing follows an empty message.
@@ -136,8 +137,8 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   return std::span<const std::byte>(message_);
 }
 
-DelimitedReader::DelimitedReader(ReadFunction read, std::size_t maximumSizeInBytes)
-    : source_(std::make_unique<Source>(std::move(read), maximumSizeInBytes)) {}
+DelimitedReader::DelimitedReader(ReadFunction read, const DecodeLimits& limits)
+    : source_(std::make_unique<Source>(std::move(read), limits)) {}
 DelimitedReader::DelimitedReader(DelimitedReader&&) noexcept = default;
 DelimitedReader& DelimitedReader::operator=(DelimitedReader&&) noexcept = default;
 DelimitedReader::~DelimitedReader() = default;
@@ -146,6 +147,8 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
   assert(source_ != nullptr && "a reader that was moved from reads nothing");
   return source_->next();
 }
+
+const DecodeLimits& DelimitedReader::limits() const { return source_->limits(); }
 
 std::uint64_t DelimitedReader::messageOffset() const {
   assert(source_ != nullptr && "a reader that was moved from has no place");

@@ -15,6 +15,34 @@ OutermostFrame& FieldReader::outermost(Frame& frame) noexcept {
   return static_cast<OutermostFrame&>(*at);  // NOLINT(cppcoreguidelines-pro-type-static-cast-downcast)
 }
 
+OutermostFrame::OutermostFrame(std::span<const std::byte> input, ConflictHook hook,
+                               const DecodeLimits& limits)
+    : OutermostFrame(input.data(), hook) {
+  allowance = {limits.listElements, limits.unknownFieldBytes};
+  nesting = static_cast<std::uint8_t>(maximumNesting - std::min<int>(limits.nesting, maximumNesting));
+  if (input.size() <= limits.inputBytes) return;
+  isInputTooLarge = true;
+  end = End::fault;
+  cause = DecodeCause::inputTooLarge;
+  length = detail = 0;
+  depth = 0;
+  numbers[0] = 0;
+  at = inputBegin + limits.inputBytes;
+}
+
+std::size_t FieldReader::allowElements(std::size_t held, WireReader input, Tag tag,
+                                       OutermostFrame& outermost) noexcept {
+  constexpr std::size_t firstFew = 8;
+  using enum WireReader::Others;
+  const std::size_t later =
+      held == 0 ? input.countFollowing(tag, firstFew - 1, endTheCount)
+                : input.countFollowing(tag, std::numeric_limits<std::size_t>::max(), arePassedOver);
+  const std::size_t wanted = std::max(1 + later, held <= firstFew ? 0 : held);
+  const std::size_t allowed = std::min(wanted, outermost.allowance.listElements);
+  outermost.allowance.listElements -= allowed;
+  return allowed;
+}
+
 Step FieldReader::askHook(Frame& frame) {
   if (frame.mode == Frame::Mode::confirmed) return {};
   OutermostFrame& outermost = FieldReader::outermost(frame);
@@ -33,9 +61,12 @@ void FieldReader::note(DecodeCause cause, const std::byte* at, std::uint32_t len
   outermost.at = at;
   outermost.length = length;
   outermost.detail = detail;
-  outermost.depth = frame.nesting;
+  outermost.depth = static_cast<std::uint8_t>(frame.nesting - outermost.nesting);
+  if (cause == DecodeCause::nestingTooDeep)
+    outermost.length = static_cast<std::uint32_t>(maximumNesting - outermost.nesting);
   for (const Frame* inner = &frame; inner != nullptr; number = inner->number, inner = inner->outer) {
-    if (inner->nesting < outermost.numbers.size()) outermost.numbers[inner->nesting] = number;
+    const std::size_t depth = inner->nesting - outermost.nesting;
+    if (depth < outermost.numbers.size()) outermost.numbers[depth] = number;
   }
 }
 
@@ -60,10 +91,16 @@ const std::byte* FieldReader::keepUnknown(Place place, Tag tag, Frame& frame,
   const std::byte* const first = place.record;
   const std::byte* record = place.record;
   WireReader reader(std::span(place.value, place.end));
+  std::size_t& allowed = outermost(frame).allowance.unknownFieldBytes;
   for (;;) {
-    if (const auto skipped = reader.skipValue(tag, record, frame.nesting); !skipped) {
+    const auto skipped = reader.skipValue(tag, record, frame.nesting);
+    const bool isAllowed = static_cast<std::size_t>(reader.position() - first) <= allowed;
+    if (!skipped || !isAllowed) {
       unknownFields.appendRecords(std::span(first, record));
-      note(skipped.error(), frame, tag.fieldNumber());
+      if (skipped)
+        note(DecodeCause::tooMuchUnknown, record, 0, 0, frame, tag.fieldNumber());
+      else
+        note(skipped.error(), frame, tag.fieldNumber());
       return nullptr;
     }
     record = reader.position();
@@ -74,6 +111,7 @@ const std::byte* FieldReader::keepUnknown(Place place, Tag tag, Frame& frame,
     tag = *next;
     reader = ahead;
   }
+  allowed -= static_cast<std::size_t>(record - first);
   unknownFields.appendRecords(std::span(first, record));
   return record;
 }

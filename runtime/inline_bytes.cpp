@@ -86,6 +86,14 @@ bool InlineBytes::assignShortText(std::string_view text) {
   return true;
 }
 
+void InlineBytes::replace(std::string_view bytes) {
+  if (isOnHeap() && heapBlock().capacity < bytes.size()) {
+    freeBlock();
+    raw_[tagOffset] = 0;
+  }
+  assign(bytes);
+}
+
 void InlineBytes::append(std::string_view bytes) {
   const std::string_view old = view();
   const std::size_t size = old.size() + bytes.size();

@@ -39,8 +39,8 @@ void UnknownStorage::appendRecords(std::span<const std::byte> records) {
     block_->size = size;
     return;
   }
-  // A first record is stored exactly; a store that grows grows by half.
-  const std::size_t capacity = std::max(size, oldSize + oldSize / 2);
+  // A first record is stored exactly; a store that grows is doubled.
+  const std::size_t capacity = std::max(size, 2 * oldSize);
   auto* const larger = static_cast<Block*>(::operator new(sizeof(Block) + capacity));
   *larger = {size, capacity};
   auto* const target = reinterpret_cast<std::byte*>(larger + 1);

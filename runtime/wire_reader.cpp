@@ -114,7 +114,8 @@ WireResult<void> WireReader::skipGroup(Tag start, const std::byte* tagStart, int
   int depth = 0;
   for (Tag tag = start;;) {
     if (tag.wireType() == WireType::startGroup) {
-      if (nesting + depth >= internal::maximumNesting) return fault(DecodeCause::nestingTooDeep, tagStart);
+      if (nesting + depth >= internal::maximumNesting)
+        return std::unexpected(WireFault{DecodeCause::nestingTooDeep, tagStart, internal::maximumNesting});
       open[static_cast<std::size_t>(depth++)] = tag.fieldNumber();
     } else if (tag.wireType() == WireType::endGroup) {
       if (open[static_cast<std::size_t>(--depth)] != tag.fieldNumber()) {
@@ -132,17 +133,24 @@ WireResult<void> WireReader::skipGroup(Tag start, const std::byte* tagStart, int
   }
 }
 
-std::size_t WireReader::countFollowing(Tag tag, std::size_t most) const {
+std::size_t WireReader::countFollowing(Tag tag, std::size_t most, Others others) const {
   // What lies this far ahead is fetched while the records before it are counted: each record's length has to
   // be there before the next record is found (docs/decisions/long-lists.md).
   constexpr std::size_t ahead = 2048;
   WireReader probe(*this);
   std::size_t count = 0;
   if (!probe.readLengthDelimited()) return count;
-  for (; count < most; ++count) {
-    __builtin_prefetch(probe.cursor_ + std::min(ahead, probe.remaining()));
+  while (count < most) {
+    const std::byte* const start = probe.cursor_;
+    __builtin_prefetch(start + std::min(ahead, probe.remaining()));
     const auto next = probe.readTag();
-    if (!next || next->value != tag.value || !probe.readLengthDelimited()) break;
+    if (!next) break;
+    if (next->value == tag.value) {
+      if (!probe.readLengthDelimited()) break;
+      ++count;
+    } else if (others == Others::endTheCount || !probe.skipValue(*next, start, 0)) {
+      break;
+    }
   }
   return count;
 }

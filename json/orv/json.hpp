@@ -36,8 +36,9 @@ template <class M>
 
 // As read, from the text of a document.
 template <class M>
-[[nodiscard]] std::expected<M, Error> parse(std::string_view text) {
-  const auto document = Document::parse(text);
+[[nodiscard]] std::expected<M, Error> parse(std::string_view text,
+                                            const DecodeLimits& limits = DecodeLimits::none()) {
+  const auto document = Document::parse(text, limits);
   if (!document) return std::unexpected(document.error());
   return read<M>(document->root());
 }

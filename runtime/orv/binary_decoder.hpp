@@ -7,6 +7,7 @@
 #include <orv/byte_buffer.hpp>
 #include <orv/conflict_hook.hpp>
 #include <orv/decode_error.hpp>
+#include <orv/decode_limits.hpp>
 #include <orv/internal/field_reader.hpp>
 
 namespace orv::inline v0 {
@@ -17,7 +18,7 @@ namespace orv::inline v0 {
 //   const auto result = message.decodeMessage(decoder);
 //
 // (parse and merge are the same in one call.) Decoding n bytes takes time and memory in proportion to n,
-// whatever they are. decodeMessage fails with a DecodeError: what is wrong, at which byte, in which field.
+// whatever they are; how much of each, limits say. decodeMessage fails with a DecodeError: what is wrong, at which byte, in which field.
 //
 // It has the operations that Decoder lists, for decoders that hand on to it. They answer only whether they
 // succeeded; error() says what was wrong.
@@ -26,12 +27,17 @@ class BinaryDecoder : private internal::OutermostFrame, public internal::FieldRe
   explicit BinaryDecoder(ByteView input, ConflictHook hook = {})
       : OutermostFrame(input.bytes().data(), hook),
         FieldReader(input.bytes(), input.bytes().data() + input.size(), *this) {}
+  BinaryDecoder(ByteView input, const DecodeLimits& limits, ConflictHook hook = {})
+      : OutermostFrame(input.bytes(), hook, limits),
+        FieldReader(input.bytes(), input.bytes().data() + input.size(), *this) {}
   BinaryDecoder(const BinaryDecoder&) = delete;
   BinaryDecoder& operator=(const BinaryDecoder&) = delete;
 
   template <class M>
   internal::NextNumber nextFieldNumber(M& message) {
     outermostMessage = &M::descriptor();
+    if (refusesInput()) [[unlikely]]
+      return std::unexpected(internal::Failed());
     return FieldReader::nextFieldNumber(message);
   }
 
@@ -47,6 +53,8 @@ class BinaryDecoder : private internal::OutermostFrame, public internal::FieldRe
   template <class M, class Read>
   std::expected<void, DecodeError> readWith(M& message, Read read) {
     outermostMessage = &M::descriptor();
+    if (refusesInput()) [[unlikely]]
+      return std::unexpected(error());
     FieldReader reader = static_cast<const FieldReader&>(*this);
     const bool isRead = static_cast<bool>(read(message, reader));
     static_cast<FieldReader&>(*this) = reader;

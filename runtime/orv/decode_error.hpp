@@ -28,8 +28,11 @@ enum class DecodeCause : std::uint8_t {
   mismatchedEndGroup,  // an end-group tag with another number than its start
   unterminatedGroup,   // a group without its end
   illFormedText,       // a text field that is not well-formed UTF-8
-  nestingTooDeep,      // messages and groups nested deeper than 100
+  nestingTooDeep,      // messages and groups nested deeper than 100, or than the program's limit
   conflictingOneOf,    // for conflict hooks that refuse; the decoder itself never does
+  inputTooLarge,       // more bytes of input than the program's limit
+  tooManyElements,     // more elements of lists
+  tooMuchUnknown,      // more bytes of unknown fields
 };
 
 // A sentence without its full stop, for instance "varint of more than ten bytes". It lasts as long as the
@@ -72,7 +75,8 @@ class FieldPath {
 struct DecodeError {
   DecodeCause cause = DecodeCause::truncated;
   // For lengthOverrun: the length, and by how many bytes it overruns. For illFormedText: the text's length,
-  // and the offset of the first ill-formed byte in it. All are below 2^31.
+  // and the offset of the first ill-formed byte in it. For nestingTooDeep: how deep they may be. All are
+  // below 2^31.
   std::uint32_t length = 0;
   std::uint32_t detail = 0;
   // Where in the input the offending tag, varint, length or text begins; for what is missing, where it was

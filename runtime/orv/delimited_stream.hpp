@@ -14,6 +14,7 @@
 #include <utility>
 
 #include <orv/decode_error.hpp>
+#include <orv/decode_limits.hpp>
 #include <orv/encode_error.hpp>
 #include <orv/internal/bad_access.hpp>
 
@@ -57,13 +58,17 @@ std::ostream& operator<<(std::ostream& out, StreamError::Cause cause);
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
 // are announced. After a malformed message the next one can be read; after any other error every further call
-// answers that error, and after an exception of the allocator's or the read function's, readFailed. A reader that was moved from may only be assigned to or destroyed.
+// answers that error, and after an exception of the allocator's or the read function's, readFailed. A
+// reader that was moved from may only be assigned to or destroyed.
 class DelimitedReader {
  public:
-  static constexpr std::size_t defaultMaximumSize = std::size_t{64} << 20;
+  static constexpr std::size_t defaultMaximumSize = DecodeLimits().inputBytes;
 
-  // A message that is announced with more bytes than `maximumSizeInBytes` is an error, tooLarge.
-  explicit DelimitedReader(ReadFunction read, std::size_t maximumSizeInBytes = defaultMaximumSize);
+  // The limits are those of each message. One that is announced with more bytes than they allow is an error,
+  // tooLarge.
+  explicit DelimitedReader(ReadFunction read, const DecodeLimits& limits = {});
+  DelimitedReader(ReadFunction read, std::size_t maximumSizeInBytes)
+      : DelimitedReader(std::move(read), DecodeLimits{.inputBytes = maximumSizeInBytes}) {}
   DelimitedReader(DelimitedReader&&) noexcept;
   DelimitedReader& operator=(DelimitedReader&&) noexcept;
   ~DelimitedReader();
@@ -78,7 +83,7 @@ class DelimitedReader {
     const auto bytes = next();
     if (!bytes) return std::unexpected(bytes.error());
     if (!bytes->has_value()) return std::nullopt;
-    auto message = M::parse(**bytes);
+    auto message = M::parse(**bytes, limits());
     if (!message) return std::unexpected(malformedMessage(message.error()));
     return std::move(*message);
   }
@@ -89,6 +94,7 @@ class DelimitedReader {
  private:
   class Source;
 
+  const DecodeLimits& limits() const;
   StreamError malformedMessage(const DecodeError& error) const;
 
   std::unique_ptr<Source> source_;

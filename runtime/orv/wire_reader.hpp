@@ -88,8 +88,9 @@ class WireReader {
   [[nodiscard]] WireResult<void> skipValue(Tag tag, const std::byte* tagStart, int nesting);
 
   // What is next is a length-delimited value: counts the whole length-delimited records with this tag that
-  // follow it without a gap, up to `most`. Consumes nothing.
-  std::size_t countFollowing(Tag tag, std::size_t most) const;
+  // follow it, up to `most`, and up to the first other record or past all others. Consumes nothing.
+  enum class Others : std::uint8_t { endTheCount, arePassedOver };
+  std::size_t countFollowing(Tag tag, std::size_t most, Others others) const;
 
  private:
   WireResult<Tag> readLongTag();

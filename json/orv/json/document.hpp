@@ -8,6 +8,7 @@
 #include <optional>
 #include <string_view>
 
+#include <orv/decode_limits.hpp>
 #include <orv/json/error.hpp>
 
 namespace orv::inline v0::json {
@@ -54,8 +55,10 @@ class Document {
   // Values nested more deeply are refused.
   static constexpr std::size_t maximumNesting = 100;
 
-  // Takes a text that is one JSON value, whose objects have no two members of one name.
-  [[nodiscard]] static std::expected<Document, Error> parse(std::string_view text);
+  // Takes a text that is one JSON value, whose objects have no two members of one name. Of the limits, each value
+  // counts as an element: it takes memory before anybody knows whether it belongs to a list of the message.
+  [[nodiscard]] static std::expected<Document, Error> parse(
+      std::string_view text, const DecodeLimits& limits = DecodeLimits::none());
 
   Document(Document&&) noexcept;
   Document& operator=(Document&&) noexcept;

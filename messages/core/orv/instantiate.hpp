@@ -33,16 +33,17 @@ namespace internal {
 // The loop over all of an input, once for each message type and way of reading.
 template <class Read, class M>
 [[gnu::noinline]] bool readAll(M& message, std::span<const std::byte> bytes, OutermostFrame& frame) {
-  frame.outermostMessage = &M::descriptor();
   FieldReader reader(bytes, bytes.data() + bytes.size(), frame);
   return static_cast<bool>(Read()(message, reader));
 }
 
 template <class Read, class M>
-std::expected<void, DecodeError> readInto(M& message, std::span<const std::byte> bytes) {
+[[gnu::always_inline]] inline std::expected<void, DecodeError> readInto(M& message,
+                                                                        std::span<const std::byte> bytes,
+                                                                        OutermostFrame&& frame) {
   std::expected<void, DecodeError> result;
-  OutermostFrame frame(bytes.data(), {});
-  if (!readAll<Read>(message, bytes, frame)) [[unlikely]] {
+  frame.outermostMessage = &M::descriptor();
+  if (frame.refusesInput() || !readAll<Read>(message, bytes, frame)) [[unlikely]] {
     result = std::unexpected(DecodeError());
     frame.describe(result.error());
   }
@@ -182,9 +183,21 @@ std::string Message<M>::redactedDescription() const {
 
 template <class M>
 std::expected<M, DecodeError> Message<M>::parse(ByteView bytes) {
+  return parseIn(bytes.bytes(), internal::OutermostFrame(bytes.bytes().data(), {}));
+}
+
+template <class M>
+std::expected<M, DecodeError> Message<M>::parse(ByteView bytes, const DecodeLimits& limits) {
+  return parseIn(bytes.bytes(), internal::OutermostFrame(bytes.bytes(), {}, limits));
+}
+
+template <class M>
+[[gnu::always_inline]] inline std::expected<M, DecodeError> Message<M>::parseIn(
+    std::span<const std::byte> bytes, internal::OutermostFrame&& frame) {
   std::expected<M, DecodeError> message;
-  internal::OutermostFrame frame(bytes.bytes().data(), {});
-  if (!internal::readAll<internal::DecodeMessage>(*message, bytes.bytes(), frame)) [[unlikely]] {
+  frame.outermostMessage = &M::descriptor();
+  if (frame.refusesInput() || !internal::readAll<internal::DecodeMessage>(*message, bytes, frame))
+      [[unlikely]] {
     message = std::unexpected(DecodeError());
     frame.describe(message.error());
   }
@@ -193,7 +206,14 @@ std::expected<M, DecodeError> Message<M>::parse(ByteView bytes) {
 
 template <class M>
 std::expected<void, DecodeError> Message<M>::reparse(ByteView bytes) {
-  return internal::readInto<internal::Replace>(self(), bytes.bytes());
+  return internal::readInto<internal::Replace>(self(), bytes.bytes(),
+                                               internal::OutermostFrame(bytes.bytes().data(), {}));
+}
+
+template <class M>
+std::expected<void, DecodeError> Message<M>::reparse(ByteView bytes, const DecodeLimits& limits) {
+  return internal::readInto<internal::Replace>(self(), bytes.bytes(),
+                                               internal::OutermostFrame(bytes.bytes(), {}, limits));
 }
 
 template <class M>
@@ -206,7 +226,15 @@ template <class Reader>
 template <class M>
 std::expected<void, DecodeError> Message<M>::merge(ByteView bytes) {
   internal::UnsetOneofs<Table<M>, M> unset(self());
-  return unset.afterReturn(internal::readInto<internal::DecodeMessage>(self(), bytes.bytes()));
+  return unset.afterReturn(internal::readInto<internal::DecodeMessage>(
+      self(), bytes.bytes(), internal::OutermostFrame(bytes.bytes().data(), {})));
+}
+
+template <class M>
+std::expected<void, DecodeError> Message<M>::merge(ByteView bytes, const DecodeLimits& limits) {
+  internal::UnsetOneofs<Table<M>, M> unset(self());
+  return unset.afterReturn(internal::readInto<internal::DecodeMessage>(
+      self(), bytes.bytes(), internal::OutermostFrame(bytes.bytes(), {}, limits)));
 }
 
 template <class M>

@@ -18,6 +18,7 @@
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_error.hpp>
+#include <orv/decode_limits.hpp>
 #include <orv/decoder.hpp>
 #include <orv/encode_error.hpp>
 #include <orv/field.hpp>
@@ -38,6 +39,7 @@ class TextRenderer;
 
 namespace internal {
 class Step;
+struct OutermostFrame;
 }
 
 // The base of every message type M: a regular value that owns all that it holds. M adds its full name, its
@@ -135,6 +137,11 @@ class Message {
   // bytes must not be this message's own.
   [[nodiscard]] std::expected<void, DecodeError> merge(ByteView bytes);
 
+  // The same with limits to what they cost; without, the format's own alone hold.
+  [[nodiscard]] static std::expected<M, DecodeError> parse(ByteView bytes, const DecodeLimits& limits);
+  [[nodiscard]] std::expected<void, DecodeError> reparse(ByteView bytes, const DecodeLimits& limits);
+  [[nodiscard]] std::expected<void, DecodeError> merge(ByteView bytes, const DecodeLimits& limits);
+
   // The binary encoding: fields in ascending order, unknown fields last. It fails only above 2^31-1 bytes.
   [[nodiscard]] std::expected<std::string, EncodeError> serialize() const;
 
@@ -187,6 +194,9 @@ class Message {
   }
 
  private:
+  static std::expected<M, DecodeError> parseIn(std::span<const std::byte> bytes,
+                                               internal::OutermostFrame&& frame);
+
   M& self() { return static_cast<M&>(*this); }
   const M& self() const { return static_cast<const M&>(*this); }
 

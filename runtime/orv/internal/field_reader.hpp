@@ -17,6 +17,7 @@
 #include <orv/byte_buffer.hpp>
 #include <orv/conflict_hook.hpp>
 #include <orv/decode_error.hpp>
+#include <orv/decode_limits.hpp>
 #include <orv/descriptor.hpp>
 #include <orv/internal/inline_bytes.hpp>
 #include <orv/internal/presence.hpp>
@@ -40,6 +41,8 @@ struct Frame {
 
   Frame* outer = nullptr;    // of the enclosing message
   std::uint32_t number = 0;  // of the field of that message
+  // How many messages it is in; where a limit allows fewer than maximumNesting, the outermost one begins with the
+  // difference.
   std::uint8_t nesting = 0;
   Mode mode = Mode::careful;
 };
@@ -47,12 +50,24 @@ struct Frame {
 // The frame of the outermost message, and what all of its reading shares.
 struct OutermostFrame : Frame {
   OutermostFrame(const std::byte* begin, ConflictHook hook) : inputBegin(begin), conflictHook(hook) {}
+  OutermostFrame(std::span<const std::byte> input, ConflictHook hook, const DecodeLimits& limits);
+
+  // Whether the input is larger than a limit allows: a fault, and nothing may be read.
+  bool refusesInput() const { return isInputTooLarge; }
 
   // Puts together what was wrong. Only after a failure.
   void describe(DecodeError& error) const;
 
+  // What may still be given room for.
+  struct Allowance {
+    std::size_t listElements = std::numeric_limits<std::size_t>::max();
+    std::size_t unknownFieldBytes = std::numeric_limits<std::size_t>::max();
+  };
+
   const std::byte* inputBegin;
   ConflictHook conflictHook;
+  Allowance allowance;
+  bool isInputTooLarge = false;
   const MessageDescriptor* outermostMessage = nullptr;
 
   // What ended the reading. The parts of a fault stand here one by one and become a DecodeError where the
@@ -154,7 +169,7 @@ class FieldReader {
 
   [[gnu::always_inline]] Step decodeRepeatedStringField(std::vector<Text>& texts) {
     if (!isAtLengthDelimited()) return {};
-    makeRoom(texts);
+    if (!makeRoom(texts)) return std::unexpected(Failed());
     Step read = readText(texts.emplace_back());
     if (!read) [[unlikely]]
       texts.pop_back();
@@ -164,7 +179,7 @@ class FieldReader {
   template <class M>
   [[gnu::always_inline]] Step decodeRepeatedMessageField(std::vector<M>& messages) {
     if (!isAtLengthDelimited()) return {};
-    makeRoom(messages);
+    if (!makeRoom(messages)) return std::unexpected(Failed());
     prefetchBehind(messages);
     Step read = readMessage(messages.emplace_back(), frame_->mode);
     if (!read) [[unlikely]]
@@ -329,7 +344,12 @@ class FieldReader {
       if (outermost(*parts.frame).conflictHook.isSet()) scratch = held;
     }
     FieldReader reader(parts);
-    return static_cast<bool>(reader.readMessage(scratch, Frame::Mode::checking));
+    // What is dropped is not charged.
+    OutermostFrame& outermost = FieldReader::outermost(*parts.frame);
+    const OutermostFrame::Allowance allowance = outermost.allowance;
+    const bool isSound = static_cast<bool>(reader.readMessage(scratch, Frame::Mode::checking));
+    outermost.allowance = allowance;
+    return isSound;
   }
 
   // An occurrence of a oneof member while its group holds a case.
@@ -373,7 +393,7 @@ class FieldReader {
     const std::string_view text = readLongText(at_, end_, *frame_, tag_);
     if (text.data() == nullptr) [[unlikely]]
       return std::unexpected(Failed());
-    presentValue(slot).bytes_.assign(text);
+    presentValue(slot).bytes_.replace(text);
     return takeUpTo(reinterpret_cast<const std::byte*>(text.data() + text.size()));
   }
 
@@ -399,7 +419,7 @@ class FieldReader {
     if (body.size() <= InlineBytes::inlineCapacity && isReadableWithin(body.data())) [[likely]] {
       bytes.assignWithin(body.data(), body.size());
     } else {
-      bytes.assign({reinterpret_cast<const char*>(body.data()), body.size()});
+      bytes.replace({reinterpret_cast<const char*>(body.data()), body.size()});
     }
     return {};
   }
@@ -421,25 +441,33 @@ class FieldReader {
     return {};
   }
 
-  // Before an element is added to a full list: room for it and for the records of the same field that follow
-  // its own directly. A list that arrives in one run is thus allocated twice at most: for its first few
-  // elements, so that an error among them is found before the whole run was counted, and then for all. One
-  // that arrives in many runs grows by half, so that the time stays in proportion.
+  // Before an element is added to a full list: room for it and for the records of the same field that come later
+  // in this message. A list is thus allocated twice at most: for its first few elements, so that an error among
+  // them is found before all were counted, and then for all. One that each of many messages adds to is doubled, so
+  // that the time stays in proportion. False if a limit allows no more.
   template <class T>
-  [[gnu::always_inline]] void makeRoom(std::vector<T>& list) const {
-    if (list.size() == list.capacity()) [[unlikely]]
-      grow(list, at_, end_, tag_);
+  [[gnu::always_inline, nodiscard]] bool makeRoom(std::vector<T>& list) const {
+    if (list.size() == list.capacity()) [[unlikely]] {
+      if (!grow(list, at_, end_, recordStart_, *frame_, tag_)) return false;
+    }
     if (list.size() == list.capacity()) __builtin_unreachable();
+    return true;
   }
   template <class T>
-  [[gnu::noinline]] static void grow(std::vector<T>& list, const std::byte* at, const std::byte* end,
-                                     Tag tag) {
-    constexpr std::size_t firstFew = 8;
-    const std::size_t most = list.empty() ? firstFew - 1 : std::numeric_limits<std::size_t>::max();
-    const std::size_t run = 1 + WireReader(std::span(at, end)).countFollowing(tag, most);
-    const std::size_t least = list.size() <= firstFew ? 0 : list.size() / 2;
-    list.reserve(list.size() + std::max(run, least));
+  [[gnu::noinline]] static bool grow(std::vector<T>& list, const std::byte* at, const std::byte* end,
+                                     const std::byte* record, Frame& frame, Tag tag) {
+    const std::size_t allowed =
+        allowElements(list.size(), WireReader(std::span(at, end)), tag, outermost(frame));
+    if (allowed == 0) {
+      note(DecodeCause::tooManyElements, record, 0, 0, frame, tag.fieldNumber());
+      return false;
+    }
+    list.reserve(list.size() + allowed);
+    return true;
   }
+  // How many elements room is made for; they are charged.
+  static std::size_t allowElements(std::size_t held, WireReader input, Tag tag,
+                                   OutermostFrame& outermost) noexcept;
 
   // The place of an element that comes later is fetched meanwhile: docs/decisions/long-lists.md.
   template <class T>

@@ -119,6 +119,10 @@ class InlineBytes {
   // Takes bytes that fit inside if they are well-formed UTF-8, and says whether they are.
   bool assignShortText(std::string_view text);
 
+  // As assign, for bytes that are not this object's own: the old contents go first where the new ones need more
+  // room, so that both are never held at once.
+  void replace(std::string_view bytes);
+
   // Takes the first `size` bytes, which fit inside, of objectSize that may be read and are not this object's
   // own: one step of a fixed size, whatever their number.
   void assignWithin(const std::byte* bytes, std::size_t size) {
