@@ -3,11 +3,14 @@
 set(CMAKE_CXX_STANDARD 23)
 set(CMAKE_CXX_STANDARD_REQUIRED ON)
 set(CMAKE_CXX_EXTENSIONS OFF)
-set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+# What a shared library shows is in exported.map.
+if(NOT BUILD_SHARED_LIBS)
+  set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+endif()
 set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
 set(CMAKE_POSITION_INDEPENDENT_CODE ON)
 
-if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
+if(PROJECT_IS_TOP_LEVEL AND NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
   set(CMAKE_BUILD_TYPE RelWithDebInfo)
 endif()
 find_package(PkgConfig REQUIRED)
@@ -39,6 +42,30 @@ function(orv_exceptions target)
   endif()
 endfunction()
 
+# What all code of the library is compiled with: a program gets what it uses alone where it links with
+# --gc-sections, and the library calls its own functions, whatever the program defines.
+function(orv_library_options target)
+  orv_warnings(${target})
+  target_compile_options(${target} PRIVATE -ffunction-sections -fdata-sections
+    $<$<BOOL:${BUILD_SHARED_LIBS}>:-fno-semantic-interposition>)
+endfunction()
+
+# A library for users, orv::<name>: static, or shared with BUILD_SHARED_LIBS. Its file has the name that follows.
+function(orv_library name file)
+  add_library(orv_${name} ${ARGN})
+  add_library(orv::${name} ALIAS orv_${name})
+  orv_library_options(orv_${name})
+  target_compile_features(orv_${name} PUBLIC cxx_std_23)
+  set_target_properties(orv_${name} PROPERTIES
+    EXPORT_NAME ${name} OUTPUT_NAME ${file} LINKER_LANGUAGE CXX VERSION ${PROJECT_VERSION} SOVERSION 0)
+  if(BUILD_SHARED_LIBS)
+    set(exported ${PROJECT_SOURCE_DIR}/cmake/exported.map)
+    target_link_options(orv_${name} PRIVATE
+      LINKER:--version-script=${exported} LINKER:-Bsymbolic-functions,-z,defs LINKER:--as-needed)
+    set_target_properties(orv_${name} PROPERTIES LINK_DEPENDS ${exported})
+  endif()
+endfunction()
+
 # A layer of the library: the folder `name` beside the calling CMakeLists.txt (or that folder itself), whose
 # headers are the `orv` folder in it. It sees its own headers and those of the layers that it uses, no others,
 # so that an include that turns an arrow does not compile.
@@ -50,7 +77,7 @@ function(orv_layer name)
   endif()
   add_library(orv_${name} OBJECT ${layer_SOURCES})
   set_target_properties(orv_${name} PROPERTIES ORV_FOLDER ${folder})
-  orv_warnings(orv_${name})
+  orv_library_options(orv_${name})
   orv_exceptions(orv_${name})
   target_compile_features(orv_${name} PUBLIC cxx_std_23)
   target_include_directories(orv_${name} PUBLIC ${folder})

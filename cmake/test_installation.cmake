@@ -10,6 +10,7 @@ function(run)
   endif()
 endfunction()
 
+run(${CMAKE_COMMAND} --install ${BUILD} --component shared --prefix ${place}/installed)
 run(${CMAKE_COMMAND} --install ${BUILD} --component library --prefix ${place}/installed)
 run(${CMAKE_COMMAND} -G ${GENERATOR} -S ${CONSUMER} -B ${place}/consumer -DCMAKE_PREFIX_PATH=${place}/installed
   -DCMAKE_CXX_COMPILER=${COMPILER} -DCMAKE_CXX_FLAGS=${FLAGS})

@@ -23,7 +23,11 @@ namespace orv::inline v0 {
 // Fills the front of a buffer from a file, a socket or the like. Answers how many bytes it put there, 0 at
 // the end of the stream, and a negative number when reading failed. It may give fewer bytes than there is
 // room for; an answer of more counts as a failure.
+#ifdef __cpp_lib_move_only_function
 using ReadFunction = std::move_only_function<std::ptrdiff_t(std::span<std::byte>)>;
+#else  // libc++ 19
+using ReadFunction = std::function<std::ptrdiff_t(std::span<std::byte>)>;
+#endif
 
 // Why no message could be read from a stream.
 struct StreamError {

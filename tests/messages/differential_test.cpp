@@ -21,7 +21,7 @@ bool clearExcessBits(std::string& bytes, const DecodeError& error) {
     if (static_cast<signed char>(bytes[error.offset + at]) >= 0) return false;
   }
   char& last = bytes[error.offset + lastByte];
-  if (last < 0x10) return false;
+  if (static_cast<signed char>(last) < 0x10) return false;
   last = static_cast<char>(last & 0xF);
   return true;
 }
