@@ -75,7 +75,7 @@ def live():
     ]:
         for name, pair in [("pipe", os.pipe), ("socket", socket_descriptors)]:
             source, feed = pair()
-            write("other", b"\0")
+            write("other", b"")
             process = subprocess.Popen([COMMAND, *arguments], stdin=source, stdout=subprocess.PIPE)
             os.close(source)
             os.write(feed, piece)

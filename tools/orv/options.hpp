@@ -42,6 +42,7 @@ struct Options {
   bool showsUnknownFields = false;
   bool showsDefaults = false;
   bool comparesEncodings = false;
+  std::vector<std::string> ignored;  // paths of fields
   bool isQuiet = false;
   // A message takes several times its size in memory, up to about sixty times where it is nothing but empty
   // members.

@@ -21,6 +21,9 @@
 
 namespace orv::inline v0::compare {
 
+// As places name them.
+inline constexpr std::string_view unknownFieldsName = "unknownFields";
+
 // A field on the way from the outermost message to a value. Unknown fields come last, as one field that is a
 // list.
 struct Step {
@@ -131,7 +134,7 @@ class LeafCollector : public AnyValueVisitor<LeafCollector> {
   void enter(std::uint32_t number, T value) {
     // What has no name are the unknown fields.
     const FieldDescriptor* const named = field(number);
-    const std::string_view name = named != nullptr ? named->name : "unknownFields";
+    const std::string_view name = named != nullptr ? named->name : unknownFieldsName;
     place_.push_back({number, std::exchange(itemIndex_, std::nullopt), name});
     leaves_.push_back({place_, std::move(value)});
   }

@@ -109,6 +109,10 @@ std::optional<std::string> withoutEffect(const Options& options) {
     if (!leadsToField(rest, *outer->descriptor))
       return "--as: \"" + std::string(rest) + "\" is no field of " + std::string(outer->fullName());
   }
+  for (const std::string& path : options.ignored) {
+    if (!leadsToField(path, *options.type->descriptor))
+      return "--ignore: \"" + path + "\" is no field of " + std::string(options.type->fullName());
+  }
   if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
   if (!payloads.isClosed() && !payloads.hasOverrides()) return std::nullopt;
   if (payloads.isClosed() && payloads.hasOverrides())

@@ -85,6 +85,11 @@ Taken takeInnerType(Options& options, const Command&, std::string_view pairing) 
   return {};
 }
 
+Taken takeIgnored(Options& options, const Command&, std::string_view path) {
+  options.ignored.emplace_back(path);
+  return {};
+}
+
 Taken takeNumbers(Options& options, const Command&, std::string_view range) {
   return options.selection.addNumbers(range);
 }
@@ -140,6 +145,9 @@ constexpr OptionDescription defaults{noLetter, "--defaults", flag,
                                      set<&Options::showsDefaults>};
 constexpr OptionDescription bytes{noLetter, "--bytes", flag, "compare the encodings too",
                                   set<&Options::comparesEncodings>};
+constexpr OptionDescription ignore{
+    noLetter, "--ignore", "PATH",
+    "leave out a field and what is in it, of every item of lists without [INDEX]", takeIgnored};
 constexpr OptionDescription quiet{'q', "--quiet", flag, "say nothing, the exit status tells",
                                   set<&Options::isQuiet>};
 constexpr OptionDescription colour{
@@ -164,8 +172,8 @@ constexpr auto encodeOptions =
     list(type, payload, from, to, delimited, messages, only, keepGoing, maximumSize, output, help);
 constexpr auto inspectOptions = list(type, payload, as, noUnwrap, from, to, delimited, messages, only,
                                      keepGoing, defaults, colour, maximumSize, output, help);
-constexpr auto diffOptions = list(type, payload, noUnwrap, from, delimited, messages, only, bytes, quiet,
-                                  colour, maximumSize, output, help);
+constexpr auto diffOptions = list(type, payload, noUnwrap, from, delimited, messages, only, ignore, bytes,
+                                  quiet, colour, maximumSize, output, help);
 constexpr auto identifyOptions = list(from, delimited, messages, keepGoing, maximumSize, output, help);
 constexpr auto printingOptions = list(help);
 
@@ -194,6 +202,7 @@ constexpr Example convertExamples[] = {
 };
 constexpr Example diffExamples[] = {
     {"orv diff before.bin after.bin", "the fields that differ"},
+    {"orv diff --ignore version before.bin after.bin", "but for one field"},
     {"orv diff -q --bytes before.bin after.bin", "whether anything does, encodings included"},
 };
 constexpr Example identifyExamples[] = {
@@ -249,7 +258,9 @@ constexpr Command commands[] = {
     {.name = "diff",
      .run = runDiff,
      .summary = "compare two messages",
-     .text = "Shows the fields that differ: ~ changed, - only in A, + only in B. Messages are equal as the "
+     .text = "Shows the fields that differ: ~ changed, - only in A, + only in B. Messages of streams and "
+             "items of "
+             "lists are aligned, so that a missing one is one line. Messages are equal as the "
              "model has it: texts when they are canonically equivalent, whatever their bytes.",
      .operands = Operands::twoFiles,
      .from = {.allowed = allFormats, .byDefault = Format::binary},

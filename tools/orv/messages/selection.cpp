@@ -33,7 +33,7 @@ struct IsValue {
 bool leadsToField(std::string_view path, const MessageDescriptor& type) {
   const std::string_view name = path.substr(0, path.find_first_of(".["));
   const auto field = std::ranges::find(type.fields, name, &FieldDescriptor::name);
-  if (field == type.fields.end()) return false;
+  if (field == type.fields.end()) return name == compare::unknownFieldsName;
   const auto dot = path.find('.');
   if (dot == std::string_view::npos) return true;
   const std::string_view rest = path.substr(dot + 1);

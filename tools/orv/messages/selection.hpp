@@ -14,7 +14,7 @@
 
 namespace orv::tool {
 
-// Whether the path leads to a field. What stands in an envelope's data can be of any type.
+// Whether the path leads to a field, or to the unknown ones. What stands in an envelope's data can be of any type.
 bool leadsToField(std::string_view path, const MessageDescriptor& type);
 
 // Messages by their numbers and by what they hold; all of them, unless it is said otherwise.
