@@ -4,5 +4,6 @@
 #include <orv/all_messages.hpp>
 #include <orv/binary_decoder.hpp>
 #include <orv/binary_encoder.hpp>
+#include <orv/decode_limits.hpp>
 #include <orv/delimited_parser.hpp>
 #include <orv/delimited_stream.hpp>

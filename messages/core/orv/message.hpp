@@ -18,7 +18,6 @@
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_error.hpp>
-#include <orv/decode_limits.hpp>
 #include <orv/decoder.hpp>
 #include <orv/encode_error.hpp>
 #include <orv/field.hpp>
@@ -33,6 +32,7 @@ namespace orv::inline v0 {
 
 class BinaryDecoder;
 class BinaryEncoder;
+struct DecodeLimits;
 class SizeCounter;
 class HashVisitor;
 class TextRenderer;
@@ -137,7 +137,7 @@ class Message {
   // bytes must not be this message's own.
   [[nodiscard]] std::expected<void, DecodeError> merge(ByteView bytes);
 
-  // The same with limits to what they cost; without, the format's own alone hold.
+  // The same with limits to what they cost (<orv/decode_limits.hpp>); without, the format's own alone hold.
   [[nodiscard]] static std::expected<M, DecodeError> parse(ByteView bytes, const DecodeLimits& limits);
   [[nodiscard]] std::expected<void, DecodeError> reparse(ByteView bytes, const DecodeLimits& limits);
   [[nodiscard]] std::expected<void, DecodeError> merge(ByteView bytes, const DecodeLimits& limits);
