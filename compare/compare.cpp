@@ -164,6 +164,7 @@ class TreeComparison {
     const auto right = itemsOf(after);
     const auto keysOf = [&](const std::vector<Leaves>& items) {
       std::vector<AlignmentKey> keys;
+      keys.reserve(items.size());
       for (const Leaves item : items) keys.push_back(keyOf(item, depth + 1));
       return keys;
     };
@@ -203,11 +204,9 @@ class TreeComparison {
   }
 
   void add(Kind kind, Leaves value) {
-    std::string text = summaryOf(value);
-    std::string none;
-    const bool isRemoved = kind == Kind::removed;
-    list_.push_back(
-        {kind, value[0].path(), isRemoved ? std::move(text) : none, isRemoved ? none : std::move(text)});
+    Difference difference{kind, value[0].path(), {}, {}};
+    (kind == Kind::removed ? difference.before : difference.after) = summaryOf(value);
+    list_.push_back(std::move(difference));
   }
 
   std::vector<Difference> list_;
@@ -266,9 +265,9 @@ AlignmentKey keyOf(std::span<const Leaf> leaves, std::size_t depth) {
   return {contents.finish(), shape.finish()};
 }
 
-std::string summaryOf(std::span<const Leaf> leaves) {
+std::string summaryOf(std::span<const Leaf> value) {
   std::string text;
-  appendSummary(leaves, text);
+  appendSummary(value, text);
   return text;
 }
 

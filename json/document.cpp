@@ -50,9 +50,9 @@ constexpr Phrase mistakes[] = {
 constexpr Phrase expectations[] = {
     {"; expected end of input", "expected the end"},
     {"parsing object key", "expected a name in quotation marks"},
-    {"parsing object separator", "expected \":\""},
-    {"parsing object", "expected \",\" or \"}\""},
-    {"parsing array", "expected \",\" or \"]\""},
+    {"parsing object separator", R"(expected ":")"},
+    {"parsing object", R"(expected "," or "}")"},
+    {"parsing array", R"(expected "," or "]")"},
     {"parsing value", "expected a value"},
 };
 
@@ -64,7 +64,9 @@ constexpr Phrase findings[] = {
 };
 
 std::optional<std::string> find(std::span<const Phrase> phrases, std::string_view sentence) {
-  const auto isIn = [&](const Phrase& phrase) { return sentence.find(phrase.library) != sentence.npos; };
+  const auto isIn = [&](const Phrase& phrase) {
+    return sentence.find(phrase.library) != std::string_view::npos;
+  };
   const auto found = std::ranges::find_if(phrases, isIn);
   return found == phrases.end() ? std::nullopt : std::optional(std::string(found->ours));
 }

@@ -16,7 +16,7 @@ namespace orv::inline v0::internal {
 
 #if defined(__SSE2__)
 
-#define ORV_HAS_BYTE_BLOCKS 1
+#define ORV_HAS_BYTE_BLOCKS
 
 using Sixteen = __m128i;
 
@@ -42,7 +42,7 @@ inline std::uint64_t gather(auto... answers) {
 
 #elif defined(__aarch64__) && defined(__ARM_NEON) && __BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__
 
-#define ORV_HAS_BYTE_BLOCKS 1
+#define ORV_HAS_BYTE_BLOCKS
 
 using Sixteen = int8x16_t;
 

@@ -23,7 +23,7 @@ struct Difference {
 };
 
 // Between two messages that were taken apart, in the order of the fields.
-std::vector<Difference> differencesOfLeaves(std::span<const Leaf> left, std::span<const Leaf> right);
+std::vector<Difference> differencesOfLeaves(std::span<const Leaf> before, std::span<const Leaf> after);
 
 // By the messages' own equality: no differences when the messages are equal, and at least one when they are
 // not.

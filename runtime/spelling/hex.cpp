@@ -98,7 +98,7 @@ HexReader::Taken HexReader::takeUpTo(std::size_t end, std::string& bytes) {
   while (at_ < end) {
     const char c = text_[at_];
     Taken taken;
-    if (isDone_ || (isSkipped_ && c != '\n')) {
+    if (isDone_ || (isSkipped_ && c != '\n')) {  // NOLINT(bugprone-branch-clone): asked in this order
       ++at_;
     } else if (std::exchange(isAtLineStart_, false)) {
       lineStart_ = count();

@@ -41,17 +41,17 @@ _orv() {
 complete -o default -F _orv orv
 )bash";
 
-constexpr const char* types = "_orv_types";
+constexpr const char* typeWords = "_orv_types";
 
 // What bash runs for the words that an option's value can be; files are its own affair.
 std::string valuesOf(const OptionDescription& option, const Command& command) {
-  if (option.valueName == "TYPE") return types;
+  if (option.valueName == "TYPE") return typeWords;
   if (option.valueName.find("KIND") != std::string_view::npos) {
     const bool isPairing = option.valueName.ends_with("TYPE");
     std::string kinds = "echo";
     for (const auto& kind : VessaSessionMessageType::_protobuf_nameMap().entries())
       kinds += ' ' + std::string(kind.name) + (isPairing ? "=" : "");
-    return isPairing ? kinds + "; " + types : kinds;
+    return isPairing ? kinds + "; " + typeWords : kinds;
   }
   std::string words(option.words);
   if (option.formats != nullptr) {
@@ -81,7 +81,7 @@ std::string bashCompletion() {
   for (const Command& command : commandTable.commands) {
     const std::string name(command.name);
     names += name + ' ';
-    if (command.operands == Operands::types) values += "    " + name + ") " + types + " ;;\n";
+    if (command.operands == Operands::types) values += "    " + name + ") " + typeWords + " ;;\n";
     if (command.operands == Operands::command) values += "    " + name + ") echo \"$_orv_commands\" ;;\n";
     std::string words;
     for (const auto* const option : command.options) {

@@ -119,13 +119,13 @@ bool MessageInput::isSelected() const {
 }
 
 Outcome<bool> MessageInput::nextFrame() {
-  do {
+  for (bool isTaken = false; !isTaken; isTaken = options_.selection.takesNumber(frame_.number)) {
     if (options_.selection.isLast(frame_.number)) return false;
     const auto frame = reader_->next();
     if (!frame) return std::unexpected(frame.error());
     if (!frame->has_value()) return false;
     frame_ = **frame;
-  } while (!options_.selection.takesNumber(frame_.number));
+  }
   encoding_ = frame_.content;
   if (isBytes(format_)) return true;
   auto encoded = format_ == Format::json ? encodeJson() : encodeText();

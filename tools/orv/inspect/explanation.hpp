@@ -71,7 +71,7 @@ class Renderer {
   std::string& output() { return output_; }
 
  protected:
-  std::string output_;
+  std::string output_;  // NOLINT(*-non-private-member-variables-in-classes): what all renderers write to
 };
 
 // Shows a message up to its end or to its error, which is the answer then.

@@ -11,7 +11,7 @@ namespace orv::tool {
 namespace {
 
 // What comes from outside goes into the page through this alone.
-std::string escaped(std::string_view text) {
+std::string inHtml(std::string_view text) {
   std::string output;
   for (const char c : text) {
     switch (c) {
@@ -26,7 +26,7 @@ std::string escaped(std::string_view text) {
   return output;
 }
 
-std::string named(std::string_view path) { return escaped(spelling::printable(path)); }
+std::string named(std::string_view path) { return inHtml(spelling::printable(path)); }
 
 // Sets the rows of a hexadecimal dump, with the characters beside them. Each piece of a row says which field it
 // belongs to.
@@ -66,7 +66,7 @@ class DumpRows {
     std::string characters(charactersOf(bytes));
     std::ranges::replace_if(
         characters, [](char c) { return c < 0x20 || c > 0x7E; }, '.');
-    characters_ += "<b" + attributes + escaped(characters) + "</b>";
+    characters_ += "<b" + attributes + inHtml(characters) + "</b>";
     column_ += bytes.size();
     if (column_ == 2 * halfRow) endRow();
   }
@@ -134,7 +134,7 @@ class HtmlRenderer final : public Renderer {
     startField(explained.level, "l" + std::to_string(std::min(explained.level, deepest)) + state, path);
     tree_.append("<span>").append(record.path.substr(record.path.rfind('.') + 1)).append("</span><span>");
     tree_.append(kind).append("</span><span class=\"").append(style).append("\">");
-    tree_ += escaped(value_) + "</span></div>\n";
+    tree_ += inHtml(value_) + "</span></div>\n";
     level_ = explained.level;
   }
 
@@ -142,7 +142,7 @@ class HtmlRenderer final : public Renderer {
     dump_.add(error.rest.first(error.good), error.offset, fields_, "h");
     dump_.add(error.rest.subspan(error.good), error.offset + error.good, fields_, "bad");
     startField(level_, "bad", "error");
-    tree_ += escaped(error.text) + "</div>\n";
+    tree_ += inHtml(error.text) + "</div>\n";
   }
 
   void endMessage() override {
@@ -169,9 +169,9 @@ class HtmlRenderer final : public Renderer {
   }
 
   void startField(std::size_t level, const std::string& style, const std::string& status) {
-    tree_ += "<div role=\"treeitem\" tabindex=\"-1\" aria-level=\"" + std::to_string(level + 1) +
-             "\" data-f=\"" + std::to_string(fields_++) + "\" class=\"" + style + "\" data-s=\"" +
-             escaped(status) + "\">";
+    tree_ += R"(<div role="treeitem" tabindex="-1" aria-level=")" + std::to_string(level + 1) +
+             R"(" data-f=")" + std::to_string(fields_++) + R"(" class=")" + style + R"(" data-s=")" +
+             inHtml(status) + "\">";
   }
 
   const Options& options_;

@@ -22,18 +22,6 @@ void appendNumber(std::uint64_t number, std::string& output) {
   output.append(digits, std::to_chars(digits, digits + sizeof digits, number).ptr);
 }
 
-constexpr WireType wireTypeOf(ValueType type) {
-  switch (type) {
-    case ValueType::boolean:
-    case ValueType::uint32:
-    case ValueType::enumeration: return WireType::varint;
-    case ValueType::string:
-    case ValueType::bytes:
-    case ValueType::message: break;
-  }
-  return WireType::lengthDelimited;
-}
-
 constexpr std::size_t mostFields = [] {
   std::size_t most = 0;
   AllMessages::forEach([&]<class M>() { most = std::max(most, M::descriptor().fields.size()); });

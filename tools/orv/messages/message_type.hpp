@@ -12,6 +12,7 @@
 
 #include <orv/all_messages.hpp>
 #include <orv/session_message.hpp>
+#include <orv/wire_reader.hpp>
 
 namespace orv::tool {
 
@@ -25,6 +26,19 @@ struct MessageType {
   std::string_view shortName() const { return fullName().substr(fullName().find('.') + 1); }
   bool isEnvelope() const { return descriptor == &SessionMessage::descriptor(); }
 };
+
+// How values of a type travel, each with a tag of its own.
+constexpr WireType wireTypeOf(ValueType type) {
+  switch (type) {
+    case ValueType::boolean:
+    case ValueType::uint32:
+    case ValueType::enumeration: return WireType::varint;
+    case ValueType::string:
+    case ValueType::bytes:
+    case ValueType::message: break;
+  }
+  return WireType::lengthDelimited;
+}
 
 std::span<const MessageType> allMessageTypes();
 

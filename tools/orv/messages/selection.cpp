@@ -46,7 +46,7 @@ bool leadsToField(std::string_view path, const MessageDescriptor& type) {
 
 std::expected<void, std::string> Selection::addNumbers(std::string_view range) {
   const char* const end = range.data() + range.size();
-  auto read = std::from_chars(range.data(), end, first_);
+  auto read = std::from_chars(end - range.size(), end, first_);
   const bool isOpen = read.ptr != end && *read.ptr == '-';
   last_ = first_;
   if (isOpen && read.ptr + 1 == end) {

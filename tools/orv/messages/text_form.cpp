@@ -149,12 +149,6 @@ void appendFixed(Number value, std::string& output) {
   for (std::size_t index = 0; index < sizeof value; ++index) output += static_cast<char>(value >> 8 * index);
 }
 
-constexpr WireType wireTypeOf(ValueType type) {
-  return type == ValueType::boolean || type == ValueType::uint32 || type == ValueType::enumeration
-             ? WireType::varint
-             : WireType::lengthDelimited;
-}
-
 constexpr const FieldDescriptor& envelopeField(std::string_view name) {
   return *std::ranges::find(SessionMessage::descriptor().fields, name, &FieldDescriptor::name);
 }
@@ -226,7 +220,7 @@ class TextEncoder {
     for (;;) {
       if (!takeValue(field, hasColon)) return false;
       if (text_.take(']')) return true;
-      if (!text_.take(',')) return text_.failExpecting("\",\" or \"]\"");
+      if (!text_.take(',')) return text_.failExpecting(R"("," or "]")");
     }
   }
 
@@ -308,7 +302,7 @@ class TextEncoder {
     if (field.type == ValueType::enumeration) {
       const auto raw = enumerationOf(text_, field);
       if (!raw) return failExpecting("a name or a number of " + std::string(field.name));
-      if (&field == &envelopeField("type")) kind_ = *raw;
+      if (&field == &envelopeField("type")) kind_ = raw;
       return internal::travellingValue(*raw);
     }
     const std::string_view word = text_.takeWord();
@@ -320,13 +314,14 @@ class TextEncoder {
     }
     if (!number || *number > std::numeric_limits<std::uint32_t>::max())
       return failExpecting("a whole number from 0 to 4294967295");
-    return *number;
+    return number;
   }
 
   static std::optional<std::int64_t> enumerationOf(Scanner& text, const FieldDescriptor& field) {
     const bool isNegative = text.take('-');
     const std::string_view word = text.takeWord();
-    if (const auto named = field.cases.number(word); named && !isNegative) return named;
+    if (const std::optional<std::int64_t> named = field.cases.number(word); named && !isNegative)
+      return named;
     const auto number = numberOf(word);
     if (!number || *number > std::uint64_t{0x7FFFFFFF} + (isNegative ? 1 : 0)) return std::nullopt;
     return isNegative ? -static_cast<std::int64_t>(*number) : static_cast<std::int64_t>(*number);

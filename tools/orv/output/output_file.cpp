@@ -22,6 +22,7 @@ namespace {
 constexpr std::array endingSignals{SIGHUP, SIGINT, SIGQUIT, SIGTERM, SIGXCPU, SIGXFSZ};
 
 // The file that is written aside, if there is one: what a signal's handler can know.
+// NOLINTNEXTLINE(cppcoreguidelines-avoid-non-const-global-variables): a handler is given nothing else
 std::atomic<const char*> unfinished = nullptr;
 static_assert(std::atomic<const char*>::is_always_lock_free);
 
