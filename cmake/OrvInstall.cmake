@@ -60,6 +60,16 @@ write_basic_package_version_file(${PROJECT_BINARY_DIR}/orvConfigVersion.cmake CO
 install(FILES ${PROJECT_BINARY_DIR}/orvConfig.cmake ${PROJECT_BINARY_DIR}/orvConfigVersion.cmake COMPONENT library
   DESTINATION ${orvPackageDirectory})
 
+# What shows the values in gdb, which loads it of itself with the shared library.
+set(orvPrinters ${CMAKE_INSTALL_DATADIR}/orv)
+set(orvPrintersName orv-gdb.py)
+if(BUILD_SHARED_LIBS)
+  set(orvPrinters ${CMAKE_INSTALL_DATADIR}/gdb/auto-load${CMAKE_INSTALL_FULL_LIBDIR})
+  set(orvPrintersName liborv.so.${PROJECT_VERSION}-gdb.py)
+endif()
+install(FILES ${PROJECT_SOURCE_DIR}/tools/gdb/orv.py COMPONENT library DESTINATION ${orvPrinters}
+  RENAME ${orvPrintersName})
+
 if(TARGET orv_service)
   set(orvService ${CMAKE_INSTALL_FULL_LIBEXECDIR}/orv/orv_service)
   configure_file(${PROJECT_SOURCE_DIR}/service/orv.service.in ${PROJECT_BINARY_DIR}/orv.service @ONLY)

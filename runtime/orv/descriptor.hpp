@@ -24,6 +24,7 @@ enum class ValueType : std::uint8_t { string, bytes, boolean, uint32, enumeratio
 
 struct MessageDescriptor;
 
+// What a message's table says of one field. It lasts as long as the program.
 struct FieldDescriptor {
   std::uint32_t number;
   std::string_view name;

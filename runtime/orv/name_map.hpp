@@ -12,6 +12,7 @@ namespace orv::inline v0 {
 // `same`: the text name is the JSON name too. A map is a view of a table that lasts as long as the program.
 class NameMap {
  public:
+  // A field number or a raw value, and its name.
   struct Entry {
     std::int64_t number;
     std::string_view name;

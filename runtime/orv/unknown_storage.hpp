@@ -107,6 +107,7 @@ class UnknownStorage {
   Block* block_ = nullptr;
 };
 
+// Walks the kept fields. It is valid as long as the store is unchanged.
 class UnknownStorage::Iterator {
  public:
   using difference_type = std::ptrdiff_t;

@@ -44,6 +44,7 @@ class Value {
   const void* node_;
 };
 
+// A member of an object. Both are valid as long as the document.
 struct Value::Member {
   std::string_view name;
   Value value;

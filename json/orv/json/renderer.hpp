@@ -14,6 +14,7 @@
 
 namespace orv::inline v0::json {
 
+// How a Renderer writes.
 struct RenderOptions {
   // A member a line; otherwise the whole document is one line.
   bool isIndented = false;
