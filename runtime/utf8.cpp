@@ -110,6 +110,10 @@ std::size_t wellFormedBlocks(std::string_view text) {
     const char* const bytes = text.data() + at;
     const ByteBlock<4> block{
         {sixteenAt(bytes), sixteenAt(bytes + 16), sixteenAt(bytes + 32), sixteenAt(bytes + 48)}};
+    if (block.below(0x00) == 0) {
+      at += blockSize;
+      continue;
+    }
     const std::uint64_t continuations = block.below(0xC0);
     // The letter that begins last may go on behind the block.
     const std::size_t size = blockSize - 1 - static_cast<std::size_t>(std::countl_zero(~continuations | 1));
