@@ -1,11 +1,15 @@
-// The field tables, names and full names against the descriptors that protoc makes of proto/orv.proto.
+// The field tables, names and full names against the descriptors that protoc makes of proto/orv.proto, and these
+// against the ones that peers were built with.
 #include <google/protobuf/descriptor.h>
 #include <google/protobuf/descriptor.pb.h>
+#include <google/protobuf/text_format.h>
+#include <google/protobuf/util/message_differencer.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <fstream>
 #include <set>
+#include <sstream>
 
 #include <orv/session_message.hpp>
 #include "tests/testing/any_message.hpp"
@@ -16,12 +20,18 @@ namespace {
 
 using google::protobuf::Descriptor;
 using google::protobuf::FieldDescriptor;
+using google::protobuf::FileDescriptorSet;
+
+FileDescriptorSet schemaFiles() {
+  std::ifstream file(ORV_SCHEMA_DESCRIPTORS, std::ios::binary);
+  FileDescriptorSet files;
+  EXPECT_TRUE(files.ParseFromIstream(&file));
+  return files;
+}
 
 const google::protobuf::DescriptorPool& schema() {
   static const auto* const pool = [] {
-    std::ifstream file(ORV_SCHEMA_DESCRIPTORS, std::ios::binary);
-    google::protobuf::FileDescriptorSet files;
-    EXPECT_TRUE(files.ParseFromIstream(&file));
+    const FileDescriptorSet files = schemaFiles();
     auto* const built = new google::protobuf::DescriptorPool;
     for (const auto& one : files.file()) EXPECT_NE(built->BuildFile(one), nullptr);
     return built;
@@ -43,6 +53,19 @@ void forEachMessage(Body&& body) {
 void collectNames(const Descriptor& type, std::set<std::string>& names) {
   names.insert(type.full_name());
   for (int at = 0; at < type.nested_type_count(); ++at) collectNames(*type.nested_type(at), names);
+}
+
+TEST(Schema, IsTheOneThatPeersWereBuiltWith) {
+  std::ifstream file(ORV_GOLDEN_DESCRIPTORS);
+  std::ostringstream text;
+  text << file.rdbuf();
+  FileDescriptorSet golden;
+  ASSERT_TRUE(google::protobuf::TextFormat::ParseFromString(text.str(), &golden));
+  google::protobuf::util::MessageDifferencer differencer;
+  std::string differences;
+  differencer.ReportDifferencesToString(&differences);
+  EXPECT_TRUE(differencer.Compare(golden, schemaFiles()))
+      << differences << "what to do stands in " << ORV_GOLDEN_DESCRIPTORS;
 }
 
 TEST(Schema, HasTheMessagesOfTheListAndNoOthers) {
