@@ -48,7 +48,7 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedP
     length |= std::to_integer<std::uint64_t>(bytes[at] & std::byte{0x7F}) << (7 * at);
     if (bytes[at] >= std::byte{0x80}) continue;
     if (length > largestMessage) return fail(StreamError::Cause::malformedLength);
-    if (length > maximumSize_) return fail(StreamError::Cause::tooLarge, length);
+    if (length > limits_.inputBytes) return fail(StreamError::Cause::tooLarge, length);
     const std::span<const std::byte> body = bytes.subspan(at + 1);
     if (body.size() < length) return std::nullopt;
     messageOffset_ = offset_ + at + 1;

@@ -11,6 +11,7 @@
 #include <utility>
 
 #include <orv/byte_buffer.hpp>
+#include <orv/decode_limits.hpp>
 #include <orv/delimited_stream.hpp>
 
 namespace orv::inline v0 {
@@ -26,9 +27,11 @@ namespace orv::inline v0 {
 // read; after any other error every further call answers that error.
 class DelimitedParser {
  public:
-  // A message that is announced with more bytes than `maximumSizeInBytes` is an error, tooLarge.
-  explicit DelimitedParser(std::size_t maximumSizeInBytes = DelimitedReader::defaultMaximumSize)
-      : maximumSize_(maximumSizeInBytes) {}
+  // The limits are those of each message. One that is announced with more bytes than they allow is an error,
+  // tooLarge.
+  explicit DelimitedParser(const DecodeLimits& limits = {}) : limits_(limits) {}
+  explicit DelimitedParser(std::size_t maximumSizeInBytes)
+      : DelimitedParser(DecodeLimits{.inputBytes = maximumSizeInBytes}) {}
 
   // Takes a copy of the bytes that come next in the stream. They must not be the parser's own.
   void push(ByteView bytes);
@@ -42,7 +45,7 @@ class DelimitedParser {
     const auto bytes = next();
     if (!bytes) return std::unexpected(bytes.error());
     if (!bytes->has_value()) return std::nullopt;
-    auto message = M::parse(**bytes);
+    auto message = M::parse(**bytes, limits_);
     if (!message) return std::unexpected(malformedMessage(message.error()));
     return std::move(*message);
   }
@@ -60,7 +63,7 @@ class DelimitedParser {
   std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0);
   StreamError malformedMessage(const DecodeError& error) const;
 
-  std::size_t maximumSize_;
+  DecodeLimits limits_;
   // What was pushed and not popped stands from begin_ to end_.
   std::unique_ptr<std::byte[]> buffer_;
   std::size_t capacity_ = 0;

@@ -125,18 +125,26 @@ TEST(DecodeLimits, EndTheReadingWhereItIsTooDeep) {
 
 TEST(DecodeLimits, HoldForEachMessageOfAStream) {
   std::string stream = repeated(hex("04 12 00 12 00"), 3) + hex("06 12 00 12 00 12 00 00");
+  const DecodeLimits limits{.listElements = 2};
+  const auto expectRefusalOfTheFourth = [](auto& source) {
+    for (int message = 0; message < 3; ++message)
+      EXPECT_TRUE(source.template read<Group::Initialization>().value());
+    const auto refused = source.template read<Group::Initialization>();
+    ASSERT_FALSE(refused);
+    EXPECT_EQ(refused.error().decodeError->cause, DecodeCause::tooManyElements);
+    EXPECT_TRUE(source.template read<Group::Initialization>().value().has_value());
+  };
+  DelimitedParser parser(limits);
+  parser.push(stream);
+  expectRefusalOfTheFourth(parser);
   DelimitedReader reader(
       [&](std::span<std::byte> room) {
         const std::size_t count = stream.copy(reinterpret_cast<char*>(room.data()), room.size());
         stream.erase(0, count);
         return static_cast<std::ptrdiff_t>(count);
       },
-      DecodeLimits{.listElements = 2});
-  for (int message = 0; message < 3; ++message) EXPECT_TRUE(reader.read<Group::Initialization>());
-  const auto refused = reader.read<Group::Initialization>();
-  ASSERT_FALSE(refused);
-  EXPECT_EQ(refused.error().decodeError->cause, DecodeCause::tooManyElements);
-  EXPECT_TRUE(reader.read<Group::Initialization>().value().has_value());
+      limits);
+  expectRefusalOfTheFourth(reader);
 }
 
 TEST(DecodeLimits, LetNothingBeAllocatedForWhatLiesBeyond) {
