@@ -1,20 +1,16 @@
 #include <orv/json/renderer.hpp>
 
-#include <array>
-
 #include <orv/byte_view.hpp>
 #include <orv/spelling/base64.hpp>
 #include <orv/spelling/hex.hpp>
 #include <orv/utf8.hpp>
 #include <orv/wire_reader.hpp>
 
+#include "wire_type_names.hpp"
+
 namespace orv::inline v0::json {
 
 namespace {
-
-// In the order of WireType.
-constexpr std::array<std::string_view, 6> wireTypeNames{"varint",     "fixed64",  "lengthDelimited",
-                                                        "startGroup", "endGroup", "fixed32"};
 
 // Characters that would act on a terminal, or end a line there or in a script, rather than be shown.
 bool isControl(char32_t codePoint) {
@@ -117,6 +113,10 @@ void Renderer::appendUnknown(const UnknownField& field) {
       close(']');
       break;
     case WireType::endGroup: break;
+  }
+  if (!field.isShortest()) {
+    startMember("record");
+    appendBase64(charactersOf(field.record));
   }
   close('}');
 }

@@ -90,6 +90,11 @@ class LenientReader {
   WireReader reader_;
 };
 
+// Whether the field's text says all of it.
+bool isDescribed(const UnknownField& field) {
+  return field.tag.wireType() != WireType::startGroup && field.isShortest();
+}
+
 }  // namespace
 
 // Unknown fields, in the words of the official printer, which also decides as here whether the bytes of a
@@ -148,6 +153,7 @@ class TextRenderer::UnknownFieldsRenderer {
   // Takes back what it wrote if the bytes turn out not to be a message.
   bool renderAsMessage(std::string_view name, std::span<const std::byte> body, int levelsLeft) {
     if (body.empty() || levelsLeft <= 0) return false;
+    if (renderer_.style_.isReversible && !isReversible(body)) return false;
     LenientReader input(body);
     const std::size_t sizeBefore = renderer_.output_.size();
     renderer_.open(name);
@@ -155,6 +161,12 @@ class TextRenderer::UnknownFieldsRenderer {
     renderer_.close();
     if (!isMessage) renderer_.output_.resize(sizeBefore);
     return isMessage;
+  }
+
+  static bool isReversible(std::span<const std::byte> body) {
+    const auto records = UnknownStorage::checked(body);
+    return records && std::ranges::all_of(records->begin(), records->end(),
+                                          [](const UnknownField& field) { return isDescribed(field); });
   }
 
   TextRenderer& renderer_;
@@ -217,10 +229,27 @@ TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unkn
       (void)redacted(std::to_string(field.tag.fieldNumber()));
       continue;
     }
+    const std::size_t start = output_.size();
     LenientReader input(field.record);
     (void)renderer.renderRecords(input, {unknownLevels, internal::maximumNesting});
+    if (style_.isReversible && !isDescribed(field)) {
+      makeComment(start);
+      (void)quoted("[records]", charactersOf(field.record));
+    }
   }
   return {};
+}
+
+// Of the lines from there on.
+void TextRenderer::makeComment(std::size_t start) {
+  const std::string lines = output_.substr(start);
+  output_.resize(start);
+  for (std::size_t at = 0; at < lines.size();) {
+    const std::size_t end = std::min(lines.find('\n', at), lines.size() - 1) + 1;
+    startLine("# ");
+    output_ += std::string_view(lines).substr(at + indentation_, end - at - indentation_);
+    at = end;
+  }
 }
 
 }  // namespace orv

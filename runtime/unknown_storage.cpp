@@ -4,6 +4,8 @@
 #include <cstring>
 #include <new>
 
+#include <orv/internal/varint.hpp>
+
 namespace orv::inline v0 {
 
 std::expected<UnknownStorage, DecodeError> UnknownStorage::checked(std::span<const std::byte> records) {
@@ -54,6 +56,29 @@ bool UnknownStorage::hasSameRecords(const UnknownStorage& other) const {
   const std::span<const std::byte> left = records();
   const std::span<const std::byte> right = other.records();
   return left.size() == right.size() && std::memcmp(left.data(), right.data(), left.size()) == 0;
+}
+
+bool UnknownField::isShortest() const {
+  const std::size_t tagSize = record.size() - value.size();
+  if (tagSize != internal::varintSize(tag.value)) return false;
+  // What is kept is well-formed.
+  WireReader reader(value);
+  switch (tag.wireType()) {
+    case WireType::varint: return value.size() == internal::varintSize(*reader.readVarint());
+    case WireType::fixed64:
+    case WireType::fixed32: return true;
+    case WireType::lengthDelimited: {
+      const std::size_t length = reader.readLengthDelimited()->size();
+      return value.size() == internal::varintSize(length) + length;
+    }
+    case WireType::startGroup:
+      for (UnknownStorage::Iterator inner(value);; ++inner) {
+        if (inner->tag.wireType() == WireType::endGroup) return inner->record.size() == tagSize;
+        if (!inner->isShortest()) return false;
+      }
+    case WireType::endGroup: break;
+  }
+  return true;
 }
 
 void UnknownStorage::freeBlock() noexcept { ::operator delete(block_); }

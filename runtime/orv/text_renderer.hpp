@@ -18,6 +18,10 @@ namespace orv::inline v0 {
 struct TextStyle {
   bool isOneLine = false;     // a space behind each field in place of a line's end
   bool hidesSecrets = false;  // `<redacted>` for the values of secret fields, and of unknown ones
+  // Unknown fields so that the command's reader makes the same bytes of them again, not as the official printer:
+  // a length-delimited one is a message only if that is so; records that their text does not describe in full,
+  // groups and overlong spellings, stand as `[records]: "…"`, below their text in comments.
+  bool isReversible = false;
 };
 
 // A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format"), a field a line.
@@ -66,6 +70,7 @@ class TextRenderer : public AnyValueVisitor<TextRenderer> {
   Result plain(std::string_view name, std::string_view value);
   Result quoted(std::string_view name, std::string_view bytes);
   void appendQuoted(std::string_view bytes);
+  void makeComment(std::size_t start);
 
   class UnknownFieldsRenderer;
 

@@ -22,6 +22,10 @@ struct UnknownField {
   Tag tag;
   std::span<const std::byte> record;  // as it came: tag, length and overlong spellings included
   std::span<const std::byte> value;   // what follows the tag
+
+  // Whether all tags, lengths and varints in the record, and in the groups in it, are as short as they can be: then
+  // number, wire type and value say all of it.
+  bool isShortest() const;
 };
 
 // Kept records, byte for byte as they came, in the order of their arrival; they are well-formed always. Owns

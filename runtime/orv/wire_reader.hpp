@@ -7,6 +7,7 @@
 #include <span>
 
 #include <orv/decode_error.hpp>
+#include <orv/descriptor.hpp>
 
 namespace orv::inline v0 {
 
@@ -25,6 +26,19 @@ enum class WireType : std::uint8_t {
   endGroup = 4,
   fixed32 = 5,
 };
+
+// How a value travels.
+constexpr WireType wireTypeOf(ValueType type) {
+  switch (type) {
+    case ValueType::boolean:
+    case ValueType::uint32:
+    case ValueType::enumeration: return WireType::varint;
+    case ValueType::string:
+    case ValueType::bytes:
+    case ValueType::message: break;
+  }
+  return WireType::lengthDelimited;
+}
 
 // A field number, 1 to 2^29-1, and a wire type, which may be one of the reserved 6 and 7.
 struct Tag {

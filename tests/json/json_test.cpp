@@ -247,5 +247,49 @@ TEST(Json, LeaksNothingWhereverMemoryRunsOut) {
   }
 }
 
+TEST(Json, ReadsUnknownFieldsByteForByte) {
+  // In groups, and spelled longer than need be: the number, the tag, the length, in a group.
+  for (const std::string_view bytes :
+       {"0A 01 61 38 96 01 45 01 00 00 00 49 02 00 00 00 00 00 00 00 52 01 FF 5B 08 01 5C",
+        "38 FF FF FF FF FF FF FF FF FF 01", "38 81 00", "B8 00 01", "52 81 00 FF", "5B 08 81 00 5C",
+        "5B 5B 5C DC 00", "08 01 15 00 00 00 80"}) {
+    const std::string document = rendered<Member>(bytes, {.showsUnknownFields = true});
+    EXPECT_EQ(outcome<Member>(document), bytes) << document;
+  }
+}
+
+TEST(Json, RefusesUnknownFieldsThatAreNone) {
+  const Case cases[] = {
+      {"no list", "{}", "$.unknownFields: expected a list, found an object"},
+      {"no object", "[1]", "$.unknownFields[0]: expected an object, found a number"},
+      {"another member", R"([{"size":1}])", "$.unknownFields[0]: an unknown field has no \"size\""},
+      {"no number", R"([{"wireType":"varint","value":1}])",
+       "$.unknownFields[0]: \"number\" is no number of a field"},
+      {"number 0", R"([{"number":0}])", "$.unknownFields[0]: \"number\" is no number of a field"},
+      {"number too large", R"([{"number":536870912}])",
+       "$.unknownFields[0]: \"number\" is no number of a field"},
+      {"no type", R"([{"number":9}])", "$.unknownFields[0]: \"wireType\" is none"},
+      {"end of a group", R"([{"number":9,"wireType":"endGroup"}])",
+       "$.unknownFields[0]: \"wireType\" is none"},
+      {"no value", R"([{"number":9,"wireType":"varint"}])", "$.unknownFields[0]: \"value\" is no varint"},
+      {"negative value", R"([{"number":9,"wireType":"varint","value":-1}])",
+       "$.unknownFields[0]: \"value\" is no varint"},
+      {"value too large", R"([{"number":9,"wireType":"fixed32","value":4294967296}])",
+       "$.unknownFields[0]: \"value\" is out of range"},
+      {"no base64", R"([{"number":9,"wireType":"lengthDelimited","value":"!"}])",
+       "$.unknownFields[0]: \"value\" is no base64"},
+      {"no group", R"([{"number":9,"wireType":"startGroup","value":""}])",
+       "$.unknownFields[0]: \"value\" is no list"},
+      {"malformed record", R"([{"record":"Cg=="}])",
+       "$.unknownFields[0]: malformed: the input ends inside a record"},
+      {"known field", R"([{"number":1,"wireType":"lengthDelimited","value":"/w=="}])",
+       "$.unknownFields[0]: field 1 is handle"},
+      {"null", "null", ""},
+  };
+  for (const Case& each : cases)
+    EXPECT_EQ(outcome<Member>("{\"unknownFields\":" + std::string(each.document) + "}"), each.outcome)
+        << each.name;
+}
+
 }  // namespace
 }  // namespace orv::test

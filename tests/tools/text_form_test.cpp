@@ -8,9 +8,11 @@
 #include <string>
 
 #include <orv/all_messages.hpp>
+#include <orv/byte_view.hpp>
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
 #include "tests/testing/random.hpp"
+#include "tools/orv/messages/message_value.hpp"
 
 namespace orv::test {
 namespace {
@@ -232,6 +234,30 @@ TEST(TextForm, TakesUnknownFieldsByNumber) {
   };
   for (const Case& each : cases) {
     EXPECT_EQ(outcome(tool::typeOf<Member>(), each.text), each.outcome) << each.name;
+  }
+}
+
+// Random bytes are mostly no messages, so that records are tried in all spellings by hand too.
+TEST(TextForm, BringsUnknownFieldsBack) {
+  const auto expectBack = [](std::string_view bytes) {
+    const auto message = tool::parseMessage(tool::typeOf<Member>(), bytesOf(bytes), usualPairing);
+    ASSERT_TRUE(message.has_value()) << toHex(bytes);
+    const std::string text = (*message)->text();
+    EXPECT_EQ(outcome(tool::typeOf<Member>(), text), toHex(bytes)) << text;
+  };
+  for (const std::string_view record :
+       {"38 96 01", "45 01 00 00 00", "49 02 00 00 00 00 00 00 00", "52 01 FF", "52 00", "52 02 08 01",
+        "5B 08 01 5C", "38 FF FF FF FF FF FF FF FF FF 01", "38 81 00", "B8 00 01", "52 81 00 FF",
+        "52 03 08 81 00", "52 02 5B 5C", "52 04 52 02 08 01", "52 05 52 03 08 81 00", "08 05",
+        "15 00 00 00 80", "52 03 0A 81 00"})
+    expectBack(hex(record));
+  Random random;
+  for (std::size_t round = 0; round < Random::rounds(roundsPerType); ++round) {
+    const auto official = newOfficial("orv.Member");
+    fillRandomly(*official, random);
+    const auto message = Member::parse(official->SerializeAsString());
+    ASSERT_TRUE(message.has_value());
+    expectBack(*message->serialize());
   }
 }
 

@@ -141,7 +141,22 @@ def test():
         capture("tcp.pcap", [tcp(1 + start, stream[start : start + size]) for start in segments])
         check("tcp.pcap")
 
+    exported(envelopes)
     damage(envelopes)
+
+
+def exported(envelopes):
+    """Each envelope with its time and its ends, and as a stream for the command, from captures of either format."""
+    shown = run("-d", "--to", "json", stdin=delimited(*envelopes)).stdout
+    for name in ("udp.pcap", "tcp.pcap"):
+        subprocess.run(["tshark", "-r", name, "-w", name + "ng"], capture_output=True, timeout=120, check=True)
+        for path in (name, name + "ng"):
+            digits = dissected(path, "-Y", "orv", "-T", "fields", "-E", "aggregator= ", "-e", "orv.hex")
+            expect(f"{path}: piped", run("-d", "--from", "hex", "--to", "json", stdin=digits).stdout, shown)
+    lines = dissected("udp.pcapng", "-Y", "orv", "-P", "-V", "-O", "orv,protobuf").splitlines()
+    summaries = [line.split() for line in lines if "ORV" in line]
+    expect("times", [float(words[1]) for words in summaries], list(map(float, range(len(envelopes)))))
+    expect("ends", {(words[2], words[4]) for words in summaries}, {("10.0.0.1", "10.0.0.2")})
 
 
 def damage(envelopes):

@@ -20,6 +20,7 @@ local orv = Proto("orv", "Invitation protocol")
 orv.fields.length = ProtoField.uint32("orv.length", "Length of the envelope")
 orv.fields.type = ProtoField.int32("orv.type", "Type of the envelope", base.DEC, kind_names)
 orv.fields.payload = ProtoField.string("orv.payload", "Payload message")
+orv.fields.hex = ProtoField.string("orv.hex", "Behind its length, in hexadecimal digits")
 orv.experts.malformed =
   ProtoExpert.new("orv.malformed", "Malformed", expert.group.MALFORMED, expert.severity.ERROR)
 orv.prefs.udp = Pref.range("UDP ports", "", "Ports whose datagrams hold one envelope each", 65535)
@@ -41,6 +42,15 @@ local function read_varint(tvb, offset, limit, longest)
       return value, at + 1
     end
   end
+end
+
+local function varint(value)
+  local digits = ""
+  while value >= 128 do
+    digits = digits .. string.format("%02x", value % 128 + 128)
+    value = math.floor(value / 128)
+  end
+  return digits .. string.format("%02x", value)
 end
 
 local function fail(offset, reason)
@@ -135,6 +145,8 @@ DissectorTable.get("protobuf_field"):add(ENVELOPE .. ".data", payload)
 
 local function dissect_envelope(tvb, pinfo, tree)
   local branch = tree:add(orv, tvb())
+  -- For the command orv, which reads envelopes behind their lengths.
+  branch:add(orv.fields.hex, varint(tvb:len()) .. tvb:bytes():tohex(true)):set_hidden()
   local number, fault = look_into(tvb)
   local kind = KINDS[number] or {}
   local name = kind.name or (number and string.format("type %d", number)) or "no type"

@@ -12,16 +12,18 @@
 
 #include <orv/any_value_decoder.hpp>
 #include <orv/byte_buffer.hpp>
+#include <orv/descriptor.hpp>
 #include <orv/json/document.hpp>
 #include <orv/json/error.hpp>
 #include <orv/name_map.hpp>
 #include <orv/text.hpp>
+#include <orv/unknown_storage.hpp>
 
 namespace orv::inline v0::json {
 
 // A decoder over one JSON object: its members are the fields, found by their text names. A member that is
 // null counts as absent. It reads strictly: what the message does not define, or cannot hold, is an error
-// with its path.
+// with its path. Unknown fields stand in the member "unknownFields", as the renderer shows them.
 class DocumentDecoder : public AnyValueDecoder<DocumentDecoder, Error> {
   using Base = AnyValueDecoder;
 
@@ -31,8 +33,8 @@ class DocumentDecoder : public AnyValueDecoder<DocumentDecoder, Error> {
   explicit DocumentDecoder(Value object) : object_(object) {}
 
   template <class M>
-  std::expected<std::optional<std::uint32_t>, Error> nextFieldNumber(M&) {
-    return nextNumber(M::_protobuf_nameMap());
+  std::expected<std::optional<std::uint32_t>, Error> nextFieldNumber(M& message) {
+    return nextNumber(M::descriptor(), message.mutableUnknownFields());
   }
 
   // Each answers true: what cannot be taken is an error.
@@ -85,7 +87,10 @@ class DocumentDecoder : public AnyValueDecoder<DocumentDecoder, Error> {
     return {};
   }
 
-  std::expected<std::optional<std::uint32_t>, Error> nextNumber(NameMap names);
+  std::expected<std::optional<std::uint32_t>, Error> nextNumber(const MessageDescriptor& message,
+                                                                UnknownStorage& unknownFields);
+  // Reads the member, a list of what the renderer shows of unknown fields.
+  Result readUnknownFields(const MessageDescriptor& message, UnknownStorage& unknownFields);
   std::expected<std::int64_t, Error> readEnum(NameMap names) const;
 
   // Where the member stands whose value is being read.

@@ -19,8 +19,8 @@ struct RenderOptions {
   // A member a line; otherwise the whole document is one line.
   bool isIndented = false;
   // Adds a member "unknownFields" to objects that have any: a list of {"number", "wireType", "value"} in the
-  // order of their arrival, 64-bit values as strings, lengths of bytes in base64, groups as lists. Reading
-  // does not take it.
+  // order of their arrival, 64-bit values as strings, bytes in base64, groups as lists. Where that does not say
+  // how long a number is spelled, {"record"} has all bytes in base64. Reading makes the same bytes of it.
   bool showsUnknownFields = false;
 };
 

@@ -20,7 +20,12 @@ class TypedValue final : public MessageValue {
  public:
   explicit TypedValue(M message) : message_(std::move(message)) {}
 
-  std::string text() const override { return message_.debugDescription(); }
+  std::string text() const override {
+    std::string text;
+    TextRenderer renderer(text, {.isReversible = true});
+    (void)message_.traverse(renderer);
+    return text;
+  }
   std::string json(json::RenderOptions options) const override { return json::render(message_, options); }
   std::expected<std::string, EncodeError> serialize() const override { return message_.serialize(); }
   std::vector<compare::Leaf> leaves() const override { return compare::LeafCollector::collect(message_); }
