@@ -1,5 +1,7 @@
 #include <orv/json/renderer.hpp>
 
+#include <utility>
+
 #include <orv/byte_view.hpp>
 #include <orv/spelling/base64.hpp>
 #include <orv/spelling/hex.hpp>
@@ -90,6 +92,8 @@ Renderer::Result Renderer::visitUnknownFields(const UnknownStorage& unknownField
 
 void Renderer::appendUnknown(const UnknownField& field) {
   startItem();
+  // On one line: there may be millions of them.
+  const bool isIndented = std::exchange(options_.isIndented, false);
   open('{');
   startMember("number");
   output_ += std::to_string(field.tag.fieldNumber());
@@ -119,6 +123,7 @@ void Renderer::appendUnknown(const UnknownField& field) {
     appendBase64(charactersOf(field.record));
   }
   close('}');
+  options_.isIndented = isIndented;
 }
 
 }  // namespace orv::json

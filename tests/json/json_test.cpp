@@ -247,6 +247,17 @@ TEST(Json, LeaksNothingWhereverMemoryRunsOut) {
   }
 }
 
+TEST(Json, ShowsEachUnknownFieldOnALine) {
+  EXPECT_EQ(rendered<Member>("0A 01 61 20 01 5B 08 01 5C", {.isIndented = true, .showsUnknownFields = true}),
+            R"({
+  "handle": "a",
+  "unknownFields": [
+    {"number":4,"wireType":"varint","value":"1"},
+    {"number":11,"wireType":"startGroup","value":[{"number":1,"wireType":"varint","value":"1"}]}
+  ]
+})");
+}
+
 TEST(Json, ReadsUnknownFieldsByteForByte) {
   // In groups, and spelled longer than need be: the number, the tag, the length, in a group.
   for (const std::string_view bytes :

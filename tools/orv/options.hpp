@@ -44,6 +44,7 @@ struct Options {
   bool comparesEncodings = false;
   std::vector<std::string> ignored;  // paths of fields
   bool isQuiet = false;
+  bool isVerbose = false;
   // A message takes several times its size in memory, up to about sixty times where it is nothing but empty
   // members.
   std::size_t maximumSize = std::size_t{16} << 20;

@@ -141,7 +141,7 @@ std::optional<std::string> complete(const Command& command, Options& options) {
     return "takes one command, not " + std::to_string(files.size());
   if (command.operands == Operands::files && files.empty()) {
     // Other formats may be typed.
-    if (options.from == Format::binary && isTerminal(STDIN_FILENO))
+    if (options.from.value_or(command.from.allowed.front()) == Format::binary && isTerminal(STDIN_FILENO))
       return "nothing to read: name a file or pipe one in (orv --help tells more)";
     files.emplace_back("-");
   }

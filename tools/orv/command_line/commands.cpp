@@ -136,6 +136,8 @@ constexpr OptionDescription messages{'n', "--messages", "N[-[M]]",
 constexpr OptionDescription only{
     noLetter, "--only", "KIND|FIELD[=VALUE]",
     "take envelopes of the kind, or messages with the field, or with the value in it", takeCondition};
+constexpr OptionDescription verbose{noLetter, "--verbose", flag, "say which format an input is read in",
+                                    set<&Options::isVerbose>};
 constexpr OptionDescription keepGoing{
     'k', "--keep-going", flag, "go on behind malformed messages of a stream", set<&Options::keepsGoing>};
 constexpr OptionDescription unknown{noLetter, "--unknown", flag, "show unknown fields in JSON",
@@ -167,13 +169,13 @@ constexpr std::array<const OptionDescription*, sizeof...(Options)> list(const Op
 }
 constexpr auto generalOptions = list(help, version);
 constexpr auto decodeOptions = list(type, payload, noUnwrap, from, to, delimited, messages, only, keepGoing,
-                                    unknown, maximumSize, output, help);
+                                    unknown, verbose, maximumSize, output, help);
 constexpr auto encodeOptions =
-    list(type, payload, from, to, delimited, messages, only, keepGoing, maximumSize, output, help);
+    list(type, payload, from, to, delimited, messages, only, keepGoing, verbose, maximumSize, output, help);
 constexpr auto inspectOptions = list(type, payload, as, noUnwrap, from, to, delimited, messages, only,
-                                     keepGoing, defaults, colour, maximumSize, output, help);
+                                     keepGoing, defaults, colour, verbose, maximumSize, output, help);
 constexpr auto diffOptions = list(type, payload, noUnwrap, from, delimited, messages, only, ignore, bytes,
-                                  quiet, colour, maximumSize, output, help);
+                                  quiet, colour, verbose, maximumSize, output, help);
 constexpr auto identifyOptions = list(from, delimited, messages, keepGoing, maximumSize, output, help);
 constexpr auto printingOptions = list(help);
 
@@ -220,7 +222,7 @@ constexpr Command commands[] = {
      .text = "Reads messages in their binary encoding and shows them as text or JSON, with the payload of an "
              "envelope in place of its data.",
      .operands = Operands::files,
-     .from = {.allowed = byteFormats, .byDefault = Format::binary},
+     .from = {.allowed = allFormats, .isGuessed = true},
      .to = {.allowed = readableFormats, .byDefault = Format::text},
      .options = decodeOptions,
      .examples = decodeExamples},
@@ -241,7 +243,7 @@ constexpr Command commands[] = {
      .text = "Shows the bytes of each field with their offset, the field's path, its kind and its value, and "
              "the payload of an envelope in its place. Malformed bytes are shown up to the error.",
      .operands = Operands::files,
-     .from = {.allowed = allFormats, .byDefault = Format::binary},
+     .from = {.allowed = allFormats, .isGuessed = true},
      .to = {.allowed = shownFormats, .byDefault = Format::text},
      .options = inspectOptions,
      .examples = inspectExamples},
@@ -263,7 +265,7 @@ constexpr Command commands[] = {
              "lists are aligned, so that a missing one is one line. Messages are equal as the "
              "model has it: texts when they are canonically equivalent, whatever their bytes.",
      .operands = Operands::twoFiles,
-     .from = {.allowed = allFormats, .byDefault = Format::binary},
+     .from = {.allowed = allFormats, .isGuessed = true},
      .to = {},
      .options = diffOptions,
      .examples = diffExamples},

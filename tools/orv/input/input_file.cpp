@@ -51,6 +51,10 @@ std::string_view InputFile::beginning() {
   return lookedAt_;
 }
 
+void InputFile::skipByteOrderMark() {
+  if (beginning().starts_with(byteOrderMark)) lookedAt_.erase(0, byteOrderMark.size());
+}
+
 std::ptrdiff_t InputFile::readDescriptor(std::span<std::byte> buffer) {
   pollfd source{.fd = descriptor_, .events = POLLIN, .revents = 0};
   if (::poll(&source, 1, 0) == 0) {

@@ -17,6 +17,9 @@
 
 namespace orv::tool {
 
+// What some editors put before UTF-8.
+inline constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+
 // A file, or standard input for "-", read from its beginning to its end. Whenever more of it is waited for, what
 // was made of it so far is written.
 class InputFile {
@@ -37,6 +40,8 @@ class InputFile {
 
   // What it begins with, white space and more, which stays to be read. Only white space if there is much of it.
   std::string_view beginning();
+  // Leaves out a byte order mark that it begins with.
+  void skipByteOrderMark();
 
  private:
   InputFile(std::string name, int descriptor, OutputFile& output)

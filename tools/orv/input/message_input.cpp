@@ -7,6 +7,7 @@
 #include <orv/byte_view.hpp>
 #include <orv/json/document.hpp>
 #include <orv/utf8.hpp>
+#include <orv/wire_reader.hpp>
 #include "tools/orv/messages/text_form.hpp"
 #include "tools/orv/output/progress.hpp"
 
@@ -20,9 +21,14 @@ bool isSpelledFor(Reader reader, std::string_view text) {
   return reader.take(text, bytes) && (!bytes.empty() || reader.finish(bytes)) && !bytes.empty();
 }
 
+bool isMessageOf(const MessageType& type, std::span<const std::byte> bytes) {
+  return parseMessage(type, bytes, PayloadPairing::closed()).has_value();
+}
+
 // By what it begins with. An array is no message, but more likely meant for JSON than for an extension in the text
 // format.
-Format guessFormat(std::string_view beginning, std::span<const Format> possible) {
+Format guessFormat(std::string_view beginning, std::span<const Format> possible, const MessageType& type) {
+  if (beginning.starts_with(byteOrderMark)) beginning.remove_prefix(byteOrderMark.size());
   constexpr std::string_view blanks = " \t\r\n";
   constexpr std::string_view hexDigits = "0123456789abcdefABCDEF";
   const auto isControl = [&](char c) { return c >= 0 && c < ' ' && !blanks.contains(c); };
@@ -31,6 +37,8 @@ Format guessFormat(std::string_view beginning, std::span<const Format> possible)
   if (text.starts_with('{') || text.starts_with('[')) return Format::json;
   if (std::ranges::find(possible, Format::binary) == possible.end()) return Format::text;
   if (std::ranges::any_of(beginning, isControl) || !utf8::isWellFormed(text)) return Format::binary;
+  // A bare message may begin with what looks like a line's end.
+  if (beginning.starts_with('\n') && isMessageOf(type, bytesOf(beginning))) return Format::binary;
   const std::string_view word = text.substr(0, text.find_first_of(" \t\r\n:{<"));
   const auto behind = text.find_first_not_of(" \t", word.size());
   const bool isField = behind != std::string_view::npos && std::string_view(":{<").contains(text[behind]);
@@ -39,6 +47,17 @@ Format guessFormat(std::string_view beginning, std::span<const Format> possible)
   if (isSpelledFor(spelling::HexReader(), text)) return Format::hex;
   const bool isOneWord = text.substr(0, text.find('\n')).find(' ') == std::string_view::npos;
   return isOneWord && isSpelledFor(spelling::Base64Reader(), text) ? Format::base64 : Format::text;
+}
+
+// Whether the bytes are messages behind their lengths, the first of them of the type.
+bool isStreamOf(const MessageType& type, std::span<const std::byte> bytes) {
+  WireReader reader(bytes);
+  const auto first = reader.readLengthDelimited();
+  if (!first || !isMessageOf(type, *first)) return false;
+  while (!reader.isAtEnd()) {
+    if (!reader.readLengthDelimited()) return false;
+  }
+  return true;
 }
 
 // Tells of what failed, behind the output that came before it.
@@ -93,8 +112,15 @@ MessageInput::MessageInput(InputFile file, const std::string& path, const Option
     : file_(std::move(file)),
       path_(path),
       options_(options),
-      format_(options.from ? *options.from : guessFormat(file_.beginning(), options.possibleFormats)),
-      reader_(FrameReader::make(file_, format_, options)) {}
+      format_(options.from ? *options.from
+                           : guessFormat(file_.beginning(), options.possibleFormats, *options.type)),
+      reader_(FrameReader::make(file_, format_, options)) {
+  if (format_ != Format::binary) file_.skipByteOrderMark();
+  if (!options.from && options.isVerbose) {
+    const auto name = formatNames[static_cast<std::size_t>(format_)];
+    report({ExitStatus::done, file_.name() + ": read as " + std::string(name)});
+  }
+}
 
 Outcome<std::unique_ptr<MessageInput>> MessageInput::open(const std::string& path, const Options& options,
                                                           OutputFile& output) {
@@ -176,10 +202,12 @@ Outcome<OwnedMessage> MessageInput::message(const PayloadPairing& payloads) cons
 
 Failure MessageInput::failureOf(const DecodeError& error) const {
   const std::string path = error.path.text();
+  const bool isMessage = isMessageOf(*options_.type, bytesOf(encoding_));
+  const bool isStream = !isMessage && !options_.isDelimited && isStreamOf(*options_.type, bytesOf(encoding_));
   Failure failure =
-      reader_->malformedBytes(frame_, error.offset, (path.empty() ? "" : path + ": ") + error.reason());
-  const bool isMessage =
-      parseMessage(*options_.type, bytesOf(encoding_), PayloadPairing::closed()).has_value();
+      reader_->malformedBytes(frame_, error.offset,
+                              (path.empty() ? "" : path + ": ") + error.reason() +
+                                  (isStream ? "; it looks like a stream: try --delimited" : ""));
   failure.extent = isMessage ? Extent::part : Extent::message;
   return failure;
 }
