@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
 #include <cerrno>
@@ -115,9 +116,12 @@ Outcome<void> OutputFile::openAside(const std::string& target, mode_t mode) {
 
 Outcome<void> OutputFile::write(std::string_view text) {
   constexpr std::size_t enough = std::size_t{64} << 10;
-  gathered_ += text;
-  if (gathered_.size() < enough) return {};
-  return flush();
+  for (; !text.empty(); text.remove_prefix(std::min(text.size(), enough))) {
+    gathered_ += text.substr(0, enough);
+    if (gathered_.size() < enough) continue;
+    if (auto flushed = flush(); !flushed) return flushed;
+  }
+  return {};
 }
 
 Outcome<void> OutputFile::flush() {
