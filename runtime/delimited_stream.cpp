@@ -9,6 +9,7 @@
 #include <cstring>
 #include <functional>
 #include <limits>
+#include <ostream>
 #include <string_view>
 #include <vector>
 
@@ -179,5 +180,8 @@ std::expected<void, EncodeError> appendDelimited(std::string_view bytes, std::st
   });
   return {};
 }
+
+std::ostream& operator<<(std::ostream& out, StreamError::Cause cause) { return out << describe(cause); }
+std::ostream& operator<<(std::ostream& out, const StreamError& error) { return out << error.message(); }
 
 }  // namespace orv

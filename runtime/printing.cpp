@@ -1,4 +1,5 @@
-// How values are written to streams.
+// How values are written to streams. A stream's error is printed where streams are, since every message can be
+// printed and every program would link them.
 #include <orv/internal/printing.hpp>
 
 #include <ostream>
@@ -6,7 +7,6 @@
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_error.hpp>
-#include <orv/delimited_stream.hpp>
 #include <orv/encode_error.hpp>
 #include <orv/internal/hex_digits.hpp>
 #include <orv/text.hpp>
@@ -39,8 +39,5 @@ std::ostream& operator<<(std::ostream& out, const FieldPath& path) { return out 
 std::ostream& operator<<(std::ostream& out, const DecodeError& error) { return out << error.message(); }
 
 std::ostream& operator<<(std::ostream& out, EncodeError error) { return out << describe(error); }
-
-std::ostream& operator<<(std::ostream& out, StreamError::Cause cause) { return out << describe(cause); }
-std::ostream& operator<<(std::ostream& out, const StreamError& error) { return out << error.message(); }
 
 }  // namespace orv
