@@ -58,14 +58,15 @@ Outcome<> Conversation::sendMessage(const orv::SessionMessage& message) {
   return sent;
 }
 
+Outcome<> Conversation::keepReceived() {
+  return capture_ == nullptr ? Outcome<>() : capture_->append(received_);
+}
+
 Outcome<orv::envelope::Payload> Conversation::receivePayload(const std::string& due) {
   readDeadline_ = deadline();
   const auto message = reader_.read<orv::SessionMessage>();
   if (!message) return fault(message.error(), due);
   if (!message->has_value()) return fault("the connection was closed", due);
-  if (capture_ != nullptr) {
-    if (auto kept = capture_->append(**message); !kept) return std::unexpected(kept.error());
-  }
   if (const std::uint32_t version = (*message)->version(); version != protocolVersion) {
     return fault("a message of version " + std::to_string(version) + " where version " +
                      std::to_string(protocolVersion) + " is spoken",
@@ -75,6 +76,7 @@ Outcome<orv::envelope::Payload> Conversation::receivePayload(const std::string& 
   if (!payload) return fault(payload.error().message(), due);
   const auto words = std::visit([](const auto& carried) { return inWords(carried); }, *payload);
   narrator_.tell("receives", orv::envelope::nameOf((*message)->type()), words);
+  received_ = std::move(**message);
   return std::move(*payload);
 }
 

@@ -39,22 +39,22 @@ class Conversation {
     return sendMessage(*message);
   }
 
-  // The next message's payload, which must be an M.
+  // The next message's payload, which must be an M. What is received as it should be is captured.
   template <class M>
   Outcome<M> receive() {
-    const std::string due = orv::envelope::nameOf(*orv::envelope::typeCarrying<M>);
-    auto payload = receivePayload(due);
-    if (!payload) return std::unexpected(payload.error());
-    if (M* const received = std::get_if<M>(&*payload)) return std::move(*received);
-    return fault("something else came", due);
+    auto received = take<M>();
+    if (!received) return received;
+    if (auto kept = keepReceived(); !kept) return std::unexpected(kept.error());
+    return received;
   }
 
   // Receives a payload that must equal this one.
   template <class M>
   Outcome<> receiveExactly(const M& expected) {
-    const auto received = receive<M>();
+    const auto received = take<M>();
     if (!received) return std::unexpected(received.error());
-    return expectEqual(*received, expected);
+    if (auto same = expectEqual(*received, expected); !same) return same;
+    return keepReceived();
   }
 
   template <class M>
@@ -76,6 +76,17 @@ class Conversation {
   Deadline deadline() const { return std::chrono::steady_clock::now() + timeLimit_; }
   Outcome<> sendMessage(const orv::SessionMessage& message);
   Outcome<orv::envelope::Payload> receivePayload(const std::string& due);
+  Outcome<> keepReceived();
+
+  template <class M>
+  Outcome<M> take() {
+    const std::string due = orv::envelope::nameOf(*orv::envelope::typeCarrying<M>);
+    auto payload = receivePayload(due);
+    if (!payload) return std::unexpected(payload.error());
+    if (M* const received = std::get_if<M>(&*payload)) return std::move(*received);
+    return fault("something else came", due);
+  }
+
   Outcome<> receiveEnd(Deadline deadline);
   std::unexpected<Failure> fault(std::string_view what, std::string_view due) const;
   std::unexpected<Failure> fault(const orv::StreamError& error, std::string_view due) const;
@@ -86,7 +97,8 @@ class Conversation {
   const Narrator& narrator_;
   Capture* capture_;
   Deadline readDeadline_;
-  Outcome<> readOutcome_;  // what the socket said of a read that failed
+  orv::SessionMessage received_;  // the last one
+  Outcome<> readOutcome_;         // what the socket said of a read that failed
   orv::DelimitedReader reader_;
 };
 

@@ -1,9 +1,11 @@
 #include "examples/invitation/host.hpp"
 
+#include <memory>
 #include <string>
 #include <thread>
 
 #include "examples/invitation/conversation.hpp"
+#include "examples/invitation/lobby.hpp"
 #include "examples/invitation/sealing.hpp"
 #include "examples/invitation/story.hpp"
 
@@ -17,13 +19,12 @@ constexpr std::chrono::milliseconds betweenEvents{30};
 class Host {
  public:
   Host(Listener listener, Capture& capture, std::chrono::milliseconds timeLimit)
-      : listener_(std::move(listener)), capture_(capture), timeLimit_(timeLimit) {}
+      : lobby_(std::move(listener), timeLimit), capture_(capture), timeLimit_(timeLimit) {}
 
   Outcome<> letIn(const story::Person& guest) {
-    auto socket = accept(guest);
-    if (!socket) return std::unexpected(socket.error());
-    Conversation conversation(std::move(*socket), std::string(guest.name), timeLimit_, narrator_, &capture_);
-    if (auto asked = conversation.receiveExactly(story::connectionRequest(guest)); !asked) return asked;
+    const auto met = meet(guest);
+    if (!met) return std::unexpected(met.error());
+    Conversation& conversation = **met;
     auto answered = conversation.send(story::connectionApproval(guest, keys_.publicKey()));
     if (!answered) return answered;
     if (auto joined = letJoin(guest, conversation); !joined) return joined;
@@ -36,10 +37,9 @@ class Host {
   }
 
   Outcome<> turnAway(const story::Person& guest) {
-    auto socket = accept(guest);
-    if (!socket) return std::unexpected(socket.error());
-    Conversation conversation(std::move(*socket), std::string(guest.name), timeLimit_, narrator_, &capture_);
-    if (auto asked = conversation.receiveExactly(story::connectionRequest(guest)); !asked) return asked;
+    const auto met = meet(guest);
+    if (!met) return std::unexpected(met.error());
+    Conversation& conversation = **met;
     if (auto answered = conversation.send(story::connectionDenial(guest)); !answered) return answered;
     return conversation.end();
   }
@@ -49,10 +49,20 @@ class Host {
   }
 
  private:
-  Outcome<Socket> accept(const story::Person& guest) {
-    auto socket = listener_.accept(std::chrono::steady_clock::now() + timeLimit_);
-    if (!socket) return failure(socket.error().message + " (" + std::string(guest.name) + " was due)");
-    return socket;
+  // Waits for the guest, who is known by its request. Everybody else is turned away, and holds up nobody.
+  Outcome<std::unique_ptr<Conversation>> meet(const story::Person& guest) {
+    const Deadline deadline = std::chrono::steady_clock::now() + timeLimit_;
+    for (;;) {
+      auto socket = lobby_.next(deadline);
+      if (!socket) return failure(socket.error().message + " (" + std::string(guest.name) + " was due)");
+      auto conversation = std::make_unique<Conversation>(std::move(*socket), std::string(guest.name),
+                                                         timeLimit_, narrator_, &capture_);
+      const auto asked = conversation->receiveExactly(story::connectionRequest(guest));
+      if (asked) return conversation;
+      // The first line says it.
+      const std::string& reason = asked.error().message;
+      narrator_.complain("turned a stranger away: " + reason.substr(0, reason.find('\n')));
+    }
   }
 
   Outcome<> letJoin(const story::Person& guest, Conversation& conversation) {
@@ -76,7 +86,7 @@ class Host {
     return conversation.send(response);
   }
 
-  Listener listener_;
+  Lobby lobby_;
   Capture& capture_;
   std::chrono::milliseconds timeLimit_;
   Narrator narrator_{std::string(story::host.name)};

@@ -10,6 +10,7 @@ namespace invitation {
 // What went wrong, as one line for people.
 struct Failure {
   std::string message;
+  bool isTimeout = false;  // nothing came until the deadline
 };
 
 template <class T = void>

@@ -49,7 +49,7 @@ Outcome<> waitUntilReady(const Descriptor& descriptor, int events, Deadline dead
       .fd = descriptor.number(), .events = static_cast<decltype(pollfd::events)>(events), .revents = 0};
   const int ready = ::poll(&watched, 1, static_cast<int>(std::max(left, milliseconds::zero()).count()));
   if (ready < 0) return errno == EINTR ? failure("interrupted") : systemFailure("cannot wait");
-  if (ready == 0) return failure("timed out");
+  if (ready == 0) return std::unexpected(Failure{"timed out", true});
   return {};
 }
 
@@ -83,6 +83,20 @@ Outcome<> Socket::write(std::string_view bytes, Deadline deadline) {
   }
   return {};
 }
+
+Outcome<std::optional<std::size_t>> Socket::peek(std::span<std::byte> buffer) const {
+  const ssize_t count = ::recv(descriptor_.number(), buffer.data(), buffer.size(), MSG_PEEK | MSG_DONTWAIT);
+  if (count >= 0) return static_cast<std::size_t>(count);
+  if (errno == EAGAIN || errno == EINTR) return std::nullopt;
+  return systemFailure("cannot read");
+}
+
+bool Socket::peerHasFinished() const {
+  pollfd watched{.fd = descriptor_.number(), .events = POLLRDHUP, .revents = 0};
+  return ::poll(&watched, 1, 0) > 0;
+}
+
+void Socket::finishReading() { ::shutdown(descriptor_.number(), SHUT_RD); }
 
 void Socket::finishWriting() { ::shutdown(descriptor_.number(), SHUT_WR); }
 

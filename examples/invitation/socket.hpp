@@ -3,6 +3,7 @@
 
 #include <chrono>
 #include <cstddef>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -49,8 +50,14 @@ class Socket {
 
   // Waits for bytes and answers how many were read: 0 where the peer has closed its end.
   Outcome<std::size_t> read(std::span<std::byte> buffer, Deadline deadline);
+  // As read, without waiting and without taking the bytes: none when none are there.
+  Outcome<std::optional<std::size_t>> peek(std::span<std::byte> buffer) const;
+  // Whether the peer has closed its end; bytes may still be there.
+  bool peerHasFinished() const;
   // Writes all of them.
   Outcome<> write(std::string_view bytes, Deadline deadline);
+  // What has not come until now will not be read.
+  void finishReading();
   // Tells the peer that nothing more will come. Reading goes on.
   void finishWriting();
 
