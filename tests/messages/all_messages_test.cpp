@@ -2,13 +2,13 @@
 #include <gtest/gtest.h>
 
 #include <concepts>
-#include <thread>
 
 #include <orv/orv.hpp>
 #include <orv/text_renderer.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
+#include "tests/testing/properties.hpp"
 
 namespace orv::test {
 namespace {
@@ -114,24 +114,6 @@ TEST(AllMessages, AreReplacedWhenTheirMemoryIsUsedAgain) {
       ASSERT_TRUE(reused->reparse(right));
     }
   });
-}
-
-TEST(AllMessages, AreReadByManyThreadsAtOnce) {
-  // Only a build with the thread sanitizer can fail here.
-  Random random;
-  for (const MessagePointer& type : allMessages()) {
-    const std::string bytes = randomEncoding(type->fullName(), random);
-    const MessagePointer message = type->parse(bytes).value();
-    const auto read = [&] {
-      EXPECT_EQ(*message, *message->copied());
-      EXPECT_EQ(message->hashValue(), message->copied()->hashValue());
-      EXPECT_EQ(message->debugDescription().empty(), message->encodedSize() == 0);
-      EXPECT_EQ(message->serialize(), bytes);
-      for (const NameMap::Entry& entry : message->nameMap().entries()) EXPECT_FALSE(entry.name.empty());
-    };
-    const std::jthread others[] = {std::jthread(read), std::jthread(read)};
-    read();
-  }
 }
 
 TEST(AllMessages, KeepWhatWasReadBeforeAnError) {

@@ -5,6 +5,7 @@
 #include <orv/group.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
+#include "tests/testing/properties.hpp"
 #include "tests/testing/wire_cases.hpp"
 
 namespace orv::test {

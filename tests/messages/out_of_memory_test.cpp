@@ -8,6 +8,7 @@
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
+#include "tests/testing/properties.hpp"
 
 namespace orv::test {
 namespace {

@@ -12,12 +12,14 @@
 #include <string_view>
 #include <vector>
 
+#include <orv/binary_decoder.hpp>
 #include <orv/decode_error.hpp>
 #include <orv/descriptor.hpp>
 #include <orv/encode_error.hpp>
 #include <orv/name_map.hpp>
 #include <orv/unknown_storage.hpp>
 #include "tests/testing/scripted_decoder.hpp"
+#include "tests/testing/tracing_visitor.hpp"
 
 namespace orv::test {
 
@@ -47,12 +49,16 @@ class AnyMessage {
   virtual std::string printed() const = 0;
   virtual std::string redactedDescription() const = 0;
   virtual UnknownStorage& mutableUnknownFields() = 0;
+  // Where the message is, for who knows its type.
+  virtual void* address() = 0;
 
   // A new message.
   virtual std::expected<MessagePointer, DecodeError> parse(std::span<const std::byte> bytes) const = 0;
   virtual std::expected<void, DecodeError> merge(std::string_view bytes) = 0;
   virtual std::expected<void, DecodeError> reparse(std::string_view bytes) = 0;
   virtual std::expected<void, ScriptedError> decode(ScriptedDecoder& decoder) = 0;
+  virtual std::expected<void, DecodeError> decode(BinaryDecoder& decoder) = 0;
+  virtual TracingVisitor::Result traverse(TracingVisitor& visitor) const = 0;
 
   virtual std::expected<std::string, EncodeError> serialize() const = 0;
   virtual std::expected<std::size_t, EncodeError> serializeInto(std::span<std::byte> buffer) const = 0;
@@ -64,16 +70,10 @@ class AnyMessage {
   friend bool operator==(const AnyMessage& left, const AnyMessage& right) { return left.isEqualTo(right); }
 };
 
-// A default message of each type, in the order of the list of all messages.
+// A default message of each type: of the list of all messages in its order, and of nested_messages.hpp.
 const std::vector<MessagePointer>& allMessages();
 
-// The one whose full name is this, or this behind "orv.".
+// The one whose full name is this, or this behind "orv." or the like.
 const AnyMessage& messageNamed(std::string_view name);
-
-// What does not hold of the message's encoding; empty when all does.
-std::string faultOfEncoding(const AnyMessage& message);
-
-// What does not hold of the bytes when they are read as a message of this type. The fuzzer checks it too.
-std::string faultOfReading(const AnyMessage& type, std::string_view bytes);
 
 }  // namespace orv::test

@@ -5,6 +5,7 @@
 
 #include <array>
 #include <cstdint>
+#include <utility>
 #include <vector>
 
 namespace orv::test {
@@ -112,6 +113,9 @@ std::string randomEncoding(std::string_view fullName, Random& random) {
   return message->SerializeAsString();
 }
 
+namespace {
+
+// Whether the message or one in it holds unknown fields.
 bool hasUnknownFields(const Message& message) {
   const auto& reflection = *message.GetReflection();
   if (!reflection.GetUnknownFields(message).empty()) return true;
@@ -128,6 +132,55 @@ bool hasUnknownFields(const Message& message) {
     }
   }
   return false;
+}
+
+// The one known difference: the official code drops the bits above 2^32 of a tag of five bytes, where we
+// refuse it. Clears those bits in the tag that the error points to; answers whether there were any.
+bool clearExcessBits(std::string& bytes, const DecodeError& error) {
+  constexpr std::size_t lastByte = 4;
+  if (error.cause != DecodeCause::malformedTag || bytes.size() - error.offset <= lastByte) return false;
+  for (std::size_t at = 0; at < lastByte; ++at) {
+    if (static_cast<signed char>(bytes[error.offset + at]) >= 0) return false;
+  }
+  char& last = bytes[error.offset + lastByte];
+  if (static_cast<signed char>(last) < 0x10) return false;
+  last = static_cast<char>(last & 0xF);
+  return true;
+}
+
+}  // namespace
+
+OfficialVerdict readBesideOfficial(const AnyMessage& type, std::string_view input, bool isDescribed) {
+  const auto official = newOfficial(type.fullName());
+  OfficialVerdict verdict{.isAccepted =
+                              official->ParseFromArray(input.data(), static_cast<int>(input.size()))};
+  auto message = type.parse(input);
+  if (message.has_value() != verdict.isAccepted) {
+    std::string bytes(input);
+    while (!message && clearExcessBits(bytes, message.error())) message = type.parse(bytes);
+  }
+  if (message.has_value() != verdict.isAccepted) {
+    verdict.fault =
+        message ? "it is refused by the other" : "it is accepted by the other: " + message.error().message();
+    return verdict;
+  }
+  if (!verdict.isAccepted) return verdict;
+
+  const std::string encoded = (*message)->serialize().value();
+  const std::string officiallyEncoded = official->SerializeAsString();
+  if (encoded != officiallyEncoded) {
+    // Ours keeps unknown fields as they came; the official code spells them the shortest way.
+    const auto again = newOfficial(type.fullName());
+    if (!hasUnknownFields(*official)) {
+      verdict.fault = "its encoding is another";
+    } else if (!again->ParseFromString(encoded) || again->SerializeAsString() != officiallyEncoded) {
+      verdict.fault = "its encoding holds something else";
+    }
+  }
+  if (isDescribed && !hasUnknownFields(*official) &&
+      (*message)->debugDescription() != official->DebugString())
+    verdict.fault = "its description is another";
+  return verdict;
 }
 
 }  // namespace orv::test

@@ -8,6 +8,7 @@
 #include <string>
 #include <string_view>
 
+#include "tests/testing/any_message.hpp"
 #include "tests/testing/random.hpp"
 
 namespace orv::test {
@@ -21,7 +22,12 @@ void fillRandomly(google::protobuf::Message& message, Random& random);
 // The encoding of a random message. No two texts in it are canonically equivalent unless they are the same.
 std::string randomEncoding(std::string_view fullName, Random& random);
 
-// Whether the message or one in it holds unknown fields.
-bool hasUnknownFields(const google::protobuf::Message& message);
+// What both implementations make of the same bytes: the same verdict, encoding, unknown fields and, when wanted,
+// description; or else the fault.
+struct OfficialVerdict {
+  bool isAccepted = false;
+  std::string fault{};
+};
+OfficialVerdict readBesideOfficial(const AnyMessage& type, std::string_view input, bool isDescribed = true);
 
 }  // namespace orv::test

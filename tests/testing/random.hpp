@@ -18,6 +18,11 @@ class Random {
     std::cout << "random choices of ORV_TEST_SEED=" << seed << '\n';
   }
 
+  // A number that the environment gives, or the other one.
+  static std::uint64_t fromEnvironment(const char* name, std::uint64_t otherwise) {
+    const char* const value = std::getenv(name);
+    return value == nullptr ? otherwise : std::strtoull(value, nullptr, 10);
+  }
   // How many rounds a random test runs: ORV_TEST_ROUNDS, or what the test gives.
   static std::size_t rounds(std::size_t enough) {
     return static_cast<std::size_t>(fromEnvironment("ORV_TEST_ROUNDS", enough));
@@ -37,11 +42,6 @@ class Random {
   }
 
  private:
-  static std::uint64_t fromEnvironment(const char* name, std::uint64_t otherwise) {
-    const char* const value = std::getenv(name);
-    return value == nullptr ? otherwise : std::strtoull(value, nullptr, 10);
-  }
-
   std::mt19937_64 engine_;
 };
 

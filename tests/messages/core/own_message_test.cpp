@@ -1,39 +1,12 @@
-// A message that is not one of the protocol's, with what none of those has: a nested message that holds a
-// oneof, a list of such, and a number of two bytes.
+// Messages that are not the protocol's.
 #include <gtest/gtest.h>
 
-#include <orv/group.hpp>
-#include <orv/instantiate.hpp>
+#include <orv/binary_decoder.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
+#include "tests/testing/nested_messages.hpp"
 
-namespace orv {
-namespace test {
-
-class Wrapper final : public Message<Wrapper> {
- public:
-  static constexpr std::string_view protoMessageName = "test.Wrapper";
-
-  Wrapper() noexcept {}
-
- private:
-  friend Message;
-  std::optional<Group> group_;
-  std::vector<Group> groups_;
-  Text name_;
-
-  static constexpr std::tuple fields{
-      field<&Wrapper::group_>(1, "group"),
-      field<&Wrapper::groups_>(2, "groups"),
-      field<&Wrapper::name_>(2047, "name"),
-  };
-};
-
-}  // namespace test
-
-template class Message<test::Wrapper>;
-
-namespace test {
+namespace orv::test {
 namespace {
 
 TEST(OwnMessage, IsReadWrittenComparedAndNamedByItsTable) {
@@ -105,5 +78,4 @@ TEST(OwnMessage, AsksTheHookAboutAOneofInAMessageThatComesAgain) {
 }
 
 }  // namespace
-}  // namespace test
-}  // namespace orv
+}  // namespace orv::test

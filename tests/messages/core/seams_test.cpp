@@ -4,7 +4,9 @@
 #include <algorithm>
 
 #include <orv/orv.hpp>
+#include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
+#include "tests/testing/official.hpp"
 #include "tests/testing/scripted_decoder.hpp"
 #include "tests/testing/tracing_visitor.hpp"
 
@@ -41,30 +43,57 @@ TEST(CustomDecoder, IsAskedForEachFieldAndForTheHookAfterTheReading) {
                                   approved, next,     "string", next, hook,   next, denied, next}));
 }
 
+// The fields of an encoding, as a script.
+Fields scriptOf(const MessageDescriptor* type, std::string_view bytes) {
+  Fields fields;
+  const UnknownStorage records = UnknownStorage::checked(std::as_bytes(std::span(bytes))).value();
+  for (const UnknownField& record : records) {
+    ScriptedField& scripted = fields.emplace_back(record.tag.fieldNumber());
+    const FieldDescriptor* const field = type->field(scripted.number);
+    WireReader reader(record.value);
+    if (field == nullptr) continue;
+    if (record.tag.wireType() == WireType::varint) {
+      scripted.value = static_cast<std::int64_t>(reader.readVarint().value());
+    } else if (record.tag.wireType() == WireType::lengthDelimited) {
+      const auto body = reader.readLengthDelimited().value();
+      const std::string_view contents(reinterpret_cast<const char*>(body.data()), body.size());
+      if (field->type == ValueType::message) {
+        scripted.value = scriptOf(field->message, contents);
+      } else {
+        scripted.value = std::string(contents);
+      }
+    }
+  }
+  return fields;
+}
+
 TEST(CustomDecoder, EndsTheDecodingWithTheErrorOfItsNthCall) {
-  const Fields fields{
-      {1, "a"}, {3, Fields{}}, {4, Fields{{2, "b"}, {2, "c"}, {3, "u"}}}, {4, Fields{{1, "s"}, {7, 1}}},
-      {1, "d"}, {3, Fields{}}};
-  const auto play = [&](std::size_t count, Journal& journal, JoinResponse::Content& content) {
-    ScriptedDecoder decoder(std::span<const ScriptedField>(fields).first(count), journal);
-    return content.decodeMessage(decoder);
-  };
-  Journal complete;
-  JoinResponse::Content whole;
-  ASSERT_TRUE(play(fields.size(), complete, whole));
-  for (std::size_t call = 0; call < complete.calls.size(); ++call) {
-    SCOPED_TRACE("call " + std::to_string(call) + ", " + complete.calls[call]);
-    Journal journal{.failingCall = call};
-    JoinResponse::Content content;
-    const auto result = play(fields.size(), journal, content);
-    ASSERT_FALSE(result);
-    EXPECT_EQ(result.error(), journal.error);
-    EXPECT_EQ(journal.calls.size(), call + 1);
-    // The field that failed leaves nothing behind, those before it are there.
-    Journal other;
-    JoinResponse::Content before;
-    ASSERT_TRUE(play(journal.fieldsDone, other, before));
-    EXPECT_EQ(content, before);
+  Random random;
+  for (const MessagePointer& type : allMessages()) {
+    const std::string bytes =
+        randomEncoding(type->fullName(), random) + randomEncoding(type->fullName(), random);
+    const Fields fields = scriptOf(&type->descriptor(), bytes);
+    const auto play = [&](std::size_t count, Journal& journal, AnyMessage& message) {
+      ScriptedDecoder decoder(std::span<const ScriptedField>(fields).first(count), journal);
+      return message.decode(decoder);
+    };
+    Journal complete;
+    ASSERT_TRUE(play(fields.size(), complete, *type->copied()));
+    for (std::size_t call = 0; call < complete.calls.size(); ++call) {
+      SCOPED_TRACE(std::string(type->fullName()) + ", call " + std::to_string(call) + ", " +
+                   complete.calls[call]);
+      Journal journal{.failingCall = call};
+      const MessagePointer message = type->copied();
+      const auto result = play(fields.size(), journal, *message);
+      ASSERT_FALSE(result);
+      EXPECT_EQ(result.error(), journal.error);
+      EXPECT_EQ(journal.calls.size(), call + 1);
+      // The field that failed leaves nothing behind, those before it are there.
+      Journal other;
+      const MessagePointer before = type->copied();
+      ASSERT_TRUE(play(journal.fieldsDone, other, *before));
+      EXPECT_EQ(*message, *before);
+    }
   }
 }
 
@@ -164,15 +193,20 @@ TEST(CustomVisitor, IsHandedWhatIsToBeEmittedInAscendingOrder) {
 }
 
 TEST(CustomVisitor, EndsTheWalkWithTheErrorOfItsNthVisit) {
-  const Group group =
-      Group::parse(hex("0A 11 0A 01 41 12 05 0A 01 61 18 01 12 03 12 01 74 20 01 28 02")).value();
-  const Calls all = visitsOf(group);
-  ASSERT_EQ(all.size(), 8U);
-  for (std::size_t count = 0; count < all.size(); ++count) {
-    const auto error = std::make_shared<int>();
-    TracingVisitor visitor(count, error);
-    EXPECT_EQ(group.traverse(visitor), std::unexpected(TracingVisitor::Error(error)));
-    EXPECT_EQ(visitor.visits(), Calls(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(count)));
+  Random random;
+  for (const MessagePointer& type : allMessages()) {
+    const MessagePointer message =
+        type->parse(randomEncoding(type->fullName(), random) + hex("F8 00 01")).value();
+    TracingVisitor complete;
+    ASSERT_TRUE(message->traverse(complete));
+    const Calls& all = complete.visits();
+    for (std::size_t count = 0; count < all.size(); ++count) {
+      SCOPED_TRACE(std::string(type->fullName()) + ", visit " + std::to_string(count) + ", " + all[count]);
+      const auto error = std::make_shared<int>();
+      TracingVisitor visitor(count, error);
+      EXPECT_EQ(message->traverse(visitor), std::unexpected(TracingVisitor::Error(error)));
+      EXPECT_EQ(visitor.visits(), Calls(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(count)));
+    }
   }
 }
 
