@@ -27,19 +27,6 @@ struct MessageType {
   bool isEnvelope() const { return descriptor == &SessionMessage::descriptor(); }
 };
 
-// How values of a type travel, each with a tag of its own.
-constexpr WireType wireTypeOf(ValueType type) {
-  switch (type) {
-    case ValueType::boolean:
-    case ValueType::uint32:
-    case ValueType::enumeration: return WireType::varint;
-    case ValueType::string:
-    case ValueType::bytes:
-    case ValueType::message: break;
-  }
-  return WireType::lengthDelimited;
-}
-
 std::span<const MessageType> allMessageTypes();
 
 const MessageType& typeOf(const MessageDescriptor& descriptor);
