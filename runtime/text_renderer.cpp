@@ -152,6 +152,7 @@ class TextRenderer::UnknownFieldsRenderer {
 
   // Takes back what it wrote if the bytes turn out not to be a message.
   bool renderAsMessage(std::string_view name, std::span<const std::byte> body, int levelsLeft) {
+    if (renderer_.isCut_) return true;  // either way nothing is written
     if (body.empty() || levelsLeft <= 0) return false;
     if (renderer_.style_.isReversible && !isReversible(body)) return false;
     LenientReader input(body);
@@ -159,7 +160,10 @@ class TextRenderer::UnknownFieldsRenderer {
     renderer_.open(name);
     const bool isMessage = renderRecords(input, {levelsLeft - 1, levelsLeft});
     renderer_.close();
-    if (!isMessage) renderer_.output_.resize(sizeBefore);
+    if (!isMessage) {
+      renderer_.output_.resize(sizeBefore);
+      renderer_.isCut_ = false;
+    }
     return isMessage;
   }
 
@@ -173,15 +177,30 @@ class TextRenderer::UnknownFieldsRenderer {
 };
 
 void TextRenderer::startLine(std::string_view name) {
+  if (isCut_) return;
   if (!style_.isOneLine) output_.append(indentation_, ' ');
   output_ += name;
 }
 
-void TextRenderer::endLine() { output_ += style_.isOneLine ? ' ' : '\n'; }
+void TextRenderer::endLine() {
+  if (isCut_) return;
+  output_ += style_.isOneLine ? ' ' : '\n';
+  cutIfTooLong();
+}
+
+void TextRenderer::cutIfTooLong() {
+  if (output_.size() - start_ <= style_.maximumSizeInBytes) return;
+  std::size_t end = start_ + style_.maximumSizeInBytes;
+  const auto isInsideCharacter = [&] { return (static_cast<unsigned char>(output_[end]) & 0xC0) == 0x80; };
+  while (end > start_ && isInsideCharacter()) --end;
+  output_.resize(end);
+  output_ += "…";
+  isCut_ = true;
+}
 
 void TextRenderer::open(std::string_view name) {
   startLine(name);
-  output_ += " {";
+  if (!isCut_) output_ += " {";
   endLine();
   indentation_ += 2;
 }
@@ -193,6 +212,7 @@ void TextRenderer::close() {
 }
 
 TextRenderer::Result TextRenderer::plain(std::string_view name, std::string_view value) {
+  if (isCut_) return {};
   startLine(name);
   output_ += ": ";
   output_ += value;
@@ -201,6 +221,7 @@ TextRenderer::Result TextRenderer::plain(std::string_view name, std::string_view
 }
 
 TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_view bytes) {
+  if (isCut_) return {};
   startLine(name);
   output_ += ": ";
   appendQuoted(bytes);
@@ -218,6 +239,8 @@ void TextRenderer::appendQuoted(std::string_view bytes) {
     output_.resize_and_overwrite(before + longestEscape * piece.size(), [&](char* output, std::size_t) {
       return static_cast<std::size_t>(writeEscaped(piece, output + before) - output);
     });
+    cutIfTooLong();
+    if (isCut_) return;
   }
   output_ += '"';
 }
@@ -225,6 +248,7 @@ void TextRenderer::appendQuoted(std::string_view bytes) {
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
   UnknownFieldsRenderer renderer(*this);
   for (const UnknownField& field : unknownFields) {
+    if (isCut_) return {};
     if (style_.hidesSecrets) {
       (void)redacted(std::to_string(field.tag.fieldNumber()));
       continue;
@@ -232,7 +256,7 @@ TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unkn
     const std::size_t start = output_.size();
     LenientReader input(field.record);
     (void)renderer.renderRecords(input, {unknownLevels, internal::maximumNesting});
-    if (style_.isReversible && !isDescribed(field)) {
+    if (style_.isReversible && !isCut_ && !isDescribed(field)) {
       makeComment(start);
       (void)quoted("[records]", charactersOf(field.record));
     }

@@ -12,8 +12,8 @@ namespace orv::inline v0 {
 
 // What a BinaryDecoder asks when a oneof member arrives while its group already holds a case. It is asked,
 // too, when the record of the case that is held has another wire type and changes nothing. It refers to a
-// callable object that returns std::expected<void, DecodeError>, throws nothing and outlives it. An error
-// refuses the member and ends the decoding; it reaches the caller as it was made.
+// callable object that returns std::expected<void, DecodeError> and outlives it. An error refuses the member and
+// ends the decoding; it reaches the caller as it was made. An exception leaves what memory that runs out does.
 class ConflictHook {
  public:
   // Accepts: the member read last wins.

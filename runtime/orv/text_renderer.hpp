@@ -3,6 +3,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <limits>
 #include <string>
 #include <string_view>
 
@@ -22,6 +23,8 @@ struct TextStyle {
   // a length-delimited one is a message only if that is so; records that their text does not describe in full,
   // groups and overlong spellings, stand as `[records]: "…"`, below their text in comments.
   bool isReversible = false;
+  // A text of more bytes is cut there, between characters, and ends in "…". What lies beyond costs no memory.
+  std::size_t maximumSizeInBytes = std::numeric_limits<std::size_t>::max();
 };
 
 // A visitor that writes the text format of Protocol Buffers (protobuf.dev, "Text Format"), a field a line.
@@ -30,14 +33,20 @@ struct TextStyle {
 class TextRenderer : public AnyValueVisitor<TextRenderer> {
  public:
   // Appends to `output`.
-  explicit TextRenderer(std::string& output, TextStyle style = {}) : output_(output), style_(style) {}
+  explicit TextRenderer(std::string& output, TextStyle style = {})
+      : output_(output), start_(output.size()), style_(style) {}
+
+  // Whether the text was longer than the style allows.
+  bool isCut() const { return isCut_; }
 
   template <class T>
   Result visitAnyValue(const T& value, std::uint32_t number) {
+    if (isCut_) return {};
     return hides(number) ? redacted(fieldName(number)) : write(fieldName(number), value);
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
+    if (isCut_) return {};
     if (hides(number)) return redacted(fieldName(number));
     open(fieldName(number));
     (void)walkNested(message);
@@ -71,11 +80,14 @@ class TextRenderer : public AnyValueVisitor<TextRenderer> {
   Result quoted(std::string_view name, std::string_view bytes);
   void appendQuoted(std::string_view bytes);
   void makeComment(std::size_t start);
+  void cutIfTooLong();
 
   class UnknownFieldsRenderer;
 
   std::string& output_;
+  std::size_t start_;  // of what is written, in the output
   TextStyle style_;
+  bool isCut_ = false;  // nothing more is written
   std::size_t indentation_ = 0;
 };
 

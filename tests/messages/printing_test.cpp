@@ -5,7 +5,9 @@
 #include <sstream>
 
 #include <orv/orv.hpp>
+#include <orv/text_renderer.hpp>
 #include "tests/testing/any_message.hpp"
+#include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/official.hpp"
 
@@ -126,6 +128,75 @@ TEST(Printing, KeepsSecretsOutOfLogs) {
   };
   for (const auto& row : cases)
     EXPECT_EQ(messageNamed(row.message).parse(hex(row.input)).value()->redactedDescription(), row.log);
+}
+
+TEST(Printing, CutsWhatIsTooLongAndLetsItCostNothing) {
+  const std::string unknownBody = record(9, repeated(hex("08 01"), 100) + "\x07");
+  const std::string cases[] = {
+      "",
+      hex("0A 0A 12 05 0A 01 61 18 01 0A 01 62"),       // a text, a member, unknown fields in it
+      hex("0A 06 12 02 0A 00 12 00 2B 33 34 2C"),       // lists, groups
+      unknownBody + hex("48 01"),                       // unknown bytes, taken for a message up to their end
+      record(9, record(1, "\x08\x01") + hex("10 02")),  // and those that are one
+      record(1, record(1, std::string(10'000, 'x'))),
+  };
+  for (const std::string& bytes : cases) {
+    SCOPED_TRACE(toHex(bytes.substr(0, 100)));
+    const Group group = Group::parse(bytes).value();
+    for (const bool isOneLine : {false, true}) {
+      const auto rendered = [&](std::size_t maximum) {
+        std::string text = "before ";
+        TextRenderer renderer(text, {.isOneLine = isOneLine, .maximumSizeInBytes = maximum});
+        EXPECT_TRUE(group.traverse(renderer));
+        EXPECT_EQ(renderer.isCut(), text.ends_with("…"));
+        return text.substr(7);
+      };
+      const std::string whole = rendered(SIZE_MAX);
+      const std::size_t step = whole.size() > 1000 ? 997 : 1;
+      for (std::size_t maximum = 0; maximum < whole.size(); maximum += step)
+        EXPECT_EQ(rendered(maximum), whole.substr(0, maximum) + "…");
+      EXPECT_EQ(rendered(whole.size()), whole);
+    }
+  }
+}
+
+// Values are escaped; only the names of one's own messages may be other than ASCII.
+class OwnMessage final : public Message<OwnMessage> {
+ public:
+  static constexpr std::string_view protoMessageName = "test.OwnMessage";
+
+ private:
+  friend Message;
+  bool flag_ = true;
+  static constexpr std::tuple fields{field<&OwnMessage::flag_>(1, "f\u00FCr")};
+};
+
+TEST(Printing, CutsBetweenCharacters) {
+  struct Renderer : TextRenderer {
+    using TextRenderer::TextRenderer;
+  };
+  for (const auto& [maximum, expected] : {std::pair(1U, "f…"), {2U, "f…"}, {3U, "f\u00FC…"}}) {
+    std::string text;
+    Renderer renderer(text, {.maximumSizeInBytes = maximum});
+    EXPECT_TRUE(OwnMessage().traverse(renderer));
+    EXPECT_EQ(text, expected);
+  }
+}
+
+TEST(Printing, KeepsLogsShort) {
+  // Unknown groups 100 deep cost most, where secrets need not be hidden.
+  const std::string bytes =
+      repeated(hex("2B*100 2C*100"), 5'000) + repeated(hex("0A 05 12 03 0A 01 61"), 100'000);
+  const Group group = Group::parse(bytes).value();
+  const HeapMeter meter;
+  const auto expectCut = [](std::string_view line, std::size_t size) {
+    EXPECT_EQ(line.size(), std::string_view("orv.Group { …").size() + size);
+    EXPECT_TRUE(line.starts_with("orv.Group { ") && line.ends_with("…"));
+  };
+  expectCut(printed(group), longestLine);
+  expectCut(group.redactedDescription(), longestLine);
+  expectCut(group.redactedDescription(100), 100);
+  EXPECT_LT(meter.peakBytes(), 400'000U);
 }
 
 }  // namespace

@@ -94,7 +94,8 @@ std::string lineOf(const M& message, TextStyle style) {
   std::string line = std::string(M::protoMessageName) + " { ";
   TextRenderer renderer(line, style);
   (void)message.traverse(renderer);
-  return line += '}';
+  if (!renderer.isCut()) line += '}';
+  return line;
 }
 
 // The walk over a whole message, once for each type. Answers the encoding's size, or that it does not fit.
@@ -173,12 +174,13 @@ std::string Message<M>::debugDescription() const {
 
 template <class M>
 void Message<M>::print(std::ostream& out) const {
-  internal::print(out, internal::lineOf(self(), {.isOneLine = true}));
+  internal::print(out, internal::lineOf(self(), {.isOneLine = true, .maximumSizeInBytes = longestLine}));
 }
 
 template <class M>
-std::string Message<M>::redactedDescription() const {
-  return internal::lineOf(self(), {.isOneLine = true, .hidesSecrets = true});
+std::string Message<M>::redactedDescription(std::size_t maximumSizeInBytes) const {
+  return internal::lineOf(
+      self(), {.isOneLine = true, .hidesSecrets = true, .maximumSizeInBytes = maximumSizeInBytes});
 }
 
 template <class M>

@@ -42,6 +42,9 @@ class Step;
 struct OutermostFrame;
 }
 
+// How many bytes of a message stand on one line, for a log, unless told otherwise.
+inline constexpr std::size_t longestLine = std::size_t{64} << 10;
+
 // The base of every message type M: a regular value that owns all that it holds. M adds its full name, its
 // accessors, its storage and, in a private table `fields`, one row per field in ascending order of the
 // numbers; everything here derives from that table. M's constructor is best written empty, `M() noexcept {}`:
@@ -116,15 +119,16 @@ class Message {
   // The message in the text format of Protocol Buffers, a field a line, unknown fields by number.
   std::string debugDescription() const;
 
-  // The same on one line behind the full name: `orv.Member { handle: "anna@tablet" tokenID: "t1" }`.
+  // The same on one line behind the full name: `orv.Member { handle: "anna@tablet" tokenID: "t1" }`. More than
+  // longestLine bytes of fields are cut there, and end in "…".
   friend std::ostream& operator<<(std::ostream& out, const M& message) {
     message.Message::print(out);
     return out;
   }
 
   // For logs: on one line as well, with `<redacted>` for the values of the fields that are secret by M's table,
-  // and of the unknown ones, of which nobody knows.
-  std::string redactedDescription() const;
+  // and of the unknown ones, of which nobody knows. Cut as well.
+  std::string redactedDescription(std::size_t maximumSizeInBytes = longestLine) const;
 
   // Reads a message from its binary encoding, the whole of `bytes`.
   [[nodiscard]] static std::expected<M, DecodeError> parse(ByteView bytes);
