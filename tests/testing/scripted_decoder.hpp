@@ -32,6 +32,7 @@ struct Journal {
   std::vector<std::string> calls{};
   std::size_t fieldsDone = 0;  // of the outermost message
   std::size_t failingCall = SIZE_MAX;
+  bool throws = false;  // the error, in place of answering it
   bool refusesConflicts = false;
   ScriptedError error = std::make_shared<int>();
 };
@@ -96,8 +97,9 @@ class ScriptedDecoder {
  private:
   Result note(std::string call) {
     journal_.calls.push_back(std::move(call));
-    if (journal_.calls.size() - 1 == journal_.failingCall) return std::unexpected(journal_.error);
-    return {};
+    if (journal_.calls.size() - 1 != journal_.failingCall) return {};
+    if (journal_.throws) throw journal_.error;
+    return std::unexpected(journal_.error);
   }
 
   template <class Value>

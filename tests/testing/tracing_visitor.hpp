@@ -18,8 +18,9 @@ class TracingVisitor {
   using Error = std::shared_ptr<const int>;
   using Result = std::expected<void, Error>;
 
-  explicit TracingVisitor(std::size_t failingVisit = SIZE_MAX, Error error = nullptr)
-      : failingVisit_(failingVisit), error_(std::move(error)) {}
+  // Answers the error at that visit, or throws it.
+  explicit TracingVisitor(std::size_t failingVisit = SIZE_MAX, Error error = nullptr, bool throws = false)
+      : failingVisit_(failingVisit), error_(std::move(error)), throws_(throws) {}
 
   const std::vector<std::string>& visits() const { return visits_; }
 
@@ -62,7 +63,10 @@ class TracingVisitor {
 
  private:
   Result note(std::uint32_t number, const std::string& what) {
-    if (visits_.size() == failingVisit_) return std::unexpected(error_);
+    if (visits_.size() == failingVisit_) {
+      if (throws_) throw error_;
+      return std::unexpected(error_);
+    }
     visits_.push_back(std::to_string(number) + " " + what);
     return {};
   }
@@ -70,6 +74,7 @@ class TracingVisitor {
   std::vector<std::string> visits_;
   std::size_t failingVisit_;
   Error error_;
+  bool throws_;
 };
 
 static_assert(Visitor<TracingVisitor>);
