@@ -82,7 +82,8 @@ class Conversion final : public MessageWork {
       spelling::appendBase64(input.encoding(), bytes);
       addMember("bytes", bytes);
     }
-    return document + '\n';
+    document += '\n';
+    return document;
   }
 
   // What is no field is a comment.
