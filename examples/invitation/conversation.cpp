@@ -76,7 +76,7 @@ Outcome<orv::envelope::Payload> Conversation::receivePayload(const std::string& 
   if (!payload) return fault(payload.error().message(), due);
   const auto words = std::visit([](const auto& carried) { return inWords(carried); }, *payload);
   narrator_.tell("receives", orv::envelope::nameOf((*message)->type()), words);
-  received_ = std::move(**message);
+  received_ = **message;
   return std::move(*payload);
 }
 

@@ -12,9 +12,9 @@ namespace orv::tool {
 namespace {
 
 // A row, or as many as it takes, for each record.
-class TextRenderer final : public Renderer {
+class DumpRenderer final : public Renderer {
  public:
-  explicit TextRenderer(const Options& options)
+  explicit DumpRenderer(const Options& options)
       : options_(options), layout_(terminalWidth(descriptor()), Palette(options.colour, descriptor())) {}
 
   void beginMessage(const ExplainedMessage& message) override {
@@ -82,7 +82,7 @@ class TextRenderer final : public Renderer {
 }  // namespace
 
 std::unique_ptr<Renderer> makeTextRenderer(const Options& options) {
-  return std::make_unique<TextRenderer>(options);
+  return std::make_unique<DumpRenderer>(options);
 }
 
 }  // namespace orv::tool
