@@ -98,7 +98,9 @@ class ScriptedDecoder {
   Result note(std::string call) {
     journal_.calls.push_back(std::move(call));
     if (journal_.calls.size() - 1 != journal_.failingCall) return {};
+#ifdef __cpp_exceptions
     if (journal_.throws) throw journal_.error;
+#endif
     return std::unexpected(journal_.error);
   }
 

@@ -64,7 +64,9 @@ class TracingVisitor {
  private:
   Result note(std::uint32_t number, const std::string& what) {
     if (visits_.size() == failingVisit_) {
+#ifdef __cpp_exceptions
       if (throws_) throw error_;
+#endif
       return std::unexpected(error_);
     }
     visits_.push_back(std::to_string(number) + " " + what);
