@@ -2,9 +2,11 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cstdint>
 #include <new>
 #include <string>
+#include <type_traits>
 
 #include <orv/utf8.hpp>
 
@@ -15,34 +17,83 @@ namespace {
 // Unlike memmove and memcpy, these take a null pointer where there is nothing to copy.
 using std::char_traits;
 
-// Copies bytes in three pieces of one size, which may overlap: the first, the last and, where these do not meet, the
-// one in between. `mayTake` is given all of their bits before any is stored; what it answers is the answer.
-template <class Word, std::size_t words>
-[[gnu::always_inline]] inline bool copyPieces(char* target, const char* source, std::size_t size,
-                                              auto mayTake) {
-  using Piece = std::array<Word, words>;
-  const std::array<std::size_t, 3> places{0, size > 2 * sizeof(Piece) ? sizeof(Piece) : 0,
-                                          size - sizeof(Piece)};
-  std::array<Piece, 3> pieces;
-  Word bits = 0;
-  for (std::size_t at = 0; at < places.size(); ++at) {
-    std::memcpy(&pieces[at], source + places[at], sizeof(Piece));
-    for (const Word word : pieces[at]) bits |= word;
+// Up to 39 bytes as an object holds them: zeros behind them, and their number in the last place. They are gathered in
+// registers and stored in the widths that a copy loads, since a load waits for narrower stores
+// (docs/decisions/inline-bytes.md).
+class Inside {
+ public:
+  // The bytes of all sizes with so many whole words.
+  template <std::size_t wholeWords>
+  [[gnu::always_inline]] Inside(const char* bytes, std::size_t size,
+                                std::integral_constant<std::size_t, wholeWords>) {
+    for (std::size_t at = 0; at < wholeWords; ++at) words_[at] = little(wordAt(bytes + sizeof(Word) * at));
+    if constexpr (wholeWords == 0) {
+      words_[0] =
+          size < 4 ? upToThree(bytes, size) : fourAt(bytes) | fourAt(bytes + size - 4) << (8 * (size - 4));
+    } else {
+      // What is behind the whole words is the end of the last eight bytes.
+      words_[wholeWords] =
+          little(wordAt(bytes + size - sizeof(Word))) >> 8 >> (56 - 8 * (size % sizeof(Word)));
+    }
+    words_.back() |= Word{size} << 56;
   }
-  if (!mayTake(bits)) return false;
-  for (std::size_t at = 0; at < places.size(); ++at)
-    std::memcpy(target + places[at], &pieces[at], sizeof(Piece));
-  return true;
-}
 
-// Copies up to objectSize bytes, which may overlap, without a call.
-[[gnu::always_inline]] inline bool copyShort(char* target, const char* source, std::size_t size,
-                                             auto mayTake) {
-  if (size >= 16) return copyPieces<std::uint64_t, 2>(target, source, size, mayTake);
-  if (size >= 8) return copyPieces<std::uint64_t, 1>(target, source, size, mayTake);
-  if (size >= 4) return copyPieces<std::uint32_t, 1>(target, source, size, mayTake);
-  if (size >= 1) return copyPieces<std::uint8_t, 1>(target, source, size, mayTake);
-  return true;
+  [[gnu::always_inline]] bool isAscii() const {
+    Word bits = 0;
+    for (const Word word : words_) bits |= word;
+    return (bits & highBits) == 0;
+  }
+  [[gnu::always_inline]] void store(void* target) const {
+    auto* const bytes = static_cast<char*>(target);
+#ifdef __SSE2__
+    const auto two = [&](std::size_t at) {
+      return _mm_set_epi64x(static_cast<long long>(words_[at + 1]), static_cast<long long>(words_[at]));
+    };
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(bytes), two(0));
+    _mm_storeu_si128(reinterpret_cast<__m128i*>(bytes + 16), two(2));
+    std::memcpy(bytes + 32, &words_[4], sizeof(Word));
+#else
+    std::array<Word, 5> words = words_;
+    for (Word& word : words) word = little(word);
+    std::memcpy(bytes, words.data(), sizeof words);
+#endif
+  }
+
+ private:
+  using Word = std::uint64_t;
+
+  // To and from a value whose lowest place is the first byte in memory.
+  template <class Unsigned>
+  static Unsigned little(Unsigned word) {
+    return std::endian::native == std::endian::little ? word : std::byteswap(word);
+  }
+  static Word fourAt(const char* bytes) {
+    std::uint32_t word;
+    std::memcpy(&word, bytes, sizeof word);
+    return little(word);
+  }
+  static Word upToThree(const char* bytes, std::size_t size) {
+    if (size == 0) return 0;
+    const auto placed = [&](std::size_t at) {
+      return Word{static_cast<unsigned char>(bytes[at])} << (8 * at);
+    };
+    return placed(0) | placed(size / 2) | placed(size - 1);
+  }
+
+  std::array<Word, 5> words_{};
+};
+
+// What `use` answers for up to 39 bytes as an object holds them. It is compiled for each number of whole words, which
+// keeps them in registers.
+[[gnu::always_inline]] inline bool asInside(std::string_view bytes, auto use) {
+  const auto with = [&]<std::size_t wholeWords>(std::integral_constant<std::size_t, wholeWords> whole) {
+    return use(Inside(bytes.data(), bytes.size(), whole));
+  };
+  if (bytes.size() >= 32) return with(std::integral_constant<std::size_t, 4>());
+  if (bytes.size() >= 24) return with(std::integral_constant<std::size_t, 3>());
+  if (bytes.size() >= 16) return with(std::integral_constant<std::size_t, 2>());
+  if (bytes.size() >= 8) return with(std::integral_constant<std::size_t, 1>());
+  return with(std::integral_constant<std::size_t, 0>());
 }
 
 char* allocate(std::size_t size) { return static_cast<char*>(::operator new(size)); }
@@ -62,8 +113,10 @@ void InlineBytes::assign(std::string_view bytes) {
       return;
     }
   } else if (bytes.size() <= inlineCapacity) {
-    copyShort(inlineData(), bytes.data(), bytes.size(), [](auto) { return true; });
-    raw_[tagOffset] = static_cast<unsigned char>(bytes.size());
+    asInside(bytes, [&](const Inside& inside) {
+      inside.store(raw_);
+      return true;
+    });
     return;
   }
   const Block block{allocate(bytes.size()), bytes.size(), bytes.size()};
@@ -73,17 +126,22 @@ void InlineBytes::assign(std::string_view bytes) {
 }
 
 bool InlineBytes::assignShortText(std::string_view text) {
-  const bool isWellFormed =
-      copyShort(isOnHeap() ? heapBlock().data : inlineData(), text.data(), text.size(), [&](auto bits) {
-        return (bits & static_cast<decltype(bits)>(highBits)) == 0 || utf8::isWellFormed(text);
-      });
-  if (!isWellFormed) return false;
-  if (isOnHeap()) {
-    setBlockSize(text.size());
-  } else {
-    raw_[tagOffset] = static_cast<unsigned char>(text.size());
-  }
-  return true;
+  return asInside(text, [&](const Inside& inside) {
+    if (!inside.isAscii()) {
+      std::array<std::byte, objectSize> bytes;
+      inside.store(bytes.data());
+      if (!utf8::isWellFormedWithin(bytes.data(), text.size())) return false;
+    }
+    if (isOnHeap()) [[unlikely]] {
+      // A block is larger than an object.
+      const Block block = heapBlock();
+      inside.store(block.data);
+      setBlockSize(text.size());
+    } else {
+      inside.store(raw_);
+    }
+    return true;
+  });
 }
 
 void InlineBytes::replace(std::string_view bytes) {
