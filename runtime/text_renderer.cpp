@@ -33,8 +33,9 @@ constexpr auto escapes = [] {
   return table;
 }();
 
-// Answers where it ended. There is room for the longest escape of each byte.
-char* writeEscaped(std::string_view bytes, char* target) {
+// These answer where they ended. There is room, for the longest escape of each byte.
+char* put(std::string_view characters, char* target) { return std::ranges::copy(characters, target).out; }
+char* putEscaped(std::string_view bytes, char* target) {
   for (const char character : bytes) {
     const auto byte = static_cast<unsigned char>(character);
     const char escape = escapes[byte];
@@ -176,20 +177,27 @@ class TextRenderer::UnknownFieldsRenderer {
   TextRenderer& renderer_;
 };
 
-void TextRenderer::startLine(std::string_view name) {
+// Appends what `write` puts into room for a line's indentation, name and end, and so many bytes more.
+void TextRenderer::append(std::string_view name, std::size_t room, auto write) {
   if (isCut_) return;
-  if (!style_.isOneLine) output_.append(indentation_, ' ');
-  output_ += name;
+  const std::size_t before = output_.size();
+  const std::size_t mostAdded = indentation() + name.size() + room + 1;
+  output_.resize_and_overwrite(before + mostAdded, [&](char* output, std::size_t) {
+    return static_cast<std::size_t>(write(output + before) - output);
+  });
+  if (output_.size() - start_ > style_.maximumSizeInBytes) cut();
 }
 
-void TextRenderer::endLine() {
-  if (isCut_) return;
-  output_ += style_.isOneLine ? ' ' : '\n';
-  cutIfTooLong();
+char* TextRenderer::startLine(std::string_view name, char* at) const {
+  return put(name, std::fill_n(at, indentation(), ' '));
 }
 
-void TextRenderer::cutIfTooLong() {
-  if (output_.size() - start_ <= style_.maximumSizeInBytes) return;
+char* TextRenderer::endLine(char* at) const {
+  *at = style_.isOneLine ? ' ' : '\n';
+  return at + 1;
+}
+
+void TextRenderer::cut() {
   std::size_t end = start_ + style_.maximumSizeInBytes;
   const auto isInsideCharacter = [&] { return (static_cast<unsigned char>(output_[end]) & 0xC0) == 0x80; };
   while (end > start_ && isInsideCharacter()) --end;
@@ -199,50 +207,35 @@ void TextRenderer::cutIfTooLong() {
 }
 
 void TextRenderer::open(std::string_view name) {
-  startLine(name);
-  if (!isCut_) output_ += " {";
-  endLine();
+  append(name, 2, [&](char* at) { return endLine(put(" {", startLine(name, at))); });
   indentation_ += 2;
 }
 
 void TextRenderer::close() {
   indentation_ -= 2;
-  startLine("}");
-  endLine();
+  append("}", 0, [&](char* at) { return endLine(startLine("}", at)); });
 }
 
 TextRenderer::Result TextRenderer::plain(std::string_view name, std::string_view value) {
-  if (isCut_) return {};
-  startLine(name);
-  output_ += ": ";
-  output_ += value;
-  endLine();
+  append(name, 2 + value.size(),
+         [&](char* at) { return endLine(put(value, put(": ", startLine(name, at)))); });
   return {};
 }
 
 TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_view bytes) {
-  if (isCut_) return {};
-  startLine(name);
-  output_ += ": ";
-  appendQuoted(bytes);
-  endLine();
-  return {};
-}
-
-void TextRenderer::appendQuoted(std::string_view bytes) {
-  // Piece by piece, so that the room for the longest escapes is never much more than the text takes.
+  // Long ones piece by piece, so that the room for the longest escapes is never much more than the text takes.
   constexpr std::size_t pieceSize = 4096;
-  output_ += '"';
-  for (; !bytes.empty(); bytes.remove_prefix(std::min(bytes.size(), pieceSize))) {
-    const std::string_view piece = bytes.substr(0, pieceSize);
-    const std::size_t before = output_.size();
-    output_.resize_and_overwrite(before + longestEscape * piece.size(), [&](char* output, std::size_t) {
-      return static_cast<std::size_t>(writeEscaped(piece, output + before) - output);
+  std::size_t done = 0;
+  do {
+    const std::string_view piece = bytes.substr(done, pieceSize);
+    append(name, longestEscape * piece.size() + 4, [&](char* at) {
+      if (done == 0) at = put(": \"", startLine(name, at));
+      at = putEscaped(piece, at);
+      return done + piece.size() == bytes.size() ? endLine(put("\"", at)) : at;
     });
-    cutIfTooLong();
-    if (isCut_) return;
-  }
-  output_ += '"';
+    done += piece.size();
+  } while (done < bytes.size() && !isCut_);
+  return {};
 }
 
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {
@@ -270,8 +263,7 @@ void TextRenderer::makeComment(std::size_t start) {
   output_.resize(start);
   for (std::size_t at = 0; at < lines.size();) {
     const std::size_t end = std::min(lines.find('\n', at), lines.size() - 1) + 1;
-    startLine("# ");
-    output_ += std::string_view(lines).substr(at + indentation_, end - at - indentation_);
+    output_.append(indentation_, ' ').append("# ").append(lines, at + indentation_, end - at - indentation_);
     at = end;
   }
 }

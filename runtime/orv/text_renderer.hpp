@@ -72,15 +72,17 @@ class TextRenderer : public AnyValueVisitor<TextRenderer> {
   }
   Result redacted(std::string_view name) { return plain(name, "<redacted>"); }
 
-  void startLine(std::string_view name);
   void open(std::string_view name);
   void close();
-  void endLine();
   Result plain(std::string_view name, std::string_view value);
   Result quoted(std::string_view name, std::string_view bytes);
-  void appendQuoted(std::string_view bytes);
   void makeComment(std::size_t start);
-  void cutIfTooLong();
+
+  void append(std::string_view name, std::size_t room, auto write);
+  char* startLine(std::string_view name, char* at) const;
+  char* endLine(char* at) const;
+  std::size_t indentation() const { return style_.isOneLine ? 0 : indentation_; }
+  void cut();
 
   class UnknownFieldsRenderer;
 
