@@ -12,7 +12,7 @@
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_limits.hpp>
-#include <orv/delimited_stream.hpp>
+#include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {
 
@@ -42,12 +42,8 @@ class DelimitedParser {
   // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>
   [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
-    const auto bytes = next();
-    if (!bytes) return std::unexpected(bytes.error());
-    if (!bytes->has_value()) return std::nullopt;
-    auto message = M::parse(**bytes, limits_);
-    if (!message) return std::unexpected(malformedMessage(message.error()));
-    return std::move(*message);
+    auto bytes = next();
+    return decoded<M>(std::move(bytes));
   }
 
   // To be asked where the stream has ended and every message is popped: whether it ended between two messages.
@@ -58,6 +54,18 @@ class DelimitedParser {
   std::uint64_t messageOffset() const { return messageOffset_; }
 
  private:
+  friend class DelimitedReader;
+  using Bytes = std::expected<std::optional<std::span<const std::byte>>, StreamError>;
+
+  // The message that next answered.
+  template <class M>
+  std::expected<std::optional<M>, StreamError> decoded(Bytes bytes) const {
+    if (!bytes) return std::unexpected(std::move(bytes.error()));
+    if (!bytes->has_value()) return std::nullopt;
+    auto message = M::parse(**bytes, limits_);
+    if (!message) return std::unexpected(malformedMessage(message.error()));
+    return std::move(*message);
+  }
   std::span<const std::byte> waiting() const { return {buffer_.get() + begin_, end_ - begin_}; }
   void makeRoom(std::size_t size);
   std::unexpected<StreamError> fail(StreamError::Cause cause, std::uint64_t length = 0);

@@ -5,7 +5,6 @@
 #include <cstdint>
 #include <expected>
 #include <functional>
-#include <iosfwd>
 #include <memory>
 #include <optional>
 #include <span>
@@ -13,10 +12,10 @@
 #include <string_view>
 #include <utility>
 
-#include <orv/decode_error.hpp>
 #include <orv/decode_limits.hpp>
+#include <orv/delimited_parser.hpp>
 #include <orv/encode_error.hpp>
-#include <orv/internal/bad_access.hpp>
+#include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {
 
@@ -28,37 +27,6 @@ using ReadFunction = std::move_only_function<std::ptrdiff_t(std::span<std::byte>
 #else  // libc++ 19
 using ReadFunction = std::function<std::ptrdiff_t(std::span<std::byte>)>;
 #endif
-
-// Why no message could be read from a stream.
-struct StreamError {
-  enum class Cause : std::uint8_t {
-    readFailed,        // the read function answered a negative number, or more than there was room for
-    truncated,         // the stream ends inside a length or a message
-    malformedLength,   // a length of 2^31 or more, or spelled in more than five bytes
-    tooLarge,          // a length above the reader's limit
-    malformedMessage,  // decodeError says why
-  };
-
-  Cause cause;
-  // Where in the stream the piece begins that could not be read.
-  std::uint64_t offset = 0;
-  // For tooLarge: the length that the stream announces.
-  std::uint64_t length = 0;
-  // For malformedMessage; its own offset counts from the message's first byte.
-  std::optional<DecodeError> decodeError{};
-
-  // What is wrong, without path and offset: "the stream ends inside a message".
-  std::string reason() const;
-  // All of it: "the stream ends inside a message, at byte 12".
-  std::string message() const;
-
-  friend bool operator==(const StreamError&, const StreamError&) = default;
-  friend std::ostream& operator<<(std::ostream& out, const StreamError& error);
-};
-
-// A sentence without its full stop. It lasts as long as the program.
-std::string_view describe(StreamError::Cause cause);
-std::ostream& operator<<(std::ostream& out, StreamError::Cause cause);
 
 // Reads one message after the other. Memory grows with the bytes that have arrived, not with the lengths that
 // are announced. After a malformed message the next one can be read; after any other error every further call
@@ -84,22 +52,17 @@ class DelimitedReader {
   // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>
   [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
-    const auto bytes = next();
-    if (!bytes) return std::unexpected(bytes.error());
-    if (!bytes->has_value()) return std::nullopt;
-    auto message = M::parse(**bytes, limits());
-    if (!message) return std::unexpected(malformedMessage(message.error()));
-    return std::move(*message);
+    auto bytes = next();
+    return parser().decoded<M>(std::move(bytes));
   }
 
   // Where in the stream the message that was read last begins, behind its length.
-  std::uint64_t messageOffset() const;
+  std::uint64_t messageOffset() const { return parser().messageOffset(); }
 
  private:
   class Source;
 
-  const DecodeLimits& limits() const;
-  StreamError malformedMessage(const DecodeError& error) const;
+  const DelimitedParser& parser() const;
 
   std::unique_ptr<Source> source_;
 };
@@ -118,8 +81,3 @@ requires requires(const M& message) { message.serialize(); }
 }
 
 }  // namespace orv
-
-template <>
-class std::bad_expected_access<orv::StreamError> : public orv::internal::BadAccess<orv::StreamError> {
-  using BadAccess::BadAccess;
-};
