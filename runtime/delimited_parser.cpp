@@ -1,7 +1,6 @@
 #include <orv/delimited_parser.hpp>
 
 #include <algorithm>
-#include <cassert>
 #include <cstring>
 #include <limits>
 
@@ -75,14 +74,6 @@ StreamError DelimitedParser::malformedMessage(const DecodeError& error) const {
           .offset = messageOffset_ + error.offset,
           .length = 0,
           .decodeError = error};
-}
-
-DelimitedHeader::DelimitedHeader(std::size_t messageSizeInBytes) {
-  assert(messageSizeInBytes <= largestMessage);
-  for (std::size_t rest = messageSizeInBytes;; rest >>= 7) {
-    bytes_[size_++] = static_cast<std::byte>((rest & 0x7F) | (rest > 0x7F ? 0x80 : 0));
-    if (rest <= 0x7F) return;
-  }
 }
 
 }  // namespace orv

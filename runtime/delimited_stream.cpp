@@ -3,12 +3,8 @@
 #include <google/protobuf/io/zero_copy_stream_impl_lite.h>
 
 #include <cassert>
-#include <cstring>
-#include <functional>
 #include <span>
-#include <string_view>
-
-#include <orv/binary_encoder.hpp>
+#include <utility>
 
 namespace orv::inline v0 {
 
@@ -86,24 +82,6 @@ std::expected<std::optional<std::span<const std::byte>>, StreamError> DelimitedR
 const DelimitedParser& DelimitedReader::parser() const {
   assert(source_ != nullptr && "a reader that was moved from has no place");
   return source_->parser();
-}
-
-std::expected<void, EncodeError> appendDelimited(std::string_view bytes, std::string& output) {
-  if (bytes.size() > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
-  // The bytes may be the output's own, which move when it grows.
-  const std::size_t before = output.size();
-  const bool areOwn = std::greater_equal<>()(bytes.data(), output.data()) &&
-                      std::less_equal<>()(bytes.data(), output.data() + before);
-  const std::size_t ownAt = areOwn ? static_cast<std::size_t>(bytes.data() - output.data()) : 0;
-  const DelimitedHeader header(bytes.size());
-  const std::size_t size = before + header.size() + bytes.size();
-  output.resize_and_overwrite(size, [&](char* begin, std::size_t) {
-    std::memcpy(begin + before, header.data(), header.size());
-    if (!bytes.empty())
-      std::memcpy(begin + before + header.size(), areOwn ? begin + ownAt : bytes.data(), bytes.size());
-    return size;
-  });
-  return {};
 }
 
 }  // namespace orv

@@ -7,6 +7,7 @@
 #include <utility>
 
 #include <orv/delimited_parser.hpp>
+#include <orv/delimited_writer.hpp>
 #include <orv/member.hpp>
 
 namespace {

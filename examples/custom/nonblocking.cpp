@@ -14,6 +14,7 @@
 #include <string>
 
 #include <orv/delimited_parser.hpp>
+#include <orv/delimited_writer.hpp>
 #include <orv/member.hpp>
 
 namespace {

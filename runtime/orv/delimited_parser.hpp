@@ -1,7 +1,6 @@
-// Takes a stream of messages apart whose bytes are pushed into it, and writes the parts of one.
+// Takes a stream of messages apart whose bytes are pushed into it.
 #pragma once
 
-#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
@@ -80,23 +79,6 @@ class DelimitedParser {
   std::uint64_t offset_ = 0;  // of begin_ in the stream
   std::uint64_t messageOffset_ = 0;
   std::optional<StreamError> error_;
-};
-
-// What stands before a message in a stream: the number of its bytes, as a varint. For writev, and whoever else
-// writes a message from where it is.
-class DelimitedHeader {
- public:
-  // For a message of so many bytes, below 2^31.
-  explicit DelimitedHeader(std::size_t messageSizeInBytes);
-
-  const std::byte* data() const { return bytes_.data(); }
-  std::size_t size() const { return size_; }
-  const std::byte* begin() const { return data(); }
-  const std::byte* end() const { return data() + size(); }
-
- private:
-  std::array<std::byte, 5> bytes_{};
-  std::uint8_t size_ = 0;
 };
 
 }  // namespace orv

@@ -1,4 +1,4 @@
-// Streams of messages, each behind its length as a varint.
+// Reads streams of messages, each behind its length as a varint.
 #pragma once
 
 #include <cstddef>
@@ -8,13 +8,11 @@
 #include <memory>
 #include <optional>
 #include <span>
-#include <string>
-#include <string_view>
 #include <utility>
 
 #include <orv/decode_limits.hpp>
 #include <orv/delimited_parser.hpp>
-#include <orv/encode_error.hpp>
+#include <orv/delimited_writer.hpp>
 #include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {
@@ -66,18 +64,5 @@ class DelimitedReader {
 
   std::unique_ptr<Source> source_;
 };
-
-// Appends the number of bytes as a varint, and the bytes, which may be the output's own. It fails only above
-// 2^31-1 bytes. After an error nothing is appended.
-[[nodiscard]] std::expected<void, EncodeError> appendDelimited(std::string_view bytes, std::string& output);
-
-// Appends a message behind its length. After an error nothing is appended.
-template <class M>
-requires requires(const M& message) { message.serialize(); }
-[[nodiscard]] std::expected<void, EncodeError> appendDelimited(const M& message, std::string& output) {
-  const auto bytes = message.serialize();
-  if (!bytes) return std::unexpected(bytes.error());
-  return appendDelimited(std::string_view(*bytes), output);
-}
 
 }  // namespace orv

@@ -1,4 +1,5 @@
 #include <orv/delimited_parser.hpp>
+#include <orv/delimited_writer.hpp>
 
 #include <gtest/gtest.h>
 
