@@ -100,6 +100,10 @@ void Renderer::appendUnknown(const UnknownField& field) {
   startMember("wireType");
   appendQuoted(wireTypeNames[static_cast<std::size_t>(field.tag.wireType())]);
   startMember("value");
+  if (options_.hidesSecrets) {
+    appendQuoted("<redacted>");
+    return close('}');
+  }
   // What is kept is well-formed.
   WireReader reader(field.value);
   switch (field.tag.wireType()) {

@@ -223,6 +223,14 @@ TEST(Json, ShowsUnknownFieldsOnDemand) {
       R"({"number":11,"wireType":"startGroup","value":[{"number":1,"wireType":"varint","value":"1"}]}]})");
 }
 
+TEST(Json, HidesSecretsOnDemand) {
+  EXPECT_EQ(rendered<Member>("0A 01 61 12 01 62 48 05 50 81 00",
+                             {.showsUnknownFields = true, .hidesSecrets = true}),
+            R"({"handle":"a","tokenID":"<redacted>","unknownFields":[)"
+            R"({"number":9,"wireType":"varint","value":"<redacted>"},)"
+            R"({"number":10,"wireType":"varint","value":"<redacted>"}]})");
+}
+
 TEST(Json, LeaksNothingWhereverMemoryRunsOut) {
   const std::string longName(50, 'n');
   const std::string documents[] = {

@@ -1,5 +1,6 @@
 """What each subcommand writes, says on standard error and exits with."""
 
+import base64
 import os
 import re
 import select
@@ -8,7 +9,7 @@ import socket
 import subprocess
 import time
 
-from tool import COMMAND, delimited, expect, in_scratch_directory, write
+from tool import COMMAND, delimited, expect, in_scratch_directory, record, run, write
 
 TRANSCRIPT = os.path.join(os.path.dirname(os.path.abspath(__file__)), "commands.transcript")
 FUNCTIONS = """
@@ -115,8 +116,105 @@ def interrupted():
             expect(f"{number}: the old file", file.read(), b"precious")
 
 
+def spellings(marker):
+    """The ways in which three bytes of the marker in a row can be written."""
+    windows = [marker[at:at + 3] for at in range(len(marker) - 2)]
+    numbers = [int.from_bytes(marker[:size], "little") for size in (4, 8)]
+    yield from windows
+    for window in windows:
+        yield from (window.hex().encode(), window.hex(" ").encode())
+        yield from ("".join(form % byte for byte in window).encode() for form in ("\\%03o", "\\x%02x"))
+    for shift in range(3):
+        digits = base64.b64encode(bytes(shift) + marker)[2 * shift:-4]
+        yield from (digits[at:at + 4] for at in range(len(digits) - 3))
+    for number in numbers:
+        yield from (str(number).encode(), b"%x" % number)
+
+
+def hiding(marker):
+    """Messages, each with the marker where it is to be hidden; those after the first are malformed."""
+
+    def envelope(kind, payload, behind=b""):
+        return b"\x08\x01\x10" + bytes([kind]) + record(3, payload) + behind
+
+    def added(member):
+        return record(2, record(1, b"\x3b") + record(2, member))
+
+    unknown = [
+        record(77, marker),
+        record(77, record(1, marker)),
+        b"\x69" + marker,  # 64 bits
+        b"\x6d" + marker[:4],
+        b"\x6b" + record(1, marker) + b"\x6c",  # a group
+        b"\x98\x81\x00" + bytes([len(marker)]) + bytes([byte & 0x7F for byte in marker]),
+        record(4, marker),
+    ]
+    member = record(1, b"open")
+    whole = [
+        envelope(1, record(1, marker) + record(2, marker)),
+        envelope(2, record(2, marker)),
+        envelope(4, record(1, b"i") + record(4, record(1, marker))),
+        envelope(9, marker),
+        record(3, marker),
+        record(1, marker) + record(2, marker),  # the wire type of no number
+        *[envelope(3, record(1, b"i") + field) for field in unknown[:5]],
+        *[envelope(5, added(member + field)) for field in unknown],
+        *[envelope(5, added(member)) + field for field in unknown],
+    ]
+    if marker.isascii():
+        whole.append(envelope(5, added(member + record(2, marker))))
+    overrunning = b"\x0a\x7f" + b"open" + record(2, marker)
+    malformed = [
+        marker,
+        envelope(5, marker),
+        envelope(5, added(overrunning)),
+        envelope(5, added(record(1, b"\xff" + marker))),
+        envelope(5, added(member), overrunning),
+        envelope(5, added(member), b"\x07" + marker),
+        envelope(3, overrunning),
+        b"\x08\x01\x10\x05\x1a\x7f" + added(overrunning),
+        b"\x08\x01\x10\x05\x1a\x7f" + added(b"") + record(1, marker),
+    ]
+    malformed += [message[:cut] for message in whole[:7] for cut in range(len(message) - 1, 4, -1)]
+    return whole, malformed
+
+
+def redacted():
+    """Nothing of a secret value shows in any form, nor of what nobody knows, however the message is broken."""
+    for marker in (b"qZ7xKv9w", bytes.fromhex("f39ac187d2ee91bb")):
+        whole, malformed = hiding(marker)
+        hidden = set(spellings(marker))
+        for command, form in [
+            ("decode", "text"), ("decode", "json"), ("convert", "text"), ("convert", "json"),
+            ("inspect", "text"), ("inspect", "json"), ("inspect", "html"),
+        ]:
+            for extra in ["--redact"], ["--redact", "--no-unwrap"], ["--redact", "--unknown"], []:
+                if command == "inspect" and "--unknown" in extra:
+                    extra = ["--redact", "--defaults"]
+                elif form == "text" and "--unknown" in extra:
+                    continue
+                words = [command, "-dk", "--from", "binary", "--to", form, *extra]
+                done = run(*words, stdin=delimited(*whole, *malformed))
+                shown = [part for part in hidden if part in done.stdout + done.stderr]
+                expect(f"{words} of {marker}", bool(shown), "--redact" not in extra)
+                expect(f"{words}: status", done.returncode, 3)
+                for at, message in enumerate(malformed[:9]) if extra == ["--redact"] else []:
+                    done = run(command, "--from", "binary", "--to", form, *extra, stdin=message)
+                    shown = [part for part in hidden if part in done.stdout + done.stderr]
+                    expect(f"{words} of malformed message {at} alone", shown, [])
+    for text in [
+        "tokenID: qZ7xKv9w", 'tokenID: "a" qZ7xKv9w', "qZ7xKv9w: 1", 'tokenID: "qZ7xKv9w', '5: qZ7xKv9w',
+        '{"tokenID":qZ7xKv9w}', '{"tokenID":{"qZ7xKv9w":1}}', '{"qZ7xKv9w":1}', '{"handle":"a\\qZ7xKv9w"}',
+        '{"unknownFields":[{"number":9,"wireType":"varint","value":"qZ7xKv9w"}]}',
+    ]:
+        done = run("convert", "--redact", "--from", "json" if text[0] == "{" else "text", "-t", "Member", stdin=text)
+        expect(f"{text}: status", done.returncode, 3)
+        expect(text, [part for part in spellings(b"qZ7xKv9w") if part in done.stdout + done.stderr], [])
+
+
 def test():
     transcript()
+    redacted()
     closed_descriptors()
     live()
     interrupted()

@@ -242,7 +242,7 @@ TEST(TextForm, BringsUnknownFieldsBack) {
   const auto expectBack = [](std::string_view bytes) {
     const auto message = tool::parseMessage(tool::typeOf<Member>(), bytesOf(bytes), usualPairing);
     ASSERT_TRUE(message.has_value()) << toHex(bytes);
-    const std::string text = (*message)->text();
+    const std::string text = (*message)->text({});
     EXPECT_EQ(outcome(tool::typeOf<Member>(), text), toHex(bytes)) << text;
   };
   for (const std::string_view record :

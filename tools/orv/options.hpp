@@ -41,6 +41,7 @@ struct Options {
   bool keepsGoing = false;
   bool showsUnknownFields = false;
   bool showsDefaults = false;
+  bool hidesSecrets = false;
   bool comparesEncodings = false;
   std::vector<std::string> ignored;  // paths of fields
   bool isQuiet = false;

@@ -22,6 +22,8 @@ struct RenderOptions {
   // order of their arrival, 64-bit values as strings, bytes in base64, groups as lists. Where that does not say
   // how long a number is spelled, {"record"} has all bytes in base64. Reading makes the same bytes of it.
   bool showsUnknownFields = false;
+  // Writes "<redacted>" for the values of secret fields, and of unknown ones.
+  bool hidesSecrets = false;
 };
 
 // Appends text as a JSON string. Ill-formed text is none of JSON's.
@@ -42,15 +44,11 @@ class Renderer : public AnyValueVisitor<Renderer> {
 
   template <class T>
   Result visitAnyValue(const T& value, std::uint32_t number) {
-    startMember(fieldName(number));
-    append(value);
-    return {};
+    return visitMember(number, [&] { append(value); });
   }
   template <class M>
   Result visitSingularMessageField(const M& message, std::uint32_t number) {
-    startMember(fieldName(number));
-    render(message);
-    return {};
+    return visitMember(number, [&] { render(message); });
   }
   Result visitRepeatedStringField(const std::vector<Text>& texts, std::uint32_t number) {
     return visitList(texts, number, [&](const Text& text) { append(text); });
@@ -70,16 +68,26 @@ class Renderer : public AnyValueVisitor<Renderer> {
   void startLine();
   void startMember(std::string_view name);
 
+  template <class Append>
+  Result visitMember(std::uint32_t number, Append appendValue) {
+    startMember(fieldName(number));
+    if (options_.hidesSecrets && (field(number) == nullptr || field(number)->isSecret)) {
+      appendQuoted("<redacted>");
+    } else {
+      appendValue();
+    }
+    return {};
+  }
   template <class T, class Append>
   Result visitList(const std::vector<T>& items, std::uint32_t number, Append appendItem) {
-    startMember(fieldName(number));
-    open('[');
-    for (const T& item : items) {
-      startItem();
-      appendItem(item);
-    }
-    close(']');
-    return {};
+    return visitMember(number, [&] {
+      open('[');
+      for (const T& item : items) {
+        startItem();
+        appendItem(item);
+      }
+      close(']');
+    });
   }
 
   void append(const Text& text) { appendQuoted(text.utf8()); }

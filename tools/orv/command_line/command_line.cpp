@@ -114,6 +114,7 @@ std::optional<std::string> withoutEffect(const Options& options) {
       return "--ignore: \"" + path + "\" is no field of " + std::string(options.type->fullName());
   }
   if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
+  if (options.hidesSecrets && isBytes(*options.to)) return "--redact is for text and JSON: bytes stay bytes";
   if (!payloads.isClosed() && !payloads.hasOverrides()) return std::nullopt;
   if (payloads.isClosed() && payloads.hasOverrides())
     return "--no-unwrap leaves nothing for --payload to open";

@@ -145,6 +145,9 @@ constexpr OptionDescription unknown{noLetter, "--unknown", flag, "show unknown f
 constexpr OptionDescription defaults{noLetter, "--defaults", flag,
                                      "show fields that are absent, with their defaults",
                                      set<&Options::showsDefaults>};
+constexpr OptionDescription redact{noLetter, "--redact", flag,
+                                   "hide the values of secret and of unknown fields, but not their lengths",
+                                   set<&Options::hidesSecrets>};
 constexpr OptionDescription bytes{noLetter, "--bytes", flag, "compare the encodings too",
                                   set<&Options::comparesEncodings>};
 constexpr OptionDescription ignore{
@@ -169,11 +172,11 @@ constexpr std::array<const OptionDescription*, sizeof...(Options)> list(const Op
 }
 constexpr auto generalOptions = list(help, version);
 constexpr auto decodeOptions = list(type, payload, noUnwrap, from, to, delimited, messages, only, keepGoing,
-                                    unknown, verbose, maximumSize, output, help);
+                                    unknown, redact, verbose, maximumSize, output, help);
 constexpr auto encodeOptions =
     list(type, payload, from, to, delimited, messages, only, keepGoing, verbose, maximumSize, output, help);
 constexpr auto inspectOptions = list(type, payload, as, noUnwrap, from, to, delimited, messages, only,
-                                     keepGoing, defaults, colour, verbose, maximumSize, output, help);
+                                     keepGoing, defaults, redact, colour, verbose, maximumSize, output, help);
 constexpr auto diffOptions = list(type, payload, noUnwrap, from, delimited, messages, only, ignore, bytes,
                                   quiet, colour, verbose, maximumSize, output, help);
 constexpr auto identifyOptions = list(from, delimited, messages, keepGoing, maximumSize, output, help);

@@ -66,7 +66,9 @@ class Conversion final : public MessageWork {
     const bool isIndented = !options_.isDelimited;
     std::string document = "{}";
     if (message != nullptr)
-      document = message->json({.isIndented = isIndented, .showsUnknownFields = options_.showsUnknownFields});
+      document = message->json({.isIndented = isIndented,
+                                .showsUnknownFields = options_.showsUnknownFields,
+                                .hidesSecrets = options_.hidesSecrets});
     const auto addMember = [&](std::string_view name, std::string_view value) {
       document.resize(document.size() - (isIndented && document.size() > 2 ? 2 : 1));
       if (document.size() > 1) document += ',';
@@ -79,8 +81,8 @@ class Conversion final : public MessageWork {
     if (!error.empty()) addMember("error", error);
     if (message == nullptr) {
       std::string bytes;
-      spelling::appendBase64(input.encoding(), bytes);
-      addMember("bytes", bytes);
+      if (!options_.hidesSecrets) spelling::appendBase64(input.encoding(), bytes);
+      addMember("bytes", options_.hidesSecrets ? "<redacted>" : bytes);
     }
     document += '\n';
     return document;
@@ -96,9 +98,13 @@ class Conversion final : public MessageWork {
     }
     isFirst_ = false;
     if (!error.empty()) piece.append("# error at ").append(error) += '\n';
-    if (message != nullptr) return piece + message->text();
+    if (message != nullptr) return piece + message->text({.hidesSecrets = options_.hidesSecrets});
     piece += "# bytes ";
-    spelling::appendHex(input.encoding(), piece, " ");
+    if (options_.hidesSecrets) {
+      piece += "<redacted>";
+    } else {
+      spelling::appendHex(input.encoding(), piece, " ");
+    }
     return piece + '\n';
   }
 

@@ -166,14 +166,13 @@ Outcome<bool> MessageInput::nextFrame() {
 
 Outcome<std::string> MessageInput::encodeText() const {
   auto encoded = encodeTextForm(*options_.type, frame_.content, options_.payloads);
-  if (!encoded) return std::unexpected(reader_->malformedText(frame_, encoded.error()));
+  if (!encoded) return failText(encoded.error());
   return std::move(*encoded);
 }
 
 Outcome<std::string> MessageInput::encodeJson() const {
   const auto failure = [&](const json::Error& error) {
-    if (!error.path.empty()) return std::unexpected(reader_->malformed(frame_, error.message()));
-    return std::unexpected(reader_->malformedText(frame_, {error.reason, error.line, error.column}));
+    return failText({error.path.empty() ? error.reason : error.message(), error.line, error.column});
   };
   const auto document = json::Document::parse(frame_.content);
   if (!document) return failure(document.error());
@@ -182,6 +181,13 @@ Outcome<std::string> MessageInput::encodeJson() const {
   auto encoded = (*message)->serialize();
   if (!encoded) return std::unexpected(reader_->malformed(frame_, describe(encoded.error())));
   return std::move(*encoded);
+}
+
+// The reason quotes the text. Without a line it says the place itself.
+std::unexpected<Failure> MessageInput::failText(spelling::TextError error) const {
+  if (options_.hidesSecrets) error.reason = "malformed, <redacted>";
+  return std::unexpected(error.line == 0 ? reader_->malformed(frame_, error.reason)
+                                         : reader_->malformedText(frame_, std::move(error)));
 }
 
 Outcome<void> MessageInput::check() const {

@@ -58,6 +58,7 @@ class MessageInput {
   bool isSelected() const;
   Outcome<std::string> encodeText() const;
   Outcome<std::string> encodeJson() const;
+  std::unexpected<Failure> failText(spelling::TextError error) const;
 
   InputFile file_;
   const std::string& path_;

@@ -36,7 +36,6 @@ void appendBytes(std::string_view bytes, std::string& output) {
 }
 
 void appendUnknown(const TracedRecord& record, std::string& output) {
-  output += record.field != nullptr ? "another wire type than the field's, kept as unknown: " : "unknown: ";
   switch (record.tag.wireType()) {
     case WireType::lengthDelimited: return appendBytes(charactersOf(record.value), output);
     case WireType::startGroup: return appendByteCount(record.value.size(), output);
@@ -53,6 +52,7 @@ class Explainer final : public TraceSink {
         output_(output),
         innerTypes_(options.innerTypes),
         absent_(options.showsDefaults ? AbsentFields::tell : AbsentFields::leaveOut),
+        hidesSecrets_(options.hidesSecrets),
         shownUpTo_(message.bytes.data()) {
     if (!message.type.isEnvelope()) return;
     const EnvelopeOutline outline = outlineOf(message.bytes);
@@ -80,7 +80,9 @@ class Explainer final : public TraceSink {
                                     .offset = offsetOf(record.header.data()),
                                     .message = opened,
                                     .payloadPath = payloadPath_,
-                                    .level = level_ + record.level};
+                                    .level = level_ + record.level,
+                                    .isHidden = hidesSecrets_ && opened == nullptr && !record.isAbsent() &&
+                                                (!record.type || record.field->isSecret)};
     renderer_.record(explained);
     shownUpTo_ = record.value.data() + explained.shownValue().size();
     // A long message is written piece by piece.
@@ -120,7 +122,9 @@ class Explainer final : public TraceSink {
   }
 
   void showError() {
-    const auto rest = message_.bytes.subspan(static_cast<std::size_t>(shownUpTo_ - message_.bytes.data()));
+    auto rest = message_.bytes.subspan(static_cast<std::size_t>(shownUpTo_ - message_.bytes.data()));
+    // Nobody knows what they hold.
+    if (hidesSecrets_) rest = rest.first(0);
     const std::ptrdiff_t good = message_.bytes.data() + error_->offset - shownUpTo_;
     renderer_.error({.error = *error_,
                      .offset = offsetOf(shownUpTo_),
@@ -149,6 +153,7 @@ class Explainer final : public TraceSink {
   OutputFile& output_;
   const std::map<std::string, const MessageType*, std::less<>>& innerTypes_;
   AbsentFields absent_;
+  bool hidesSecrets_;
   const std::byte* shownUpTo_;
   const MessageType* payload_ = nullptr;  // of the envelope that is shown
   const std::byte* payloadStart_ = nullptr;
@@ -178,6 +183,13 @@ void ExplainedRecord::appendValue(std::string& output) const {
   if (message != nullptr) {
     appendByteCount(record.value.size(), output);
     output.append(", ").append(message->fullName);
+    return;
+  }
+  if (!record.type)
+    output += record.field != nullptr ? "another wire type than the field's, kept as unknown: " : "unknown: ";
+  if (isHidden) {
+    appendByteCount(record.value.size(), output);
+    output += ", <redacted>";
     return;
   }
   if (!record.type) return appendUnknown(record, output);

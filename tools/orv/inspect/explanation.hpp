@@ -33,12 +33,13 @@ struct ExplainedRecord {
       message;                   // the type of the message that the value is, whose records follow; or none
   std::string_view payloadPath;  // of the payload that it is in, empty in none: "data"
   std::size_t level;             // how many messages it is in, payloads among them, beside the outermost
+  bool isHidden;                 // whether only the value's length may show
 
   // What the record holds, by its type or, where it is unknown, by its wire type.
   std::string_view kind() const;
   // Of a message, what fields there are, the value is not shown beside them.
   std::span<const std::byte> shownValue() const {
-    return message != nullptr ? record.value.first(0) : record.value;
+    return message != nullptr || isHidden ? record.value.first(0) : record.value;
   }
   void appendValue(std::string& output) const;
 };

@@ -45,6 +45,8 @@ class JsonRenderer final : public Renderer {
     if (record.isAbsent()) addLiteral("absent", "true");
     if (explained.message != nullptr) {
       add("message", explained.message->fullName);
+    } else if (explained.isHidden) {
+      add("value", "<redacted>");
     } else if (!record.isAbsent() || record.field->kind == FieldKind::implicitPresence) {
       addValue(record);
     }

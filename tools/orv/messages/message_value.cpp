@@ -20,9 +20,10 @@ class TypedValue final : public MessageValue {
  public:
   explicit TypedValue(M message) : message_(std::move(message)) {}
 
-  std::string text() const override {
+  std::string text(TextStyle style) const override {
     std::string text;
-    TextRenderer renderer(text, {.isReversible = true});
+    style.isReversible = !style.hidesSecrets;
+    TextRenderer renderer(text, style);
     (void)message_.traverse(renderer);
     return text;
   }

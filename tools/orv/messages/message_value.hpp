@@ -13,6 +13,7 @@
 #include <orv/encode_error.hpp>
 #include <orv/json/document.hpp>
 #include <orv/json/renderer.hpp>
+#include <orv/text_renderer.hpp>
 #include "tools/orv/messages/message_type.hpp"
 
 namespace orv::tool {
@@ -22,7 +23,8 @@ class MessageValue {
  public:
   virtual ~MessageValue() = default;
 
-  virtual std::string text() const = 0;
+  // As encode reads it, unless secrets are hidden.
+  virtual std::string text(TextStyle style) const = 0;
   virtual std::string json(json::RenderOptions options) const = 0;
   virtual std::expected<std::string, EncodeError> serialize() const = 0;
   virtual std::vector<compare::Leaf> leaves() const = 0;
