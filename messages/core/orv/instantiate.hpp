@@ -255,8 +255,8 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
   constexpr std::size_t slack = 8;
   const std::size_t size = encodedSize();
   if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
-  std::string bytes;
-  bytes.resize_and_overwrite(size + slack, [&](char* begin, std::size_t room) {
+  std::expected<std::string, EncodeError> bytes;
+  bytes->resize_and_overwrite(size + slack, [&](char* begin, std::size_t room) {
     const auto written = serializeInto(std::as_writable_bytes(std::span(begin, room)));
     assert(written == size);
     return written.value_or(0);
