@@ -1,6 +1,7 @@
 """What each subcommand writes, says on standard error and exits with."""
 
 import base64
+import json
 import os
 import re
 import select
@@ -212,7 +213,66 @@ def redacted():
         expect(text, [part for part in spellings(b"qZ7xKv9w") if part in done.stdout + done.stderr], [])
 
 
+def part_of(part, whole, truncated):
+    """Whether all that the part says the whole says too, but for a text or base64 that is its start."""
+    if isinstance(part, dict):
+        name, _, below = truncated.partition(".")
+        return all(
+            key in whole and part_of(value, whole[key], below or " " if key == name else "")
+            for key, value in part.items()
+        )
+    if isinstance(part, list):
+        return all(part_of(item, whole[at], truncated if item is part[-1] else "") for at, item in enumerate(part))
+    return part == whole or (truncated == " " and len(part) > 0 and whole.startswith(part.rstrip("=")[:-1]))
+
+
+def values_of(document):
+    """How many there are, messages not counted."""
+    if isinstance(document, (dict, list)):
+        return sum(map(values_of, document.values() if isinstance(document, dict) else document))
+    return 1
+
+
+def salvaged():
+    """Wherever a message is cut, what stands before the cut is shown, and nothing else."""
+    payloads = [
+        (1, record(1, b"\x01\x02\x03\x04") + record(2, b"sealed body")),
+        (3, record(1, b"2C8E91B7") + record(2, b"anna@tablet") + record(3, "Anna\u2019s".encode())),
+        (4, record(1, b"i") + record(4, record(1, b"\xff\xfe\xfd"))),
+        (5, record(1, record(1, b"\x3b") + record(2, record(1, b"ann")) + record(2, record(2, b"token")))),
+        (5, record(4, record(1, b"\x3b") + b"\x10\x01")),
+        (9, record(1, b"of no known kind")),
+    ]
+    for kind, payload in payloads:
+        message = b"\x08\x01\x10" + bytes([kind]) + record(3, payload) + record(9, b"unknown")
+        whole = json.loads(run("--to", "json", stdin=message).stdout)
+        pieces = [message[:cut] for cut in range(len(message))]
+        if kind != 9:
+            pieces += [message[:4] + record(3, payload[:cut]) for cut in range(len(payload))]
+        fields = json.loads(run("inspect", "--to", "json", stdin=message).stdout)["fields"]
+        ends = [
+            field["offset"] + field["header"] + field["length"]
+            for field in fields
+            if "message" not in field and "unknown" not in field
+        ]
+        done = run("-dk", "--from", "binary", "--to", "json", stdin=delimited(*pieces))
+        shown = [json.loads(line) for line in done.stdout.splitlines()]
+        expect(f"kind {kind}: documents", len(shown), len(pieces))
+        for piece, document in zip(pieces, shown):
+            partial, truncated = document.get("partial", {}), document.get("truncated", "")
+            expect(f"{document}: is part", part_of(partial, whole, truncated), True)
+            if "error" not in document:
+                partial = document
+            values = sum(end <= len(piece) for end in ends)
+            expect(f"{piece.hex()}: {document}: values", values_of(partial) - bool(truncated), values)
+        # Comments: what is malformed does not come back as something else.
+        done = run("-dk", "--from", "binary", stdin=delimited(*pieces))
+        again = run("encode", "-d", stdin=done.stdout).stdout
+        expect(f"kind {kind}: back", again, delimited(*[b"" if "bytes" in d else p for p, d in zip(pieces, shown)]))
+
+
 def test():
+    salvaged()
     transcript()
     redacted()
     closed_descriptors()

@@ -2,6 +2,7 @@
 #include <string>
 #include <string_view>
 
+#include <orv/byte_view.hpp>
 #include <orv/delimited_stream.hpp>
 #include <orv/json/renderer.hpp>
 #include <orv/spelling/base64.hpp>
@@ -9,10 +10,16 @@
 #include "tools/orv/command_line/command.hpp"
 #include "tools/orv/input/message_input.hpp"
 #include "tools/orv/input/text_stream.hpp"
+#include "tools/orv/messages/salvage.hpp"
 
 namespace orv::tool {
 
 namespace {
+
+// With another line's end, and what follows it, in place of each.
+void appendLines(std::string_view text, std::string_view lineEnd, std::string& output) {
+  for (const char c : text) output += c == '\n' ? lineEnd : std::string_view(&c, 1);
+}
 
 // Writes messages in any format.
 class Conversion final : public MessageWork {
@@ -21,15 +28,21 @@ class Conversion final : public MessageWork {
       : options_(options), format_(*options.to), output_(output) {}
 
   // A message that came as bytes is written to bytes as it came, once it was checked. What is malformed is
-  // written as bytes, with the error beside it where the format has a place for it.
+  // written as bytes, with the error and what stands before it beside them where the format has a place for that.
   Outcome<void> take(const MessageInput& input) override {
     if (isBytes(format_)) return takeEncoding(input);
     const auto message = input.message();
-    if (message) return write(input, message->get(), {});
+    if (message) return write(input, {.message = message->get()});
     const Failure& failure = message.error();
-    if (failure.extent == Extent::message && !options_.keepsGoing) return std::unexpected(failure);
+    const auto salvaged = salvage(*options_.type, bytesOf(input.encoding()), options_.payloads,
+                                  options_.hidesSecrets ? CutFields::leaveOut : CutFields::take);
+    if (failure.extent == Extent::message && !options_.keepsGoing && (options_.isDelimited || !salvaged))
+      return std::unexpected(failure);
     const auto closed = input.message(PayloadPairing::closed());
-    if (auto written = write(input, closed ? closed->get() : nullptr, failure.reason); !written)
+    if (auto written = write(input, {.message = closed ? closed->get() : nullptr,
+                                     .error = failure.reason,
+                                     .salvaged = salvaged ? &*salvaged : nullptr});
+        !written)
       return written;
     return std::unexpected(failure);
   }
@@ -57,39 +70,52 @@ class Conversion final : public MessageWork {
     return output_.write(spelled + '\n');
   }
 
-  // Without a message, the bytes that are none.
-  Outcome<void> write(const MessageInput& input, const MessageValue* message, std::string_view error) {
-    return output_.write(format_ == Format::json ? json(input, message, error) : text(input, message, error));
+  struct Shown {
+    const MessageValue* message;  // none where the bytes are none
+    std::string_view error{};
+    const Salvage* salvaged = nullptr;
+  };
+
+  Outcome<void> write(const MessageInput& input, const Shown& shown) {
+    return output_.write(format_ == Format::json ? json(input, shown) : text(input, shown));
   }
 
-  std::string json(const MessageInput& input, const MessageValue* message, std::string_view error) const {
-    const bool isIndented = !options_.isDelimited;
-    std::string document = "{}";
-    if (message != nullptr)
-      document = message->json({.isIndented = isIndented,
-                                .showsUnknownFields = options_.showsUnknownFields,
-                                .hidesSecrets = options_.hidesSecrets});
-    const auto addMember = [&](std::string_view name, std::string_view value) {
-      document.resize(document.size() - (isIndented && document.size() > 2 ? 2 : 1));
+  std::string json(const MessageInput& input, const Shown& shown) const {
+    const json::RenderOptions style{.isIndented = !options_.isDelimited,
+                                    .showsUnknownFields = options_.showsUnknownFields,
+                                    .hidesSecrets = options_.hidesSecrets};
+    std::string document = shown.message != nullptr ? shown.message->json(style) : "{}";
+    const auto add = [&](std::string_view name, std::string_view value) {
+      document.resize(document.size() - (style.isIndented && document.size() > 2 ? 2 : 1));
       if (document.size() > 1) document += ',';
-      document += isIndented ? "\n  " : "";
+      document += style.isIndented ? "\n  " : "";
       json::appendQuoted(name, document);
-      document += isIndented ? ": " : ":";
-      json::appendQuoted(value, document);
-      document += isIndented ? "\n}" : "}";
+      document += style.isIndented ? ": " : ":";
+      // Line ends stand between values only.
+      appendLines(value, "\n  ", document);
+      document += style.isIndented ? "\n}" : "}";
     };
-    if (!error.empty()) addMember("error", error);
-    if (message == nullptr) {
+    const auto addText = [&](std::string_view name, std::string_view text) {
+      std::string value;
+      json::appendQuoted(text, value);
+      add(name, value);
+    };
+    if (!shown.error.empty()) addText("error", shown.error);
+    if (shown.message == nullptr) {
       std::string bytes;
       if (!options_.hidesSecrets) spelling::appendBase64(input.encoding(), bytes);
-      addMember("bytes", options_.hidesSecrets ? "<redacted>" : bytes);
+      addText("bytes", options_.hidesSecrets ? "<redacted>" : bytes);
     }
-    document += '\n';
-    return document;
+    if (shown.salvaged != nullptr) {
+      add("partial", shown.salvaged->message->json(style));
+      if (!shown.salvaged->cut.empty()) addText("truncated", shown.salvaged->cut);
+    }
+    return document + '\n';
   }
 
-  // What is no field is a comment.
-  std::string text(const MessageInput& input, const MessageValue* message, std::string_view error) {
+  // What is no field of a message is a comment, and so are those that are not all.
+  std::string text(const MessageInput& input, const Shown& shown) {
+    const TextStyle style{.hidesSecrets = options_.hidesSecrets};
     std::string piece;
     if (options_.isDelimited) {
       if (!isFirst_) piece += '\n';
@@ -97,15 +123,21 @@ class Conversion final : public MessageWork {
       piece += ' ' + std::to_string(input.frame().number) + ", at " + bytePlace(input.frame().offset) + '\n';
     }
     isFirst_ = false;
-    if (!error.empty()) piece.append("# error at ").append(error) += '\n';
-    if (message != nullptr) return piece + message->text({.hidesSecrets = options_.hidesSecrets});
-    piece += "# bytes ";
-    if (options_.hidesSecrets) {
-      piece += "<redacted>";
+    if (!shown.error.empty()) piece.append("# error at ").append(shown.error) += '\n';
+    if (shown.message != nullptr) {
+      piece += shown.message->text(style);
     } else {
-      spelling::appendHex(input.encoding(), piece, " ");
+      piece += "# bytes ";
+      if (options_.hidesSecrets) piece += "<redacted>";
+      if (!options_.hidesSecrets) spelling::appendHex(input.encoding(), piece, " ");
+      piece += '\n';
     }
-    return piece + '\n';
+    if (shown.salvaged == nullptr) return piece;
+    piece += "# partial, read before the error";
+    if (!shown.salvaged->cut.empty()) piece += "; truncated: " + shown.salvaged->cut;
+    appendLines("\n" + shown.salvaged->message->text(style), "\n#   ", piece);
+    piece.resize(piece.rfind('\n') + 1);
+    return piece;
   }
 
   const Options& options_;
