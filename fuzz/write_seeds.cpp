@@ -3,7 +3,7 @@
 #include <fstream>
 #include <string>
 
-#include <orv/delimited_stream.hpp>
+#include <orv/delimited_writer.hpp>
 #include <orv/json.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
@@ -56,7 +56,7 @@ void writeAll(const std::filesystem::path& directory) {
       decode.add(byte(index) + bytes);
       differential.add(byte(index) + bytes);
       if (bytes.size() < 200) merge.add(byte(index) + byte(bytes.size()) + bytes + bytes);
-      appendDelimited(bytes, all);
+      (void)appendDelimited(bytes, all);
     }
     stream.add(byte(2) + byte(1) + byte(3) + all.substr(0, 1000));
     all.clear();
