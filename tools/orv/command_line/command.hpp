@@ -2,6 +2,7 @@
 // completion.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <expected>
@@ -46,6 +47,12 @@ struct Example {
 // What stands behind the options.
 enum class Operands : std::uint8_t { none, files, twoFiles, types, command };
 
+// As usage lines have them.
+constexpr std::string_view textOf(Operands operands) {
+  constexpr std::array<std::string_view, 5> texts{"", " [FILE]...", " A B", " [TYPE]...", " [COMMAND]"};
+  return texts[static_cast<std::size_t>(operands)];
+}
+
 struct Command {
   std::string_view name;
   // Reports what fails and answers the status to exit with.
@@ -53,10 +60,10 @@ struct Command {
   std::string_view summary;  // a few words
   std::string_view text;     // sentences
   Operands operands;
-  FormatChoice from;
-  FormatChoice to;
-  std::span<const OptionDescription* const> options;
-  std::span<const Example> examples;
+  FormatChoice from{};
+  FormatChoice to{};
+  std::span<const OptionDescription* const> options{};
+  std::array<Example, 3> examples{};  // fewer leave the last ones empty
 };
 
 struct StatusDescription {

@@ -23,10 +23,6 @@ Taken takeType(Options& options, const Command&, std::string_view name) {
   return {};
 }
 
-Taken takePayload(Options& options, const Command&, std::string_view pairing) {
-  return options.payloads.override(pairing);
-}
-
 std::string_view nameOf(Format format) { return formatNames[static_cast<std::size_t>(format)]; }
 
 template <std::optional<Format> Options::*format, FormatChoice Command::*choice>
@@ -90,10 +86,6 @@ Taken takeIgnored(Options& options, const Command&, std::string_view path) {
   return {};
 }
 
-Taken takeNumbers(Options& options, const Command&, std::string_view range) {
-  return options.selection.addNumbers(range);
-}
-
 Taken takeCondition(Options& options, const Command&, std::string_view condition) {
   options.selection.addCondition(condition);
   return {};
@@ -118,7 +110,10 @@ constexpr OptionDescription type{'t', "--type", "TYPE",
                                  takeType};
 constexpr OptionDescription payload{
     noLetter, "--payload", "[KIND=]TYPE",
-    "the type of an envelope's payload, for one kind or for all that have none", takePayload};
+    "the type of an envelope's payload, for one kind or for all that have none",
+    [](Options& options, const Command&, std::string_view pairing) {
+      return options.payloads.override(pairing);
+    }};
 constexpr OptionDescription as{
     noLetter, "--as", "FIELD=TYPE",
     "explain a field's bytes as a message, for instance data.encryptedData that is decrypted", takeInnerType};
@@ -132,7 +127,10 @@ constexpr OptionDescription to{
 constexpr OptionDescription delimited{'d', "--delimited", flag, "read and write streams of messages",
                                       set<&Options::isDelimited>};
 constexpr OptionDescription messages{'n', "--messages", "N[-[M]]",
-                                     "take the messages of a stream from the Nth to the Mth", takeNumbers};
+                                     "take the messages of a stream from the Nth to the Mth",
+                                     [](Options& options, const Command&, std::string_view range) {
+                                       return options.selection.addNumbers(range);
+                                     }};
 constexpr OptionDescription only{
     noLetter, "--only", "KIND|FIELD[=VALUE]",
     "take envelopes of the kind, or messages with the field, or with the value in it", takeCondition};
@@ -187,37 +185,6 @@ constexpr auto byteFormats = std::span(allFormats).first<3>();
 constexpr auto readableFormats = std::span(allFormats).last<2>();
 constexpr std::array shownFormats{Format::text, Format::json, Format::html};
 
-constexpr Example decodeExamples[] = {
-    {"orv decode --delimited capture.bin", "shows the messages of a capture"},
-    {"orv --delimited --to json capture.bin | jq .type", "the types of its messages"},
-    {"echo 0a05636172 6f6c | orv --from hex -t Member", "shows a member given in hexadecimal digits"},
-};
-constexpr Example encodeExamples[] = {
-    {R"(echo '{"handle":"carol"}' | orv encode -t Member --to hex)", "a member in hexadecimal digits"},
-    {"orv --to json message.bin | jq '.version = 2' | orv encode -o changed.bin", "changes a message"},
-};
-constexpr Example inspectExamples[] = {
-    {"orv inspect --delimited capture.bin", "explains the messages of a capture"},
-    {"orv inspect --to html message.bin -o message.html", "a page to attach to a report"},
-    {"orv inspect --color always message.bin | less -R", "keeps the colours for a pager"},
-};
-constexpr Example convertExamples[] = {
-    {"orv convert --to binary dump.txt -o message.bin", "bytes out of a hexadecimal dump"},
-    {"orv convert message.json", "JSON as text"},
-};
-constexpr Example diffExamples[] = {
-    {"orv diff before.bin after.bin", "the fields that differ"},
-    {"orv diff --ignore version before.bin after.bin", "but for one field"},
-    {"orv diff -q --bytes before.bin after.bin", "whether anything does, encodings included"},
-};
-constexpr Example identifyExamples[] = {
-    {"orv identify payload.bin", "the types that these bytes could be"},
-};
-constexpr Example typesExamples[] = {{"orv types Group", "the fields of one type"}};
-constexpr Example schemaExamples[] = {{"orv schema > orv.proto", "a file for protoc"}};
-
-constexpr Example helpExamples[] = {{"orv help diff", "the options of diff"}};
-
 constexpr Command commands[] = {
     {.name = "decode",
      .run = runConvert,
@@ -228,7 +195,10 @@ constexpr Command commands[] = {
      .from = {.allowed = allFormats, .isGuessed = true},
      .to = {.allowed = readableFormats, .byDefault = Format::text},
      .options = decodeOptions,
-     .examples = decodeExamples},
+     .examples = {{{"orv decode --delimited capture.bin", "shows the messages of a capture"},
+                   {"orv --delimited --to json capture.bin | jq .type", "the types of its messages"},
+                   {"echo 0a05636172 6f6c | orv --from hex -t Member",
+                    "shows a member given in hexadecimal digits"}}}},
     {.name = "encode",
      .run = runConvert,
      .summary = "make messages of text or JSON",
@@ -239,7 +209,10 @@ constexpr Command commands[] = {
      .from = {.allowed = readableFormats, .isGuessed = true},
      .to = {.allowed = byteFormats, .byDefault = Format::binary},
      .options = encodeOptions,
-     .examples = encodeExamples},
+     .examples = {{{R"(echo '{"handle":"carol"}' | orv encode -t Member --to hex)",
+                    "a member in hexadecimal digits"},
+                   {"orv --to json message.bin | jq '.version = 2' | orv encode -o changed.bin",
+                    "changes a message"}}}},
     {.name = "inspect",
      .run = runInspect,
      .summary = "explain messages byte by byte",
@@ -249,7 +222,9 @@ constexpr Command commands[] = {
      .from = {.allowed = allFormats, .isGuessed = true},
      .to = {.allowed = shownFormats, .byDefault = Format::text},
      .options = inspectOptions,
-     .examples = inspectExamples},
+     .examples = {{{"orv inspect --delimited capture.bin", "explains the messages of a capture"},
+                   {"orv inspect --to html message.bin -o message.html", "a page to attach to a report"},
+                   {"orv inspect --color always message.bin | less -R", "keeps the colours for a pager"}}}},
     {.name = "convert",
      .run = runConvert,
      .summary = "change the format of messages",
@@ -259,7 +234,8 @@ constexpr Command commands[] = {
      .from = {.allowed = allFormats, .isGuessed = true},
      .to = {.allowed = allFormats, .byDefault = Format::text},
      .options = decodeOptions,
-     .examples = convertExamples},
+     .examples = {{{"orv convert --to binary dump.txt -o message.bin", "bytes out of a hexadecimal dump"},
+                   {"orv convert message.json", "JSON as text"}}}},
     {.name = "diff",
      .run = runDiff,
      .summary = "compare two messages",
@@ -269,46 +245,41 @@ constexpr Command commands[] = {
              "model has it: texts when they are canonically equivalent, whatever their bytes.",
      .operands = Operands::twoFiles,
      .from = {.allowed = allFormats, .isGuessed = true},
-     .to = {},
      .options = diffOptions,
-     .examples = diffExamples},
+     .examples = {{{"orv diff before.bin after.bin", "the fields that differ"},
+                   {"orv diff --ignore version before.bin after.bin", "but for one field"},
+                   {"orv diff -q --bytes before.bin after.bin",
+                    "whether anything does, encodings included"}}}},
     {.name = "identify",
      .run = runIdentify,
      .summary = "rank the types that bytes could be",
      .text = "Ranks the types that a bare payload could be by the share of its bytes that they explain.",
      .operands = Operands::files,
      .from = {.allowed = byteFormats, .byDefault = Format::binary},
-     .to = {},
      .options = identifyOptions,
-     .examples = identifyExamples},
+     .examples = {{{"orv identify payload.bin", "the types that these bytes could be"}}}},
     {.name = "types",
      .run = runTypes,
      .summary = "list the message types with their fields",
      .text =
          "Lists the message types, all or those named, with the numbers, names and kinds of their fields.",
      .operands = Operands::types,
-     .from = {},
-     .to = {},
      .options = printingOptions,
-     .examples = typesExamples},
+     .examples = {{{"orv types Group", "the fields of one type"}}}},
     {.name = "schema",
      .run = runSchema,
      .summary = "print the schema",
      .text = "Prints the schema of the protocol, for peers in other languages.",
      .operands = Operands::none,
-     .from = {},
-     .to = {},
      .options = printingOptions,
-     .examples = schemaExamples},
+     .examples = {{{"orv schema > orv.proto", "a file for protoc"}}}},
     {.name = "help",
      .run = runHelp,
      .summary = "tell more of a command",
      .text = "Shows the help of a command, as its option --help does, or of all.",
      .operands = Operands::command,
-     .from = {},
-     .to = {},
      .options = printingOptions,
-     .examples = helpExamples},
+     .examples = {{{"orv help diff", "the options of diff"}}}},
 };
 
 constexpr StatusDescription statuses[] = {

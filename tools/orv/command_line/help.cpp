@@ -85,18 +85,6 @@ std::string optionsText(std::span<const OptionDescription* const> options, const
   return "\nOptions:\n" + table.text();
 }
 
-// As usage lines have them.
-std::string_view operandsText(Operands operands) {
-  switch (operands) {
-    case Operands::none: break;
-    case Operands::files: return " [FILE]...";
-    case Operands::twoFiles: return " A B";
-    case Operands::types: return " [TYPE]...";
-    case Operands::command: return " [COMMAND]";
-  }
-  return {};
-}
-
 }  // namespace
 
 std::string helpText(std::size_t width) {
@@ -120,12 +108,14 @@ std::string helpText(std::size_t width) {
 
 std::string helpText(const Command& command, std::size_t width) {
   const std::size_t columns = columnsFor(width);
-  std::string text = "Usage: orv " + std::string(command.name) + " [OPTION]...";
-  text += operandsText(command.operands);
+  std::string text =
+      "Usage: orv " + std::string(command.name) + " [OPTION]..." + std::string(textOf(command.operands));
   text += "\n\n" + wrapped(command.text, 0, columns) + optionsText(command.options, command, columns);
   text += "\nExamples:\n";
-  for (const Example& example : command.examples)
+  for (const Example& example : command.examples) {
+    if (example.line.empty()) break;
     text += "  " + std::string(example.line) + "\n      " + wrapped(example.text, 6, columns);
+  }
   return text;
 }
 

@@ -44,15 +44,13 @@ std::string optionList(std::span<const OptionDescription* const> options, const 
   return output + ".El\n";
 }
 
-std::string_view operandsOf(const Command& command) {
-  switch (command.operands) {
-    case Operands::none: break;
-    case Operands::files: return ".Op Ar\n";
-    case Operands::twoFiles: return ".Ar A B\n";
-    case Operands::types: return ".Op Ar type ...\n";
-    case Operands::command: return ".Op Ar command\n";
-  }
-  return {};
+// " [FILE]..." as ".Op Ar FILE ..."
+std::string operandsOf(const Command& command) {
+  const std::string_view text = textOf(command.operands);
+  const auto end = text.find(']');
+  if (text.empty()) return {};
+  if (end == std::string_view::npos) return ".Ar" + std::string(text) + '\n';
+  return ".Op Ar " + std::string(text.substr(2, end - 2)) + (text.ends_with("...") ? " ...\n" : "\n");
 }
 
 std::string synopsis() {
@@ -70,6 +68,7 @@ std::string exampleList() {
   std::string output = ".Bl -tag -width Ds\n";
   for (const Command& command : commandTable.commands) {
     for (const Example& example : command.examples) {
+      if (example.line.empty()) break;
       std::string quoted;
       for (const char c : example.line) quoted += c == '"' ? "\\(dq" : escaped({&c, 1});
       output += ".It Li \"" + quoted + "\"\n" + prose(std::string(example.text) + ".");

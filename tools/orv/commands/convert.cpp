@@ -85,32 +85,31 @@ class Conversion final : public MessageWork {
                                     .showsUnknownFields = options_.showsUnknownFields,
                                     .hidesSecrets = options_.hidesSecrets};
     std::string document = shown.message != nullptr ? shown.message->json(style) : "{}";
-    const auto add = [&](std::string_view name, std::string_view value) {
-      document.resize(document.size() - (style.isIndented && document.size() > 2 ? 2 : 1));
+    if (shown.error.empty()) return document + '\n';
+    document.resize(document.size() - (style.isIndented && document.size() > 2 ? 2 : 1));
+    const auto startMember = [&](std::string_view name) {
       if (document.size() > 1) document += ',';
-      document += style.isIndented ? "\n  " : "";
-      json::appendQuoted(name, document);
-      document += style.isIndented ? ": " : ":";
-      // Line ends stand between values only.
-      appendLines(value, "\n  ", document);
-      document += style.isIndented ? "\n}" : "}";
+      document.append(style.isIndented ? "\n  \"" : "\"")
+          .append(name)
+          .append(style.isIndented ? "\": " : "\":");
     };
     const auto addText = [&](std::string_view name, std::string_view text) {
-      std::string value;
-      json::appendQuoted(text, value);
-      add(name, value);
+      startMember(name);
+      json::appendQuoted(text, document);
     };
-    if (!shown.error.empty()) addText("error", shown.error);
+    addText("error", shown.error);
     if (shown.message == nullptr) {
       std::string bytes;
       if (!options_.hidesSecrets) spelling::appendBase64(input.encoding(), bytes);
       addText("bytes", options_.hidesSecrets ? "<redacted>" : bytes);
     }
     if (shown.salvaged != nullptr) {
-      add("partial", shown.salvaged->message->json(style));
+      startMember("partial");
+      // Line ends stand between values only.
+      appendLines(shown.salvaged->message->json(style), "\n  ", document);
       if (!shown.salvaged->cut.empty()) addText("truncated", shown.salvaged->cut);
     }
-    return document + '\n';
+    return document + (style.isIndented ? "\n}\n" : "}\n");
   }
 
   // What is no field of a message is a comment, and so are those that are not all.
@@ -148,10 +147,6 @@ class Conversion final : public MessageWork {
 
 }  // namespace
 
-ExitStatus runConvert(const Options& options) {
-  OutputFile output(options.output);
-  Conversion conversion(options, output);
-  return forEachMessage(options, output, conversion);
-}
+ExitStatus runConvert(const Options& options) { return forEachMessage<Conversion>(options); }
 
 }  // namespace orv::tool

@@ -21,20 +21,10 @@ namespace orv::tool {
 
 namespace {
 
-// A type that the bytes could be.
-struct Candidate {
-  const MessageType* type;
-  // From 0 to 1: the share of the bytes that the type explains. Fields that are checked while they are read,
-  // as messages and texts are, explain their bytes fully, bytes of any content half of theirs, unknown fields
-  // nothing.
-  double score;
-  std::size_t knownFields;
-  std::size_t unknownFields;
-};
+constexpr double opaque = 0.5;  // for bytes of any content
 
 // How much of a value's bytes is explained by the field that takes it.
 double explainedShare(const TracedRecord& record) {
-  constexpr double opaque = 0.5;
   constexpr double unlikely = 0.2;
   switch (*record.type) {
     case ValueType::string: return spelling::isReadable(charactersOf(record.value)) ? 1 : unlikely;
@@ -47,88 +37,89 @@ double explainedShare(const TracedRecord& record) {
   return 0;
 }
 
-class Explanation final : public TraceSink {
+// A type that the bytes could be, and how much of them it explains: fields that are checked while they are read, as
+// messages and texts are, explain their bytes fully, bytes of any content half of theirs, unknown fields nothing.
+class Candidate final : public TraceSink {
  public:
+  Candidate(const MessageType& type, std::span<const std::byte> bytes) : type_(&type), bytes_(bytes) {}
+
+  // Answers why the bytes are none of the type, if they are none.
+  std::expected<bool, DecodeError> explain() {
+    auto traced = trace(*type_, bytes_, *this);
+    if (traced && type_->isEnvelope()) lookIntoEnvelope();
+    return traced;
+  }
+
+  const MessageType& type() const { return *type_; }
+  // From 0 to 1: the share of the bytes.
+  double score() const { return bytes_.empty() ? 1 : explained_ / static_cast<double>(bytes_.size()); }
+  std::size_t knownFields() const { return knownFields_; }
+  std::size_t unknownFields() const { return unknownFields_; }
+
   bool record(const TracedRecord& record) override {
-    if (!record.type) {
-      ++unknownFields_;
-      return true;
-    }
+    if (!record.type) return ++unknownFields_, true;
     ++knownFields_;
     explained_ += static_cast<double>(record.header.size());
     explained_ += explainedShare(record) * static_cast<double>(record.value.size());
     return true;
   }
 
-  void addPayload(const Explanation& payload, std::size_t size) {
-    // The envelope had explained it as bytes of any content.
-    explained_ += payload.explained_ - 0.5 * static_cast<double>(size);
-    knownFields_ += payload.knownFields_;
-    unknownFields_ += payload.unknownFields_;
-  }
-
-  Candidate candidate(const MessageType& type, std::size_t size) const {
-    const double score = size == 0 ? 1 : explained_ / static_cast<double>(size);
-    return {&type, score, knownFields_, unknownFields_};
-  }
-
  private:
+  // An envelope is the likelier when its data is the message that its type says.
+  void lookIntoEnvelope() {
+    const EnvelopeOutline outline = outlineOf(bytes_);
+    const MessageType* const payload = outline.data ? PayloadPairing().payloadOf(outline.type) : nullptr;
+    if (payload == nullptr) return;
+    Candidate inner(*payload, *outline.data);
+    if (!inner.explain()) return;
+    // It was explained as bytes of any content.
+    explained_ += inner.explained_ - opaque * static_cast<double>(outline.data->size());
+    knownFields_ += inner.knownFields_;
+    unknownFields_ += inner.unknownFields_;
+  }
+
+  const MessageType* type_;
+  std::span<const std::byte> bytes_;
   double explained_ = 0;
   std::size_t knownFields_ = 0;
   std::size_t unknownFields_ = 0;
 };
-
-// An envelope is the likelier when its data is the message that its type says.
-void lookIntoEnvelope(std::span<const std::byte> bytes, Explanation& explanation) {
-  const EnvelopeOutline outline = outlineOf(bytes);
-  const MessageType* const payload = outline.data ? PayloadPairing().payloadOf(outline.type) : nullptr;
-  if (payload == nullptr) return;
-  Explanation inner;
-  if (trace(*payload, *outline.data, inner)) explanation.addPayload(inner, outline.data->size());
-}
 
 // The types that the bytes could be, the likeliest first; types that fit alike in the order of the protocol.
 // The error is that of bytes that are no fields at all, whatever the type.
 std::expected<std::vector<Candidate>, DecodeError> rankTypes(std::span<const std::byte> bytes) {
   std::vector<Candidate> candidates;
   for (const MessageType& type : allMessageTypes()) {
-    Explanation explanation;
-    auto traced = trace(type, bytes, explanation);
+    Candidate candidate(type, bytes);
+    auto explained = candidate.explain();
     // What is malformed to a type without fields is malformed to every type.
-    if (!traced && type.descriptor->fields.empty()) {
-      traced.error().path = {};
-      return std::unexpected(traced.error());
+    if (!explained && type.descriptor->fields.empty()) {
+      explained.error().path = {};
+      return std::unexpected(explained.error());
     }
-    if (!traced) continue;
-    if (type.isEnvelope()) lookIntoEnvelope(bytes, explanation);
-    candidates.push_back(explanation.candidate(type, bytes.size()));
+    if (explained) candidates.push_back(candidate);
   }
   std::ranges::sort(candidates, {}, [](const Candidate& candidate) {
-    return std::tuple(-candidate.score, candidate.unknownFields, candidate.type->index);
+    return std::tuple(-candidate.score(), candidate.unknownFields(), candidate.type().index);
   });
   return candidates;
 }
 
-std::string count(std::size_t number, std::string_view thing) {
-  return std::to_string(number) + " " + std::string(thing) + (number == 1 ? "" : "s");
-}
-
 // The likeliest first; of the types that explain nothing, none.
 std::string describe(std::vector<Candidate> candidates) {
-  std::erase_if(candidates, [](const Candidate& candidate) { return candidate.score <= 0; });
+  std::erase_if(candidates, [](const Candidate& candidate) { return candidate.score() <= 0; });
   if (candidates.empty()) return "no type has any of these fields\n";
   std::size_t nameWidth = 0;
   for (const Candidate& candidate : candidates)
-    nameWidth = std::max(nameWidth, candidate.type->fullName().size());
+    nameWidth = std::max(nameWidth, candidate.type().fullName().size());
   std::string text;
   for (const Candidate& candidate : candidates) {
     std::array<char, 16> share;
-    std::snprintf(share.data(), share.size(), "%3.0f %%  ", 100 * candidate.score);
-    text += share.data();
-    text += candidate.type->fullName();
-    text.append(nameWidth + 2 - candidate.type->fullName().size(), ' ');
-    text += count(candidate.knownFields, "field");
-    if (candidate.unknownFields != 0) text += ", " + std::to_string(candidate.unknownFields) + " unknown";
+    std::snprintf(share.data(), share.size(), "%3.0f %%  ", 100 * candidate.score());
+    text.append(share.data()).append(candidate.type().fullName());
+    text.append(nameWidth + 2 - candidate.type().fullName().size(), ' ');
+    text += std::to_string(candidate.knownFields()) + (candidate.knownFields() == 1 ? " field" : " fields");
+    if (candidate.unknownFields() != 0) text += ", " + std::to_string(candidate.unknownFields()) + " unknown";
     text += '\n';
   }
   return text;
@@ -155,10 +146,6 @@ class Identification final : public MessageWork {
 
 }  // namespace
 
-ExitStatus runIdentify(const Options& options) {
-  OutputFile output(options.output);
-  Identification identification(options, output);
-  return forEachMessage(options, output, identification);
-}
+ExitStatus runIdentify(const Options& options) { return forEachMessage<Identification>(options); }
 
 }  // namespace orv::tool

@@ -55,10 +55,6 @@ class Inspection final : public MessageWork {
 
 }  // namespace
 
-ExitStatus runInspect(const Options& options) {
-  OutputFile output(options.output);
-  Inspection inspection(options, output);
-  return forEachMessage(options, output, inspection);
-}
+ExitStatus runInspect(const Options& options) { return forEachMessage<Inspection>(options); }
 
 }  // namespace orv::tool

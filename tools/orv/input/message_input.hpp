@@ -91,4 +91,11 @@ class MessageWork {
 // the end. Files go on behind one that fails; the first failure gives the status.
 ExitStatus forEachMessage(const Options& options, OutputFile& output, MessageWork& work);
 
+template <class Work>
+ExitStatus forEachMessage(const Options& options) {
+  OutputFile output(options.output);
+  Work work(options, output);
+  return forEachMessage(options, output, work);
+}
+
 }  // namespace orv::tool

@@ -94,20 +94,14 @@ EnvelopeOutline outlineOf(std::span<const std::byte> envelope) {
   EnvelopeOutline outline;
   WireReader reader(envelope);
   while (!reader.isAtEnd()) {
-    const std::byte* const tagStart = reader.position();
+    const std::byte* const start = reader.position();
     const auto tag = reader.readTag();
-    if (!tag) break;
-    if (tag->fieldNumber() == typeNumber && tag->wireType() == WireType::varint) {
-      const auto number = reader.readVarint();
-      if (!number) break;
-      outline.type = VessaSessionMessageType(static_cast<std::int32_t>(*number));
-    } else if (tag->fieldNumber() == dataNumber && tag->wireType() == WireType::lengthDelimited) {
-      const auto body = reader.readLengthDelimited();
-      if (!body) break;
-      outline.data = *body;
-    } else if (!reader.skipValue(*tag, tagStart, 0)) {
-      break;
-    }
+    WireReader value = reader;
+    if (!tag || !reader.skipValue(*tag, start, 0)) break;
+    if (tag->fieldNumber() == typeNumber && tag->wireType() == WireType::varint)
+      outline.type = VessaSessionMessageType(static_cast<std::int32_t>(*value.readVarint()));
+    if (tag->fieldNumber() == dataNumber && tag->wireType() == WireType::lengthDelimited)
+      outline.data = *value.readLengthDelimited();
   }
   return outline;
 }
