@@ -76,7 +76,7 @@ class TracingVisitor {
   std::vector<std::string> visits_;
   std::size_t failingVisit_;
   Error error_;
-  bool throws_;
+  [[maybe_unused]] bool throws_;  // unused where there are no exceptions
 };
 
 static_assert(Visitor<TracingVisitor>);
