@@ -8,30 +8,7 @@
 
 namespace orv::inline v0 {
 
-namespace {
-
 namespace io = google::protobuf::io;
-
-// The read function as libprotobuf's streams see it.
-class ReadFunctionStream final : public io::CopyingInputStream {
- public:
-  explicit ReadFunctionStream(ReadFunction read) : read_(std::move(read)) {}
-
-  int Read(void* buffer, int size) override {
-    const std::ptrdiff_t count =
-        read_(std::span(static_cast<std::byte*>(buffer), static_cast<std::size_t>(size)));
-    const bool isPossible = count >= 0 && count <= size;
-    hasFailed_ = hasFailed_ || !isPossible;
-    return isPossible ? static_cast<int>(count) : -1;
-  }
-  bool hasFailed() const { return hasFailed_; }
-
- private:
-  ReadFunction read_;
-  bool hasFailed_ = false;
-};
-
-}  // namespace
 
 class DelimitedReader::Source {
  public:
@@ -42,8 +19,27 @@ class DelimitedReader::Source {
   const DelimitedParser& parser() const { return parser_; }
 
  private:
+  // The read function as libprotobuf's streams see it.
+  class Stream final : public io::CopyingInputStream {
+   public:
+    explicit Stream(ReadFunction read) : read_(std::move(read)) {}
+
+    int Read(void* buffer, int size) override {
+      const std::ptrdiff_t count =
+          read_(std::span(static_cast<std::byte*>(buffer), static_cast<std::size_t>(size)));
+      const bool isPossible = count >= 0 && count <= size;
+      hasFailed_ = hasFailed_ || !isPossible;
+      return isPossible ? static_cast<int>(count) : -1;
+    }
+    bool hasFailed() const { return hasFailed_; }
+
+   private:
+    ReadFunction read_;
+    bool hasFailed_ = false;
+  };
+
   DelimitedParser parser_;
-  ReadFunctionStream stream_;
+  Stream stream_;
   io::CopyingInputStreamAdaptor buffered_;
 };
 

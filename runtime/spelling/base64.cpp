@@ -11,7 +11,7 @@ namespace {
 constexpr std::string_view alphabet = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
 constexpr std::uint8_t noDigit = 64;
 
-constexpr auto digits = [] {
+constexpr auto digitValues = [] {
   std::array<std::uint8_t, 256> table{};
   table.fill(noDigit);
   for (std::size_t value = 0; value < alphabet.size(); ++value)
@@ -49,7 +49,7 @@ std::optional<std::string> decodeBase64(std::string_view text) {
   std::uint32_t bits = 0;
   int bitCount = 0;
   for (const char character : text) {
-    const std::uint8_t digit = digits[static_cast<unsigned char>(character)];
+    const std::uint8_t digit = digitValues[static_cast<unsigned char>(character)];
     if (digit == noDigit) return std::nullopt;
     bits = bits << 6 | digit;
     bitCount += 6;
