@@ -24,10 +24,10 @@ namespace orv::inline v0 {
 // succeeded; error() says what was wrong.
 class BinaryDecoder : private internal::OutermostFrame, public internal::FieldReader {
  public:
-  explicit BinaryDecoder(ByteView input, ConflictHook hook = {})
+  explicit BinaryDecoder(ByteView input ORV_BOUND, ConflictHook hook = {})
       : OutermostFrame(input.bytes().data(), hook),
         FieldReader(input.bytes(), input.bytes().data() + input.size(), *this) {}
-  BinaryDecoder(ByteView input, const DecodeLimits& limits, ConflictHook hook = {})
+  BinaryDecoder(ByteView input ORV_BOUND, const DecodeLimits& limits, ConflictHook hook = {})
       : OutermostFrame(input.bytes(), hook, limits),
         FieldReader(input.bytes(), input.bytes().data() + input.size(), *this) {}
   BinaryDecoder(const BinaryDecoder&) = delete;

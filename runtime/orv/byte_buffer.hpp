@@ -12,6 +12,7 @@
 #include <type_traits>
 
 #include <orv/hasher.hpp>
+#include <orv/internal/compiler.hpp>
 #include <orv/internal/inline_bytes.hpp>
 
 namespace orv::inline v0 {
@@ -31,6 +32,9 @@ concept SpannedBytes = requires(R& range) {
 };
 template <class R>
 concept ByteRange = SpannedBytes<R> && !std::is_array_v<R>;
+// One that is a view itself, and need not last as long as what is made of it.
+template <class R>
+concept BorrowedBytes = ByteRange<R> && std::ranges::enable_borrowed_range<R>;
 // One that can be written to.
 template <class R>
 concept ByteRoom = SpannedBytes<R> && requires(R& range) {
@@ -48,7 +52,10 @@ class ByteView {
  public:
   constexpr ByteView() = default;  // of no bytes
   template <internal::ByteRange R>
-  ByteView(const R& range)  // NOLINT(google-explicit-constructor): any bytes are a view of them
+  ByteView(const R& range ORV_BOUND)  // NOLINT(google-explicit-constructor): any bytes are a view of them
+      : ByteView(std::span<const std::byte>(std::as_bytes(std::span(range)))) {}
+  template <internal::BorrowedBytes R>
+  ByteView(const R& range)  // NOLINT(google-explicit-constructor)
       : ByteView(std::span<const std::byte>(std::as_bytes(std::span(range)))) {}
   // NOLINTNEXTLINE(google-explicit-constructor)
   constexpr ByteView(std::string_view characters) : characters_(characters) {}
@@ -106,11 +113,11 @@ class ByteBuffer {
   bool isEmpty() const { return size() == 0; }
   bool empty() const { return isEmpty(); }
   // The views, the pointer and the iterators are valid until the buffer is assigned to or destroyed.
-  std::span<const std::byte> bytes() const { return std::as_bytes(std::span(characters())); }
-  std::string_view characters() const { return bytes_.view(); }
-  const std::byte* data() const { return bytes().data(); }
-  const std::byte* begin() const { return data(); }
-  const std::byte* end() const { return data() + size(); }
+  std::span<const std::byte> bytes() const ORV_BOUND { return std::as_bytes(std::span(characters())); }
+  std::string_view characters() const ORV_BOUND { return bytes_.view(); }
+  const std::byte* data() const ORV_BOUND { return bytes().data(); }
+  const std::byte* begin() const ORV_BOUND { return data(); }
+  const std::byte* end() const ORV_BOUND { return data() + size(); }
   // `index` is less than size().
   std::byte operator[](std::size_t index) const { return static_cast<std::byte>(characters()[index]); }
 

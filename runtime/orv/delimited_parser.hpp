@@ -11,6 +11,7 @@
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_limits.hpp>
+#include <orv/internal/compiler.hpp>
 #include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {
@@ -36,7 +37,7 @@ class DelimitedParser {
   void push(ByteView bytes);
 
   // The next message's bytes, which are valid until the next push; none where it has not arrived as a whole.
-  [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
+  [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next() ORV_BOUND;
 
   // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>

@@ -13,6 +13,7 @@
 #include <orv/decode_limits.hpp>
 #include <orv/delimited_parser.hpp>
 #include <orv/delimited_writer.hpp>
+#include <orv/internal/compiler.hpp>
 #include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {
@@ -45,7 +46,7 @@ class DelimitedReader {
 
   // The next message's bytes, which are valid until the next call; none where the stream ends between two
   // messages.
-  [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next();
+  [[nodiscard]] std::expected<std::optional<std::span<const std::byte>>, StreamError> next() ORV_BOUND;
 
   // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>

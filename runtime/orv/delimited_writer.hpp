@@ -9,6 +9,7 @@
 #include <string_view>
 
 #include <orv/encode_error.hpp>
+#include <orv/internal/compiler.hpp>
 
 namespace orv::inline v0 {
 
@@ -19,10 +20,10 @@ class DelimitedHeader {
   // For a message of so many bytes, below 2^31.
   explicit DelimitedHeader(std::size_t messageSizeInBytes);
 
-  const std::byte* data() const { return bytes_.data(); }
+  const std::byte* data() const ORV_BOUND { return bytes_.data(); }
   std::size_t size() const { return size_; }
-  const std::byte* begin() const { return data(); }
-  const std::byte* end() const { return data() + size(); }
+  const std::byte* begin() const ORV_BOUND { return data(); }
+  const std::byte* end() const ORV_BOUND { return data() + size(); }
 
  private:
   std::array<std::byte, 5> bytes_{};

@@ -1,19 +1,11 @@
 // Collects what a value is made of into one number.
 #pragma once
 
-// Messages, texts and bytes reach this header before the others: what cannot compile them says so here, and stops at
-// a file that is not there, in place of hundreds of errors.
-#if __has_include(<version>)
-#include <version>
-#endif
-#ifndef __cpp_lib_expected
-#error "orv needs C++23: g++ 12 or clang 19, or newer, with -std=c++23"
-#include "orv needs C++23"
-#endif
-
 #include <cstddef>
 #include <cstdint>
 #include <string_view>
+
+#include <orv/internal/compiler.hpp>
 
 namespace orv::inline v0 {
 

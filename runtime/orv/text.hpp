@@ -12,6 +12,7 @@
 
 #include <orv/hasher.hpp>
 #include <orv/internal/bad_access.hpp>
+#include <orv/internal/compiler.hpp>
 #include <orv/internal/inline_bytes.hpp>
 
 namespace orv::inline v0 {
@@ -62,8 +63,8 @@ class Text {
   [[nodiscard]] static std::expected<Text, IllFormedText> checked(std::string_view utf8);
 
   // The UTF-8 bytes as they were given. The view is valid until the text is changed or destroyed.
-  std::string_view utf8() const { return bytes_.view(); }
-  operator std::string_view() const { return utf8(); }  // NOLINT(google-explicit-constructor): a view of it
+  std::string_view utf8() const ORV_BOUND { return bytes_.view(); }
+  operator std::string_view() const ORV_BOUND { return utf8(); }  // NOLINT(google-explicit-constructor)
   std::size_t sizeInBytes() const { return bytes_.size(); }
   std::size_t size() const { return sizeInBytes(); }
   bool isEmpty() const { return sizeInBytes() == 0; }

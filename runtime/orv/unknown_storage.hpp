@@ -8,6 +8,7 @@
 #include <utility>
 
 #include <orv/decode_error.hpp>
+#include <orv/internal/compiler.hpp>
 #include <orv/internal/seam.hpp>
 #include <orv/wire_reader.hpp>
 
@@ -66,7 +67,7 @@ class UnknownStorage {
   [[nodiscard]] std::expected<void, DecodeError> append(std::span<const std::byte> records);
 
   bool isEmpty() const { return block_ == nullptr || block_->size == 0; }
-  std::span<const std::byte> records() const {
+  std::span<const std::byte> records() const ORV_BOUND {
     return block_ == nullptr ? std::span<const std::byte>()
                              : std::span<const std::byte>(bytes(), block_->size);
   }
@@ -77,7 +78,7 @@ class UnknownStorage {
 
   // Walks the fields one by one: for (const UnknownField& field : store).
   class Iterator;
-  Iterator begin() const;
+  Iterator begin() const ORV_BOUND;
   std::default_sentinel_t end() const { return {}; }
 
   // Hands the kept records to the visitor, if there are any.
@@ -120,8 +121,8 @@ class UnknownStorage::Iterator {
   Iterator() = default;
   explicit Iterator(std::span<const std::byte> records) : reader_(records) { ++*this; }
 
-  const UnknownField& operator*() const { return field_; }
-  const UnknownField* operator->() const { return &field_; }
+  const UnknownField& operator*() const ORV_BOUND { return field_; }
+  const UnknownField* operator->() const ORV_BOUND { return &field_; }
   Iterator& operator++();
   void operator++(int) { ++*this; }
   friend bool operator==(const Iterator& iterator, std::default_sentinel_t) { return iterator.isAtEnd_; }

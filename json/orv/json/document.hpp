@@ -9,6 +9,7 @@
 #include <string_view>
 
 #include <orv/decode_limits.hpp>
+#include <orv/internal/compiler.hpp>
 #include <orv/json/error.hpp>
 
 namespace orv::inline v0::json {
@@ -65,7 +66,7 @@ class Document {
   Document& operator=(Document&&) noexcept;
   ~Document();
 
-  Value root() const;
+  Value root() const ORV_BOUND;
 
  private:
   struct Contents;

@@ -21,24 +21,24 @@ class ConnectionRequest final : public Message<ConnectionRequest> {
   ConnectionRequest& operator=(const ConnectionRequest& other) { return assign(other); }
   ConnectionRequest& operator=(ConnectionRequest&& other) noexcept { return assign(std::move(other)); }
 
-  const Text& identifier() const { return identifier_; }
+  const Text& identifier() const ORV_BOUND { return identifier_; }
   Text& mutableIdentifier() { return identifier_; }
   void setIdentifier(Text value) { identifier_ = std::move(value); }
 
   // How the device is addressed.
-  const Text& handle() const { return handle_; }
+  const Text& handle() const ORV_BOUND { return handle_; }
   Text& mutableHandle() { return handle_; }
   void setHandle(Text value) { handle_ = std::move(value); }
 
   // The name to show to people, if any.
-  const Text& displayName() const { return internal::valueOrDefault(displayName_); }
+  const Text& displayName() const ORV_BOUND { return internal::valueOrDefault(displayName_); }
   Text& mutableDisplayName() { return internal::presentValue(displayName_); }  // present from then on
   void setDisplayName(Text value) { displayName_ = std::move(value); }
   bool hasDisplayName() const { return displayName_.has_value(); }
   void clearDisplayName() { displayName_.reset(); }
 
   // Bytes of the application's own, if any.
-  const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
+  const ByteBuffer& userInfo() const ORV_BOUND { return internal::valueOrDefault(userInfo_); }
   ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }  // present from then on
   void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
   bool hasUserInfo() const { return userInfo_.has_value(); }

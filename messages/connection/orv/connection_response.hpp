@@ -40,7 +40,7 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
       ApprovalContent& operator=(ApprovalContent&& other) noexcept { return assign(std::move(other)); }
 
       // Bytes that the device needs to take part; what they hold is between the peers.
-      const ByteBuffer& invitationData() const { return invitationData_; }
+      const ByteBuffer& invitationData() const ORV_BOUND { return invitationData_; }
       void setInvitationData(ByteBuffer value) { invitationData_ = std::move(value); }
 
      private:
@@ -62,11 +62,11 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
     Content& operator=(const Content& other) { return assign(other); }
     Content& operator=(Content&& other) noexcept { return assign(std::move(other)); }
 
-    const Text& identifier() const { return identifier_; }
+    const Text& identifier() const ORV_BOUND { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
     void setIdentifier(Text value) { identifier_ = std::move(value); }
 
-    const Text& handle() const { return handle_; }
+    const Text& handle() const ORV_BOUND { return handle_; }
     Text& mutableHandle() { return handle_; }
     void setHandle(Text value) { handle_ = std::move(value); }
 
@@ -75,17 +75,21 @@ class ConnectionResponse final : public EmptyMessage<ConnectionResponse> {
     OperationCase operationCase() const { return internal::caseHeld<OperationCase>(operation_); }
 
     // The decision as a whole: none, or one case with its payload.
-    const std::optional<OneOf_Operation>& operation() const { return operation_; }
+    const std::optional<OneOf_Operation>& operation() const ORV_BOUND { return operation_; }
     std::optional<OneOf_Operation>& mutableOperation() { return operation_; }
     void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
 
     // A case reads as a default payload unless it is the one held. Setting it, or calling its `mutable…`, makes it
     // the one, and what was held is gone.
-    const DeniedContent& denied() const { return internal::caseOrDefault<DeniedContent>(operation_); }
+    const DeniedContent& denied() const ORV_BOUND {
+      return internal::caseOrDefault<DeniedContent>(operation_);
+    }
     DeniedContent& mutableDenied() { return internal::presentCase<DeniedContent>(operation_); }
     void setDenied(DeniedContent value) { operation_ = std::move(value); }
 
-    const ApprovalContent& approved() const { return internal::caseOrDefault<ApprovalContent>(operation_); }
+    const ApprovalContent& approved() const ORV_BOUND {
+      return internal::caseOrDefault<ApprovalContent>(operation_);
+    }
     ApprovalContent& mutableApproved() { return internal::presentCase<ApprovalContent>(operation_); }
     void setApproved(ApprovalContent value) { operation_ = std::move(value); }
 

@@ -63,7 +63,7 @@ template <class M>
 class Message {
  public:
   // The fields that were read but that M does not define, in the order of their arrival.
-  const UnknownStorage& unknownFields() const { return unknownFields_; }
+  const UnknownStorage& unknownFields() const ORV_BOUND { return unknownFields_; }
   UnknownStorage& mutableUnknownFields() { return unknownFields_; }
   void setUnknownFields(UnknownStorage value) { unknownFields_ = std::move(value); }
 
@@ -228,7 +228,7 @@ class Message {
 //
 //   if (const auto* added = orv::held<Group::MemberAdded>(group.event())) …
 template <class Case, class... Cases>
-const Case* held(const std::optional<std::variant<Cases...>>& oneof) {
+const Case* held(const std::optional<std::variant<Cases...>>& oneof ORV_BOUND) {
   return oneof.has_value() ? std::get_if<Case>(&*oneof) : nullptr;
 }
 

@@ -72,7 +72,7 @@ class SessionMessage final : public Message<SessionMessage> {
   void clearType() { type_.reset(); }
 
   // The payload's own encoding, in a form that the peers agree on.
-  const ByteBuffer& data() const { return internal::valueOrDefault(data_); }
+  const ByteBuffer& data() const ORV_BOUND { return internal::valueOrDefault(data_); }
   ByteBuffer& mutableData() { return internal::presentValue(data_); }  // present from then on
   void setData(ByteBuffer value) { data_ = std::move(value); }
   bool hasData() const { return data_.has_value(); }

@@ -29,11 +29,11 @@ class Group final : public Message<Group> {
     Initialization& operator=(const Initialization& other) { return assign(other); }
     Initialization& operator=(Initialization&& other) noexcept { return assign(std::move(other)); }
 
-    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    const ByteBuffer& groupUuid() const ORV_BOUND { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
     // In the order given; duplicates are kept.
-    const std::vector<Member>& members() const { return members_; }
+    const std::vector<Member>& members() const ORV_BOUND { return members_; }
     std::vector<Member>& mutableMembers() { return members_; }
     void setMembers(std::vector<Member> value) { members_ = std::move(value); }
 
@@ -52,10 +52,10 @@ class Group final : public Message<Group> {
   template <class Event>
   class MemberEvent : public Message<Event> {
    public:
-    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    const ByteBuffer& groupUuid() const ORV_BOUND { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
-    const Member& member() const { return internal::valueOrDefault(member_); }
+    const Member& member() const ORV_BOUND { return internal::valueOrDefault(member_); }
     Member& mutableMember() { return internal::presentValue(member_); }  // present from then on
     void setMember(Member value) { member_ = std::move(value); }
     bool hasMember() const { return member_.has_value(); }
@@ -110,7 +110,7 @@ class Group final : public Message<Group> {
     MemberLeft& operator=(const MemberLeft& other) { return assign(other); }
     MemberLeft& operator=(MemberLeft&& other) noexcept { return assign(std::move(other)); }
 
-    const ByteBuffer& groupUuid() const { return groupUuid_; }
+    const ByteBuffer& groupUuid() const ORV_BOUND { return groupUuid_; }
     void setGroupUuid(ByteBuffer value) { groupUuid_ = std::move(value); }
 
     bool usesToken() const { return usesToken_; }
@@ -142,25 +142,29 @@ class Group final : public Message<Group> {
   EventCase eventCase() const { return internal::caseHeld<EventCase>(event_); }
 
   // The event as a whole: none, or one case with its payload.
-  const std::optional<OneOf_Event>& event() const { return event_; }
+  const std::optional<OneOf_Event>& event() const ORV_BOUND { return event_; }
   std::optional<OneOf_Event>& mutableEvent() { return event_; }
   void setEvent(std::optional<OneOf_Event> value) { event_ = std::move(value); }
 
   // A case reads as a default payload unless it is the one held. Setting it, or calling its `mutable…`, makes it
   // the one, and what was held is gone.
-  const Initialization& initialize() const { return internal::caseOrDefault<Initialization>(event_); }
+  const Initialization& initialize() const ORV_BOUND {
+    return internal::caseOrDefault<Initialization>(event_);
+  }
   Initialization& mutableInitialize() { return internal::presentCase<Initialization>(event_); }
   void setInitialize(Initialization value) { event_ = std::move(value); }
 
-  const MemberAdded& memberAdded() const { return internal::caseOrDefault<MemberAdded>(event_); }
+  const MemberAdded& memberAdded() const ORV_BOUND { return internal::caseOrDefault<MemberAdded>(event_); }
   MemberAdded& mutableMemberAdded() { return internal::presentCase<MemberAdded>(event_); }
   void setMemberAdded(MemberAdded value) { event_ = std::move(value); }
 
-  const MemberRemoved& memberRemoved() const { return internal::caseOrDefault<MemberRemoved>(event_); }
+  const MemberRemoved& memberRemoved() const ORV_BOUND {
+    return internal::caseOrDefault<MemberRemoved>(event_);
+  }
   MemberRemoved& mutableMemberRemoved() { return internal::presentCase<MemberRemoved>(event_); }
   void setMemberRemoved(MemberRemoved value) { event_ = std::move(value); }
 
-  const MemberLeft& memberLeft() const { return internal::caseOrDefault<MemberLeft>(event_); }
+  const MemberLeft& memberLeft() const ORV_BOUND { return internal::caseOrDefault<MemberLeft>(event_); }
   MemberLeft& mutableMemberLeft() { return internal::presentCase<MemberLeft>(event_); }
   void setMemberLeft(MemberLeft value) { event_ = std::move(value); }
 

@@ -22,12 +22,12 @@ class Member final : public Message<Member> {
   Member& operator=(Member&& other) noexcept { return assign(std::move(other)); }
 
   // How the member is addressed.
-  const Text& handle() const { return handle_; }
+  const Text& handle() const ORV_BOUND { return handle_; }
   Text& mutableHandle() { return handle_; }
   void setHandle(Text value) { handle_ = std::move(value); }
 
   // The token that the member joined with, if any.
-  const Text& tokenID() const { return internal::valueOrDefault(tokenID_); }
+  const Text& tokenID() const ORV_BOUND { return internal::valueOrDefault(tokenID_); }
   Text& mutableTokenID() { return internal::presentValue(tokenID_); }  // present from then on
   void setTokenID(Text value) { tokenID_ = std::move(value); }
   bool hasTokenID() const { return tokenID_.has_value(); }

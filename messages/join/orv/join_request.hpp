@@ -24,19 +24,19 @@ class JoinRequest final : public Message<JoinRequest> {
     Content& operator=(const Content& other) { return assign(other); }
     Content& operator=(Content&& other) noexcept { return assign(std::move(other)); }
 
-    const Text& identifier() const { return identifier_; }
+    const Text& identifier() const ORV_BOUND { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
     void setIdentifier(Text value) { identifier_ = std::move(value); }
 
     // The name to show to people, if any.
-    const Text& displayName() const { return internal::valueOrDefault(displayName_); }
+    const Text& displayName() const ORV_BOUND { return internal::valueOrDefault(displayName_); }
     Text& mutableDisplayName() { return internal::presentValue(displayName_); }  // present from then on
     void setDisplayName(Text value) { displayName_ = std::move(value); }
     bool hasDisplayName() const { return displayName_.has_value(); }
     void clearDisplayName() { displayName_.reset(); }
 
     // Bytes of the application's own, if any.
-    const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
+    const ByteBuffer& userInfo() const ORV_BOUND { return internal::valueOrDefault(userInfo_); }
     ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }  // present from then on
     void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
     bool hasUserInfo() const { return userInfo_.has_value(); }
@@ -72,13 +72,13 @@ class JoinRequest final : public Message<JoinRequest> {
   JoinRequest& operator=(const JoinRequest& other) { return assign(other); }
   JoinRequest& operator=(JoinRequest&& other) noexcept { return assign(std::move(other)); }
 
-  const ByteBuffer& publicKey() const { return internal::valueOrDefault(publicKey_); }
+  const ByteBuffer& publicKey() const ORV_BOUND { return internal::valueOrDefault(publicKey_); }
   ByteBuffer& mutablePublicKey() { return internal::presentValue(publicKey_); }  // present from then on
   void setPublicKey(ByteBuffer value) { publicKey_ = std::move(value); }
   bool hasPublicKey() const { return publicKey_.has_value(); }
   void clearPublicKey() { publicKey_.reset(); }
 
-  const ByteBuffer& encryptedData() const { return internal::valueOrDefault(encryptedData_); }
+  const ByteBuffer& encryptedData() const ORV_BOUND { return internal::valueOrDefault(encryptedData_); }
   ByteBuffer& mutableEncryptedData() {
     return internal::presentValue(encryptedData_);
   }  // present from then on

@@ -39,17 +39,17 @@ class JoinResponse final : public Message<JoinResponse> {
       ApprovalContent& operator=(const ApprovalContent& other) { return assign(other); }
       ApprovalContent& operator=(ApprovalContent&& other) noexcept { return assign(std::move(other)); }
 
-      const Text& sessionIdentifier() const { return sessionIdentifier_; }
+      const Text& sessionIdentifier() const ORV_BOUND { return sessionIdentifier_; }
       Text& mutableSessionIdentifier() { return sessionIdentifier_; }
       void setSessionIdentifier(Text value) { sessionIdentifier_ = std::move(value); }
 
       // The handles of the session's members, in the order given.
-      const std::vector<Text>& memberHandles() const { return memberHandles_; }
+      const std::vector<Text>& memberHandles() const ORV_BOUND { return memberHandles_; }
       std::vector<Text>& mutableMemberHandles() { return memberHandles_; }
       void setMemberHandles(std::vector<Text> value) { memberHandles_ = std::move(value); }
 
       // Bytes of the application's own, if any.
-      const ByteBuffer& userInfo() const { return internal::valueOrDefault(userInfo_); }
+      const ByteBuffer& userInfo() const ORV_BOUND { return internal::valueOrDefault(userInfo_); }
       ByteBuffer& mutableUserInfo() { return internal::presentValue(userInfo_); }  // present from then on
       void setUserInfo(ByteBuffer value) { userInfo_ = std::move(value); }
       bool hasUserInfo() const { return userInfo_.has_value(); }
@@ -78,7 +78,7 @@ class JoinResponse final : public Message<JoinResponse> {
     Content& operator=(const Content& other) { return assign(other); }
     Content& operator=(Content&& other) noexcept { return assign(std::move(other)); }
 
-    const Text& identifier() const { return identifier_; }
+    const Text& identifier() const ORV_BOUND { return identifier_; }
     Text& mutableIdentifier() { return identifier_; }
     void setIdentifier(Text value) { identifier_ = std::move(value); }
 
@@ -87,17 +87,21 @@ class JoinResponse final : public Message<JoinResponse> {
     OperationCase operationCase() const { return internal::caseHeld<OperationCase>(operation_); }
 
     // The decision as a whole: none, or one case with its payload.
-    const std::optional<OneOf_Operation>& operation() const { return operation_; }
+    const std::optional<OneOf_Operation>& operation() const ORV_BOUND { return operation_; }
     std::optional<OneOf_Operation>& mutableOperation() { return operation_; }
     void setOperation(std::optional<OneOf_Operation> value) { operation_ = std::move(value); }
 
     // A case reads as a default payload unless it is the one held. Setting it, or calling its `mutable…`, makes it
     // the one, and what was held is gone.
-    const DeniedContent& denied() const { return internal::caseOrDefault<DeniedContent>(operation_); }
+    const DeniedContent& denied() const ORV_BOUND {
+      return internal::caseOrDefault<DeniedContent>(operation_);
+    }
     DeniedContent& mutableDenied() { return internal::presentCase<DeniedContent>(operation_); }
     void setDenied(DeniedContent value) { operation_ = std::move(value); }
 
-    const ApprovalContent& approved() const { return internal::caseOrDefault<ApprovalContent>(operation_); }
+    const ApprovalContent& approved() const ORV_BOUND {
+      return internal::caseOrDefault<ApprovalContent>(operation_);
+    }
     ApprovalContent& mutableApproved() { return internal::presentCase<ApprovalContent>(operation_); }
     void setApproved(ApprovalContent value) { operation_ = std::move(value); }
 
@@ -121,7 +125,7 @@ class JoinResponse final : public Message<JoinResponse> {
   JoinResponse& operator=(const JoinResponse& other) { return assign(other); }
   JoinResponse& operator=(JoinResponse&& other) noexcept { return assign(std::move(other)); }
 
-  const ByteBuffer& encryptedData() const { return internal::valueOrDefault(encryptedData_); }
+  const ByteBuffer& encryptedData() const ORV_BOUND { return internal::valueOrDefault(encryptedData_); }
   ByteBuffer& mutableEncryptedData() {
     return internal::presentValue(encryptedData_);
   }  // present from then on

@@ -13,6 +13,8 @@
 #include <type_traits>
 #include <utility>
 
+#include <orv/internal/compiler.hpp>
+
 namespace orv::inline v0::internal {
 
 // Eight bytes, which need not be aligned.
@@ -84,7 +86,7 @@ class InlineBytes {
   }
 
   // Valid until the object is changed or destroyed.
-  std::string_view view() const {
+  std::string_view view() const ORV_BOUND {
     if (isOnHeap()) [[unlikely]] {
       const Block block = heapBlock();
       return {block.data, block.size};
