@@ -1,7 +1,5 @@
 // inspect.
 #include <memory>
-#include <string>
-#include <utility>
 
 #include <orv/byte_view.hpp>
 #include "tools/orv/command_line/command.hpp"
@@ -15,7 +13,7 @@ namespace {
 class Inspection final : public MessageWork {
  public:
   Inspection(const Options& options, OutputFile& output)
-      : options_(options), output_(output), renderer_(Renderer::make(options)) {}
+      : options_(options), output_(output), renderer_(Renderer::make(options, output.gathered())) {}
 
   Outcome<void> take(const MessageInput& message) override {
     const ExplainedMessage explained{.type = *options_.type,
@@ -32,22 +30,17 @@ class Inspection final : public MessageWork {
   // Where a stream ends in a piece that is no message, the dump says so too.
   Outcome<void> takeEnd(const Failure& failure) override {
     if (failure.status == ExitStatus::malformed) renderer_->endFile(failure.line);
-    return write();
+    return {};
   }
 
   Outcome<void> finish() override {
     renderer_->finish();
-    return write();
+    return {};
   }
 
   bool showsErrors() const override { return true; }
 
  private:
-  Outcome<void> write() {
-    const std::string text = std::exchange(renderer_->output(), {});
-    return output_.write(text);
-  }
-
   const Options& options_;
   OutputFile& output_;
   std::unique_ptr<Renderer> renderer_;

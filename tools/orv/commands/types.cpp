@@ -1,6 +1,5 @@
 // types and schema.
 #include <algorithm>
-#include <array>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -14,9 +13,6 @@ namespace orv::tool {
 
 namespace {
 
-// In the order of ValueType. A message is called by its type's name.
-constexpr std::array<std::string_view, 5> valueTypeNames{"string", "bytes", "bool", "uint32", "enum"};
-
 // "optional string", "oneof 1 Group.MemberAdded"
 std::string describe(const FieldDescriptor& field) {
   std::string text;
@@ -27,8 +23,7 @@ std::string describe(const FieldDescriptor& field) {
     case FieldKind::repeated: text = "repeated "; break;
     case FieldKind::oneofMember: text = "oneof " + std::to_string(field.oneof + 1) + ' '; break;
   }
-  return text += field.message != nullptr ? typeOf(*field.message).shortName()
-                                          : valueTypeNames[static_cast<std::size_t>(field.type)];
+  return text += field.message != nullptr ? typeOf(*field.message).shortName() : nameOf(field.type);
 }
 
 std::string describe(const MessageType& type) {

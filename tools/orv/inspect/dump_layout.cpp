@@ -1,6 +1,10 @@
 #include "tools/orv/inspect/dump_layout.hpp"
 
 #include <algorithm>
+#include <array>
+#include <bit>
+#include <cstring>
+#include <limits>
 
 #include <orv/internal/hex_digits.hpp>
 #include <orv/spelling/value_text.hpp>
@@ -14,31 +18,12 @@ constexpr std::size_t offsetDigits = 4;
 constexpr std::size_t bytesColumn = offsetDigits + 2;
 constexpr std::size_t pathColumn = 32;
 constexpr std::size_t kindColumn = 7;
+constexpr std::size_t gap = 2;
 
 // Terminals from these widths on have room for so much.
 constexpr std::size_t wide = 140;
 constexpr std::size_t middling = 100;
 constexpr std::size_t narrow = 72;
-
-// As hexNumber, without a string.
-std::string_view hexDigits(std::uint64_t number, std::span<char, 16> digits) {
-  std::size_t at = digits.size();
-  for (; number != 0 || at > digits.size() - offsetDigits; number >>= 4)
-    digits[--at] = internal::hexDigits[number & 0xF];
-  return {digits.data() + at, digits.size() - at};
-}
-
-// Two digits and a space for each byte.
-void appendSpacedHex(std::span<const std::byte> bytes, std::string& output) {
-  const std::size_t start = output.size();
-  output.resize(start + 3 * bytes.size(), ' ');
-  char* target = output.data() + start;
-  for (const std::byte byte : bytes) {
-    *target++ = internal::hexDigits[std::to_integer<std::size_t>(byte >> 4)];
-    *target++ = internal::hexDigits[std::to_integer<std::size_t>(byte & std::byte{0xF})];
-    ++target;
-  }
-}
 
 std::size_t rowSize(std::size_t width) {
   if (width == 0) return 8;
@@ -46,15 +31,118 @@ std::size_t rowSize(std::size_t width) {
   return width >= narrow ? 8 : 4;
 }
 
+// Of each byte, with the space behind, and one more character so that it is copied at once.
+constexpr auto spacedDigits = [] {
+  std::array<std::array<char, 4>, 256> table{};
+  for (std::size_t byte = 0; byte < table.size(); ++byte)
+    table[byte] = {internal::hexDigits[byte >> 4], internal::hexDigits[byte & 0xF], ' ', ' '};
+  return table;
+}();
+
+// A text takes no more columns than bytes.
+bool fits(std::string_view text, std::size_t room) {
+  return text.size() <= room || spelling::columns(text) <= room;
+}
+
 }  // namespace
 
-DumpLayout::DumpLayout(std::size_t width, Palette palette)
-    : width_(width),
-      bytesPerRow_(rowSize(width)),
-      isAligned_(width == 0 || width >= middling),
-      palette_(palette) {}
+// Sets the rows of a record in room that there is for them.
+class DumpLayout::Rows {
+ public:
+  Rows(const DumpLayout& layout, char* start) : layout_(layout), row_(start), at_(start) {}
 
-std::size_t DumpLayout::noteColumn() const { return bytesColumn + 3 * bytesPerRow_ + 1; }
+  // What the rows of a record take at most, in characters.
+  static std::size_t roomFor(const DumpLayout& layout, std::size_t rows, const Note& note) {
+    constexpr std::size_t longestOffset = 16;
+    constexpr std::size_t colours = 64;
+    return rows * (longestOffset + gap + 3 * layout.bytesPerRow_ + 1 + colours) + 2 * layout.noteColumn_ +
+           layout.pathWidth_ + layout.kindWidth_ + note.path.size() + note.kind.size() + note.value.size() +
+           3 * (colours + 2 * note.depth);
+  }
+
+  const char* end() const { return at_; }
+
+  // Up to the note, so far indented.
+  void addGap(std::size_t column, std::size_t indentation) {
+    addSpaces(std::max(column + 1, layout_.noteColumn_) - column);
+    addSpaces(std::min(indentation, layout_.roomBehind(layout_.noteColumn_)));
+  }
+
+  // As much of the text as the room holds, with an ellipsis where it is cut.
+  void addFitting(Palette::Colour colour, std::string_view text, std::size_t room) {
+    if (text.empty() || room == 0) return;
+    const bool isCut = !fits(text, room);
+    startColour(colour);
+    add(isCut ? spelling::startWithin(text, room - 1) : text);
+    if (isCut) add("…");
+    stopColour();
+  }
+
+  // In so many columns, of which there may be fewer.
+  void addColumn(Palette::Colour colour, std::string_view text, std::size_t width, std::size_t room) {
+    width = std::min(width, room);
+    addFitting(colour, text, width);
+    addSpaces(width - std::min(width, text.size()));
+  }
+
+  // Those of the row that begins with the byte `row`. Answers the column behind them.
+  std::size_t addBytes(const Bytes& bytes, std::size_t row) {
+    const std::size_t headerEnd = bytes.header.size();
+    const std::size_t end = std::min(row + layout_.bytesPerRow_, headerEnd + bytes.value.size());
+    const std::size_t split = std::clamp(headerEnd, row, end);
+    const std::size_t start = addOffset(bytes.offset + row);
+    if (split > row) addDigits(Palette::Colour::tag, bytes.header.subspan(row, split - row));
+    if (end > split) addDigits(bytes.valueColour, bytes.value.subspan(split - headerEnd, end - split));
+    return start + 3 * (end - row);
+  }
+
+  void endRow() {
+    while (at_ != row_ && at_[-1] == ' ') --at_;
+    *at_++ = '\n';
+    row_ = at_;
+  }
+
+ private:
+  void addSpaces(std::size_t count) { at_ = std::fill_n(at_, count, ' '); }
+  void add(std::string_view text) { at_ = std::ranges::copy(text, at_).out; }
+  void startColour(Palette::Colour colour) { add(layout_.palette_.start(colour)); }
+  void stopColour() { add(layout_.palette_.stop()); }
+
+  // Longer offsets take of the gap before the bytes.
+  std::size_t addOffset(std::uint64_t offset) {
+    const std::size_t digits =
+        std::max(offsetDigits, (static_cast<std::size_t>(std::bit_width(offset)) + 3) / 4);
+    startColour(Palette::Colour::offset);
+    for (std::size_t at = digits; at-- > 0; offset >>= 4) at_[at] = internal::hexDigits[offset & 0xF];
+    at_ += digits;
+    stopColour();
+    const std::size_t end = std::max(digits + 1, bytesColumn);
+    addSpaces(end - digits);
+    return end;
+  }
+
+  void addDigits(Palette::Colour colour, std::span<const std::byte> bytes) {
+    startColour(colour);
+    for (const std::byte byte : bytes) {
+      const auto& digits = spacedDigits[std::to_integer<std::size_t>(byte)];
+      std::memcpy(at_, digits.data(), digits.size());
+      at_ += 3;
+    }
+    stopColour();
+  }
+
+  const DumpLayout& layout_;
+  char* row_;  // where it begins
+  char* at_;
+};
+
+DumpLayout::DumpLayout(std::size_t width, Palette palette)
+    : width_(width == 0 ? std::numeric_limits<std::size_t>::max() : width),
+      bytesPerRow_(rowSize(width)),
+      noteColumn_(bytesColumn + 3 * bytesPerRow_ + 1),
+      pathWidth_(width_ >= middling ? pathColumn + gap : 0),
+      kindWidth_(width_ >= middling ? kindColumn + gap : 0),
+      palette_(palette) {}
 
 void DumpLayout::appendHeading(std::string& output, std::string_view text) const {
   palette_.append(output, Palette::Colour::payload, text);
@@ -62,109 +150,37 @@ void DumpLayout::appendHeading(std::string& output, std::string_view text) const
 }
 
 void DumpLayout::appendRecord(std::string& output, const Bytes& bytes, const Note& note) const {
+  const std::size_t indentation = 2 * note.depth;
+  const std::size_t pathStart = noteColumn_ + indentation;
+  const std::size_t kindStart = std::max(noteColumn_ + pathWidth_, pathStart + note.path.size() + gap);
+  const std::size_t valueStart = kindStart + std::max(kindWidth_, note.kind.size() + gap);
+  const bool isBeside = fits(note.value, roomBehind(valueStart));
+  const auto nameColour = note.colour == Palette::Colour::value ? Palette::Colour::name : note.colour;
   const std::size_t size = bytes.header.size() + bytes.value.size();
-  const bool isValueBelow = !fitsBeside(note);
-  const std::size_t end = std::max(size, isValueBelow ? bytesPerRow_ + 1 : 1);
-  for (std::size_t row = 0; row < end; row += bytesPerRow_) {
-    if (row < size) {
-      appendBytes(output, bytes, row);
-    } else {
-      output.append(noteColumn(), ' ');
+  const std::size_t end = std::max(size, isBeside ? 1 : bytesPerRow_ + 1);
+  const std::size_t before = output.size();
+  const std::size_t room = Rows::roomFor(*this, (end + bytesPerRow_ - 1) / bytesPerRow_, note);
+  output.resize_and_overwrite(before + room, [&](char* text, std::size_t) {
+    Rows rows(*this, text + before);
+    for (std::size_t row = 0; row < end; row += bytesPerRow_) {
+      const std::size_t column = row < size ? rows.addBytes(bytes, row) : 0;
+      if (row == 0) {
+        rows.addGap(column, indentation);
+        rows.addColumn(nameColour, note.path, kindStart - pathStart, roomBehind(pathStart));
+        rows.addColumn(Palette::Colour::kind, note.kind, valueStart - kindStart, roomBehind(kindStart));
+        if (isBeside) rows.addFitting(note.colour, note.value, roomBehind(valueStart));
+      } else if (row == bytesPerRow_ && !isBeside) {
+        rows.addGap(column, indentation + gap);
+        rows.addFitting(note.colour, note.value, roomBehind(pathStart + gap));
+      }
+      rows.endRow();
     }
-    if (row == 0) appendNote(output, note);
-    if (row == (isValueBelow ? bytesPerRow_ : 0)) appendValue(output, note, isValueBelow);
-    while (output.ends_with(' ')) output.pop_back();
-    output += '\n';
-  }
-}
-
-void DumpLayout::appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const {
-  char digits[16];
-  const std::string_view offset = hexDigits(bytes.offset + row, digits);
-  palette_.append(output, Palette::Colour::offset, offset);
-  // Longer offsets take of the gaps before and behind the bytes.
-  const std::size_t start = std::max(offset.size() + 1, bytesColumn);
-  output.append(start - offset.size(), ' ');
-  const auto append = [&](Palette::Colour colour, std::span<const std::byte> part) {
-    if (part.empty()) return;
-    palette_.start(output, colour);
-    appendSpacedHex(part, output);
-    palette_.stop(output);
-  };
-  const std::size_t headerEnd = bytes.header.size();
-  const std::size_t end = std::max(row, std::min(row + bytesPerRow_, headerEnd + bytes.value.size()));
-  const std::size_t split = std::clamp(headerEnd, row, end);
-  if (split > row) append(Palette::Colour::tag, bytes.header.subspan(row, split - row));
-  if (end > split) append(bytes.valueColour, bytes.value.subspan(split - headerEnd, end - split));
-  const std::size_t column = start + 3 * (end - row);
-  output.append(std::max(column + 1, noteColumn()) - column, ' ');
-}
-
-std::size_t DumpLayout::indentation(const Note& note) { return 2 * note.depth; }
-
-std::size_t DumpLayout::pathWidth(const Note& note) const {
-  const std::size_t column = isAligned_ ? pathColumn - std::min(pathColumn, indentation(note)) : 0;
-  return std::max(spelling::columns(note.path), column) + 2;
-}
-
-std::size_t DumpLayout::kindWidth(const Note& note) const {
-  return std::max(spelling::columns(note.kind), isAligned_ ? kindColumn : 0) + 2;
-}
-
-std::size_t DumpLayout::roomBehind(std::size_t column) const {
-  return width_ == 0 ? std::string::npos : width_ - std::min(width_, column);
-}
-
-bool DumpLayout::fitsBeside(const Note& note) const {
-  if (width_ == 0) return true;
-  const std::size_t start = noteColumn() + indentation(note) + pathWidth(note) + kindWidth(note);
-  return spelling::columns(note.value) <= roomBehind(start);
-}
-
-std::size_t DumpLayout::appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
-                                      std::size_t room) const {
-  if (text.empty() || room == 0) return 0;
-  const std::size_t width = spelling::columns(text);
-  palette_.start(output, colour);
-  std::size_t shown = width;
-  if (width <= room) {
-    output += text;
-  } else {
-    const std::string_view start = spelling::startWithin(text, room - 1);
-    output.append(start).append("…");
-    shown = spelling::columns(start) + 1;
-  }
-  palette_.stop(output);
-  return shown;
-}
-
-void DumpLayout::appendNote(std::string& output, const Note& note) const {
-  std::size_t column = noteColumn() + std::min(roomBehind(noteColumn()), indentation(note));
-  output.append(column - noteColumn(), ' ');
-  const auto append = [&](Palette::Colour colour, std::string_view text, std::size_t width) {
-    const std::size_t room = std::min(width, roomBehind(column));
-    output.append(room - appendFitting(output, colour, text, room), ' ');
-    column += room;
-  };
-  append(note.colour == Palette::Colour::value ? Palette::Colour::name : note.colour, note.path,
-         pathWidth(note));
-  append(Palette::Colour::kind, note.kind, kindWidth(note));
-}
-
-void DumpLayout::appendValue(std::string& output, const Note& note, bool isBelow) const {
-  std::size_t start = noteColumn() + indentation(note);
-  if (isBelow) {
-    output.append(std::min(roomBehind(noteColumn()), indentation(note) + 2), ' ');
-    start += 2;
-  } else if (width_ != 0) {
-    start += pathWidth(note) + kindWidth(note);
-  }
-  appendFitting(output, note.colour, note.value, roomBehind(start));
+    return static_cast<std::size_t>(rows.end() - text);
+  });
 }
 
 void DumpLayout::appendError(std::string& output, std::string_view text) const {
-  const bool fits = width_ == 0 || noteColumn() + spelling::columns(text) <= width_;
-  output.append(fits ? noteColumn() : 0, ' ');
+  if (fits(text, roomBehind(noteColumn_))) output.append(noteColumn_, ' ');
   palette_.append(output, Palette::Colour::error, text);
   output += '\n';
 }

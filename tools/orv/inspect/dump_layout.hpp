@@ -18,7 +18,7 @@ class DumpLayout {
   // A width of 0 is that of no terminal: rows are as long as they are.
   DumpLayout(std::size_t width, Palette palette);
 
-  // What stands beside bytes.
+  // What stands beside bytes. Path and kind are ASCII.
   struct Note {
     std::size_t depth = 0;  // of payloads
     std::string_view path;
@@ -41,26 +41,16 @@ class DumpLayout {
   void appendError(std::string& output, std::string_view text) const;
 
  private:
-  void appendBytes(std::string& output, const Bytes& bytes, std::size_t row) const;
-  // Path and kind.
-  void appendNote(std::string& output, const Note& note) const;
-  void appendValue(std::string& output, const Note& note, bool isBelow) const;
-  // The text in so many columns, with an ellipsis where it is cut. Answers how many it takes.
-  std::size_t appendFitting(std::string& output, Palette::Colour colour, std::string_view text,
-                            std::size_t room) const;
+  class Rows;
 
-  // Places and widths in columns.
-  std::size_t noteColumn() const;
-  static std::size_t indentation(const Note& note);
-  std::size_t pathWidth(const Note& note) const;
-  std::size_t kindWidth(const Note& note) const;
-  std::size_t roomBehind(std::size_t column) const;
-  // Whether the value has room on the row of path and kind.
-  bool fitsBeside(const Note& note) const;
+  std::size_t roomBehind(std::size_t column) const { return column < width_ ? width_ - column : 0; }
 
   std::size_t width_;
   std::size_t bytesPerRow_;
-  bool isAligned_;  // whether paths and kinds are set in columns
+  std::size_t noteColumn_;
+  // Of path and kind, where they are set in columns, with the gap behind.
+  std::size_t pathWidth_;
+  std::size_t kindWidth_;
   Palette palette_;
 };
 

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 #include <utility>
 
 #include <orv/byte_view.hpp>
@@ -14,18 +13,9 @@ namespace orv::tool {
 
 namespace {
 
-// In the order of ValueType; what is unknown is called by its wire type.
-constexpr std::array<std::string_view, 6> typeNames{"string", "bytes", "bool", "uint32", "enum", "message"};
-
-// In the order of WireType.
+// What is unknown is called by its wire type, in the order of WireType.
 constexpr std::array<std::string_view, 6> wireTypeNames{"varint", "fixed64", "bytes",
                                                         "group",  "group",   "fixed32"};
-
-template <class Number>
-void appendNumber(Number number, std::string& output) {
-  char digits[20];
-  output.append(digits, std::to_chars(digits, digits + sizeof digits, number).ptr);
-}
 
 // How many bytes, and which, if they can be read.
 void appendBytes(std::string_view bytes, std::string& output) {
@@ -39,7 +29,7 @@ void appendUnknown(const TracedRecord& record, std::string& output) {
   switch (record.tag.wireType()) {
     case WireType::lengthDelimited: return appendBytes(charactersOf(record.value), output);
     case WireType::startGroup: return appendByteCount(record.value.size(), output);
-    default: return appendNumber(record.number, output);
+    default: output += std::to_string(record.number);
   }
 }
 
@@ -66,7 +56,7 @@ class Explainer final : public TraceSink {
       error_ = traced.error();
     if (error_) showError();
     renderer_.endMessage();
-    if (auto written = writeOutput(0); !written) return std::unexpected(written.error());
+    if (!writeOutput()) return std::unexpected(written_.error());
     return error_;
   }
 
@@ -79,15 +69,13 @@ class Explainer final : public TraceSink {
     const ExplainedRecord explained{.record = record,
                                     .offset = offsetOf(record.header.data()),
                                     .message = opened,
-                                    .payloadPath = payloadPath_,
+                                    .path = record.path.substr(outerPathSize_),
                                     .level = level_ + record.level,
                                     .isHidden = hidesSecrets_ && opened == nullptr && !record.isAbsent() &&
                                                 (!record.type || record.field->isSecret)};
     renderer_.record(explained);
     shownUpTo_ = record.value.data() + explained.shownValue().size();
-    // A long message is written piece by piece.
-    constexpr std::size_t enough = std::size_t{64} << 10;
-    return writeOutput(enough).has_value() && (inner == nullptr || showInner(record, *inner));
+    return writeOutput() && (inner == nullptr || showInner(record, *inner));
   }
 
  private:
@@ -96,22 +84,17 @@ class Explainer final : public TraceSink {
     if (record.type != ValueType::bytes || record.isAbsent()) return nullptr;
     if (level_ == 0 && record.level == 0 && record.value.data() == payloadStart_) return payload_;
     if (innerTypes_.empty()) return nullptr;
-    std::string path = fullPath(record);
+    std::string path(record.path);
     for (std::size_t at; (at = path.find('[')) != std::string::npos;) path.erase(at, path.find(']') + 1 - at);
     const auto found = innerTypes_.find(path);
     return found == innerTypes_.end() ? nullptr : found->second;
   }
 
-  std::string fullPath(const TracedRecord& record) const {
-    return (payloadPath_.empty() ? "" : std::string(payloadPath_) + ".") + std::string(record.path);
-  }
-
   bool showInner(const TracedRecord& data, const MessageType& type) {
-    const std::string path = fullPath(data);
-    const std::string_view outerPath = std::exchange(payloadPath_, path);
+    const std::size_t outerPathSize = std::exchange(outerPathSize_, data.path.size() + 1);
     const std::size_t outerLevel = std::exchange(level_, level_ + data.level + 1);
     const auto traced = trace(type, data.value, *this, absent_);
-    payloadPath_ = outerPath;
+    outerPathSize_ = outerPathSize;
     if (traced) {
       level_ = outerLevel;
       return *traced;
@@ -135,13 +118,10 @@ class Explainer final : public TraceSink {
                              error_->path.text() + ": " + error_->reason()});
   }
 
-  // What the renderer has, if it is more than this.
-  Outcome<void> writeOutput(std::size_t enough) {
-    std::string& text = renderer_.output();
-    if (!written_ || text.size() <= enough) return written_;
-    written_ = output_.write(text);
-    text.clear();
-    return written_;
+  // Much of a long message, before it is all there. False if writing fails.
+  bool writeOutput() {
+    if (written_ && output_.isFull()) written_ = output_.flush();
+    return written_.has_value();
   }
 
   std::uint64_t offsetOf(const std::byte* at) const {
@@ -157,8 +137,8 @@ class Explainer final : public TraceSink {
   const std::byte* shownUpTo_;
   const MessageType* payload_ = nullptr;  // of the envelope that is shown
   const std::byte* payloadStart_ = nullptr;
-  std::string_view payloadPath_;
-  std::size_t level_ = 0;  // of the payload's fields
+  std::size_t outerPathSize_ = 0;  // with its dot, in a payload
+  std::size_t level_ = 0;          // of the payload's fields
   std::optional<DecodeError> error_;
   Outcome<void> written_;
 };
@@ -166,12 +146,11 @@ class Explainer final : public TraceSink {
 }  // namespace
 
 void appendByteCount(std::size_t count, std::string& output) {
-  appendNumber(count, output);
-  output += count == 1 ? " byte" : " bytes";
+  output.append(std::to_string(count)).append(count == 1 ? " byte" : " bytes");
 }
 
 std::string_view ExplainedRecord::kind() const {
-  if (record.type) return typeNames[static_cast<std::size_t>(*record.type)];
+  if (record.type) return nameOf(*record.type);
   return wireTypeNames[static_cast<std::size_t>(record.tag.wireType())];
 }
 
@@ -197,23 +176,23 @@ void ExplainedRecord::appendValue(std::string& output) const {
     case ValueType::string: spelling::appendQuotedText(charactersOf(record.value), output); break;
     case ValueType::bytes: appendBytes(charactersOf(record.value), output); break;
     case ValueType::boolean: output += record.number != 0 ? "true" : "false"; break;
-    case ValueType::uint32: appendNumber(static_cast<std::uint32_t>(record.number), output); break;
+    case ValueType::uint32: output += std::to_string(static_cast<std::uint32_t>(record.number)); break;
     case ValueType::message: break;  // is told by its type
     case ValueType::enumeration: {
       const std::string_view name = record.caseName();
       if (!name.empty()) output.append(name).append(" (");
-      appendNumber(static_cast<std::int32_t>(record.number), output);
+      output += std::to_string(static_cast<std::int32_t>(record.number));
       if (!name.empty()) output += ')';
     }
   }
   if (record.isAbsent()) output += ", by default";
 }
 
-std::unique_ptr<Renderer> Renderer::make(const Options& options) {
+std::unique_ptr<Renderer> Renderer::make(const Options& options, std::string& output) {
   switch (options.to.value_or(Format::text)) {
-    case Format::json: return makeJsonRenderer(options);
-    case Format::html: return makeHtmlRenderer(options);
-    default: return makeTextRenderer(options);
+    case Format::json: return makeJsonRenderer(options, output);
+    case Format::html: return makeHtmlRenderer(options, output);
+    default: return makeTextRenderer(options, output);
   }
 }
 

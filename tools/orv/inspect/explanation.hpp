@@ -30,10 +30,12 @@ struct ExplainedRecord {
   const TracedRecord& record;
   std::uint64_t offset;  // of its first byte in the input
   const MessageDescriptor*
-      message;                   // the type of the message that the value is, whose records follow; or none
-  std::string_view payloadPath;  // of the payload that it is in, empty in none: "data"
-  std::size_t level;             // how many messages it is in, payloads among them, beside the outermost
-  bool isHidden;                 // whether only the value's length may show
+      message;            // the type of the message that the value is, whose records follow; or none
+  std::string_view path;  // the record's, from the payload on where it is in one
+  std::size_t level;      // how many messages it is in, payloads among them, beside the outermost
+  bool isHidden;          // whether only the value's length may show
+
+  bool isInPayload() const { return path.size() != record.path.size(); }
 
   // What the record holds, by its type or, where it is unknown, by its wire type.
   std::string_view kind() const;
@@ -54,10 +56,10 @@ struct ExplainedError {
   std::string text;  // place, path and reason
 };
 
-// Shows messages in one form. What a renderer has written is in its output, which may be emptied at any time.
+// Shows messages in one form. It writes to the end of a string, which may be emptied at any time.
 class Renderer {
  public:
-  static std::unique_ptr<Renderer> make(const Options& options);
+  static std::unique_ptr<Renderer> make(const Options& options, std::string& output);
 
   virtual ~Renderer() = default;
   virtual void beginMessage(const ExplainedMessage& message) = 0;
@@ -69,13 +71,14 @@ class Renderer {
   // There is no more.
   virtual void finish() {}
 
-  std::string& output() { return output_; }
-
  protected:
-  std::string output_;  // NOLINT(*-non-private-member-variables-in-classes): what all renderers write to
+  explicit Renderer(std::string& output) : output_(output) {}
+
+  std::string& output_;  // NOLINT(*-non-private-member-variables-in-classes): what all renderers write to
 };
 
-// Shows a message up to its end or to its error, which is the answer then.
+// Shows a message up to its end or to its error, which is the answer then. The renderer writes to what the output has
+// gathered.
 Outcome<std::optional<DecodeError>> explain(const ExplainedMessage& message, const Options& options,
                                             Renderer& renderer, OutputFile& output);
 

@@ -91,7 +91,7 @@ class DumpRows {
 
 class HtmlRenderer final : public Renderer {
  public:
-  explicit HtmlRenderer(const Options& options) : options_(options) {
+  HtmlRenderer(const Options& options, std::string& output) : Renderer(output), options_(options) {
     std::string title;
     for (const std::string& path : options.files) title += (title.empty() ? "" : ", ") + named(path);
     copyPageUpTo("{{title}}");
@@ -118,9 +118,7 @@ class HtmlRenderer final : public Renderer {
     const std::string_view style = !record.type ? "unknown" : explained.message != nullptr ? "message" : kind;
     dump_.add(record.header, explained.offset, fields_, "h");
     dump_.add(explained.shownValue(), explained.offset + record.header.size(), fields_, style);
-    std::string path(explained.payloadPath);
-    if (!path.empty()) path += '.';
-    path += record.path;
+    std::string path(record.path);
     std::string state = explained.message != nullptr ? " opened" : "";
     if (record.isAbsent()) {
       state = " absent";
@@ -186,8 +184,8 @@ class HtmlRenderer final : public Renderer {
 
 }  // namespace
 
-std::unique_ptr<Renderer> makeHtmlRenderer(const Options& options) {
-  return std::make_unique<HtmlRenderer>(options);
+std::unique_ptr<Renderer> makeHtmlRenderer(const Options& options, std::string& output) {
+  return std::make_unique<HtmlRenderer>(options, output);
 }
 
 }  // namespace orv::tool

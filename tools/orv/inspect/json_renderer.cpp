@@ -11,7 +11,7 @@ namespace {
 // A document for each message, and in a stream a line. Values are what the JSON mapping has.
 class JsonRenderer final : public Renderer {
  public:
-  explicit JsonRenderer(const Options& options) : options_(options) {}
+  JsonRenderer(const Options& options, std::string& output) : Renderer(output), options_(options) {}
 
   void beginMessage(const ExplainedMessage& message) override {
     output_ += '{';
@@ -30,10 +30,7 @@ class JsonRenderer final : public Renderer {
     if (!isFirst_) output_ += ',';
     isFirst_ = false;
     output_ += options_.isDelimited ? "{" : "\n  {";
-    path_ = explained.payloadPath;
-    if (!path_.empty()) path_ += '.';
-    path_ += record.path;
-    add("path", path_);
+    add("path", record.path);
     if (!record.isAbsent()) {
       add("number", record.tag.fieldNumber());
       add("offset", explained.offset);
@@ -112,15 +109,14 @@ class JsonRenderer final : public Renderer {
 
   const Options& options_;
   const ExplainedMessage* message_ = nullptr;
-  std::string path_;
   bool isFirst_ = true;
   bool hasError_ = false;
 };
 
 }  // namespace
 
-std::unique_ptr<Renderer> makeJsonRenderer(const Options& options) {
-  return std::make_unique<JsonRenderer>(options);
+std::unique_ptr<Renderer> makeJsonRenderer(const Options& options, std::string& output) {
+  return std::make_unique<JsonRenderer>(options, output);
 }
 
 }  // namespace orv::tool

@@ -11,11 +11,11 @@
 namespace orv::tool {
 
 // An annotated dump, as wide as the terminal.
-std::unique_ptr<Renderer> makeTextRenderer(const Options& options);
+std::unique_ptr<Renderer> makeTextRenderer(const Options& options, std::string& output);
 // A document for each message, for scripts.
-std::unique_ptr<Renderer> makeJsonRenderer(const Options& options);
+std::unique_ptr<Renderer> makeJsonRenderer(const Options& options, std::string& output);
 // One page that stands alone.
-std::unique_ptr<Renderer> makeHtmlRenderer(const Options& options);
+std::unique_ptr<Renderer> makeHtmlRenderer(const Options& options, std::string& output);
 
 // page.html, as it was when the command was built, with "{{…}}" for what is put into it, in this order: the title,
 // twice, the messages, the version.

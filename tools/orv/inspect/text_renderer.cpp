@@ -14,18 +14,19 @@ namespace {
 // A row, or as many as it takes, for each record.
 class DumpRenderer final : public Renderer {
  public:
-  explicit DumpRenderer(const Options& options)
-      : options_(options), layout_(terminalWidth(descriptor()), Palette(options.colour, descriptor())) {}
+  DumpRenderer(const Options& options, std::string& output)
+      : Renderer(output),
+        options_(options),
+        layout_(terminalWidth(descriptor()), Palette(options.colour, descriptor())) {}
 
   void beginMessage(const ExplainedMessage& message) override {
-    std::string text;
     if (std::exchange(isBehindMessage_, true) && message.number > 1) output_ += '\n';
-    if (options_.files.size() > 1) text += spelling::printable(message.path) + ": ";
-    if (options_.isDelimited) text += "message " + std::to_string(message.number) + ": ";
-    text += message.type.fullName();
-    text += ", ";
-    appendByteCount(message.bytes.size(), text);
-    layout_.appendHeading(output_, text);
+    value_.clear();
+    if (options_.files.size() > 1) value_.append(spelling::printable(message.path)).append(": ");
+    if (options_.isDelimited) value_.append("message ").append(std::to_string(message.number)).append(": ");
+    value_.append(message.type.fullName()).append(", ");
+    appendByteCount(message.bytes.size(), value_);
+    layout_.appendHeading(output_, value_);
   }
 
   void record(const ExplainedRecord& explained) override {
@@ -36,8 +37,8 @@ class DumpRenderer final : public Renderer {
                         : record.type     ? Palette::Colour::value
                                           : Palette::Colour::unknown;
     layout_.appendRecord(output_, {explained.offset, record.header, explained.shownValue(), colour},
-                         {.depth = explained.payloadPath.empty() ? 0U : 1U,
-                          .path = record.path,
+                         {.depth = explained.isInPayload() ? 1U : 0U,
+                          .path = explained.path,
                           .kind = explained.kind(),
                           .value = value_,
                           .colour = colour});
@@ -75,14 +76,14 @@ class DumpRenderer final : public Renderer {
 
   const Options& options_;
   DumpLayout layout_;
-  std::string value_;
+  std::string value_;  // of the record, or the heading
   bool isBehindMessage_ = false;
 };
 
 }  // namespace
 
-std::unique_ptr<Renderer> makeTextRenderer(const Options& options) {
-  return std::make_unique<DumpRenderer>(options);
+std::unique_ptr<Renderer> makeTextRenderer(const Options& options, std::string& output) {
+  return std::make_unique<DumpRenderer>(options, output);
 }
 
 }  // namespace orv::tool

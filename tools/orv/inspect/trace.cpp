@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <array>
 #include <cassert>
-#include <charconv>
 #include <string>
 
 #include <orv/byte_view.hpp>
@@ -17,21 +16,34 @@ namespace {
 // Why tracing ended. What is malformed, parsing can tell better.
 enum class End : std::uint8_t { ofInput, malformed, stopped };
 
-void appendNumber(std::uint64_t number, std::string& output) {
-  char digits[20];
-  output.append(digits, std::to_chars(digits, digits + sizeof digits, number).ptr);
-}
-
 constexpr std::size_t mostFields = [] {
   std::size_t most = 0;
   AllMessages::forEach([&]<class M>() { most = std::max(most, M::descriptor().fields.size()); });
   return most;
 }();
 
+// What was read, if it was, into its place.
+template <class T, class Place>
+bool take(const WireResult<T>& read, Place& place) {
+  if (read) place = *read;
+  return read.has_value();
+}
+
+}  // namespace
+
 class Tracer {
  public:
-  Tracer(TraceSink& sink, AbsentFields absent) : sink_(sink), absent_(absent) {}
+  Tracer(TraceSink& sink, AbsentFields absent) : sink_(sink), absent_(absent), path_(sink.path_) {}
 
+  // Leaves the sink's path as it was.
+  End trace(const MessageDescriptor& message, std::span<const std::byte> bytes) {
+    const std::size_t pathSize = path_.size();
+    const End end = traceMessage(message, bytes, 0);
+    path_.resize(pathSize);
+    return end;
+  }
+
+ private:
   // `nesting` is how many messages the bytes are already in.
   End traceMessage(const MessageDescriptor& message, std::span<const std::byte> bytes, int nesting) {
     WireReader reader(bytes);
@@ -59,9 +71,7 @@ class Tracer {
       if (isTaken) {
         const std::uint32_t index = occurrences[static_cast<std::size_t>(field - message.fields.data())]++;
         if (field->kind == FieldKind::repeated) {
-          path_ += '[';
-          appendNumber(index, path_);
-          path_ += ']';
+          path_.append("[").append(std::to_string(index)) += ']';
         }
       }
       record.path = path_;
@@ -77,7 +87,6 @@ class Tracer {
     return end;
   }
 
- private:
   // How often each field was there, by its place in its message.
   using Occurrences = std::array<std::uint32_t, mostFields>;
 
@@ -87,7 +96,7 @@ class Tracer {
     if (field != nullptr) {
       path_ += field->name;
     } else {
-      appendNumber(number, path_);
+      path_ += std::to_string(number);
     }
   }
 
@@ -115,30 +124,28 @@ class Tracer {
   // Reads what stands behind the record's tag, into the record. False for what is malformed.
   static bool readValue(WireReader& reader, const std::byte* start, int nesting, TracedRecord& record) {
     const std::byte* const valueStart = reader.position();
-    WireReader again = reader;
-    if (!reader.skipValue(record.tag, start, nesting)) return false;
-    record.value = {valueStart, reader.position()};
+    bool isRead = false;
     switch (record.tag.wireType()) {
-      case WireType::varint: record.number = *again.readVarint(); break;
-      case WireType::fixed32: record.number = *again.readFixed32(); break;
-      case WireType::fixed64: record.number = *again.readFixed64(); break;
-      case WireType::lengthDelimited: record.value = *again.readLengthDelimited(); break;
-      case WireType::startGroup:
-      case WireType::endGroup: break;
+      case WireType::lengthDelimited:
+        return take(reader.readLengthDelimited(), record.value) &&
+               (record.type != ValueType::string || utf8::isWellFormed(charactersOf(record.value)));
+      case WireType::varint: isRead = take(reader.readVarint(), record.number); break;
+      case WireType::fixed32: isRead = take(reader.readFixed32(), record.number); break;
+      case WireType::fixed64: isRead = take(reader.readFixed64(), record.number); break;
+      default: isRead = reader.skipValue(record.tag, start, nesting).has_value();
     }
-    return record.type != ValueType::string || utf8::isWellFormed(charactersOf(record.value));
+    record.value = {valueStart, reader.position()};
+    return isRead;
   }
 
   TraceSink& sink_;
   AbsentFields absent_;
-  std::string path_;  // of the message or field that is being read
+  std::string& path_;
 };
-
-}  // namespace
 
 std::expected<bool, DecodeError> trace(const MessageType& type, std::span<const std::byte> bytes,
                                        TraceSink& sink, AbsentFields absent) {
-  const End end = Tracer(sink, absent).traceMessage(*type.descriptor, bytes, 0);
+  const End end = Tracer(sink, absent).trace(*type.descriptor, bytes);
   if (end != End::malformed) return end == End::ofInput;
   const auto parsed = parseMessage(type, bytes, PayloadPairing::closed());
   assert(!parsed);

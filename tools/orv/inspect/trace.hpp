@@ -6,6 +6,7 @@
 #include <expected>
 #include <optional>
 #include <span>
+#include <string>
 #include <string_view>
 
 #include <orv/decode_error.hpp>
@@ -41,11 +42,16 @@ struct TracedRecord {
 // Receives the records.
 class TraceSink {
  public:
-  // False ends the tracing.
+  // False ends the tracing. What a record's bytes are can be traced into the sink as well, whose paths then go on
+  // from the record's.
   virtual bool record(const TracedRecord& record) = 0;
 
  protected:
   ~TraceSink() = default;
+
+ private:
+  friend class Tracer;
+  std::string path_;  // of the message or field that is being read
 };
 
 // Reads the bytes as a message of the type, by its descriptor. Answers whether the sink saw them to their end;

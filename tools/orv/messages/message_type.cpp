@@ -1,6 +1,7 @@
 #include "tools/orv/messages/message_type.hpp"
 
 #include <algorithm>
+#include <array>
 #include <charconv>
 #include <vector>
 
@@ -22,6 +23,10 @@ constexpr auto types = [] {
   return list;
 }();
 
+// In the order of ValueType.
+constexpr std::array<std::string_view, 6> valueTypeNames{"string", "bytes", "bool",
+                                                         "uint32", "enum",  "message"};
+
 constexpr NameMap kindNames = VessaSessionMessageType::_protobuf_nameMap();
 constexpr auto typeNumber = SessionMessage::_protobuf_nameMap().number("type");
 constexpr auto dataNumber = SessionMessage::_protobuf_nameMap().number("data");
@@ -31,6 +36,8 @@ std::string_view lastWord(std::string_view name) { return name.substr(name.rfind
 }  // namespace
 
 std::span<const MessageType> allMessageTypes() { return types; }
+
+std::string_view nameOf(ValueType type) { return valueTypeNames[static_cast<std::size_t>(type)]; }
 
 const MessageType& typeOf(const MessageDescriptor& descriptor) {
   return *std::ranges::find(types, &descriptor, &MessageType::descriptor);

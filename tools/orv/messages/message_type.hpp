@@ -29,6 +29,9 @@ struct MessageType {
 
 std::span<const MessageType> allMessageTypes();
 
+// What values of the type are called: "uint32".
+std::string_view nameOf(ValueType type);
+
 const MessageType& typeOf(const MessageDescriptor& descriptor);
 template <class M>
 const MessageType& typeOf() {

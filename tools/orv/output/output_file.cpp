@@ -115,10 +115,9 @@ Outcome<void> OutputFile::openAside(const std::string& target, mode_t mode) {
 }
 
 Outcome<void> OutputFile::write(std::string_view text) {
-  constexpr std::size_t enough = std::size_t{64} << 10;
   for (; !text.empty(); text.remove_prefix(std::min(text.size(), enough))) {
     gathered_ += text.substr(0, enough);
-    if (gathered_.size() < enough) continue;
+    if (!isFull()) continue;
     if (auto flushed = flush(); !flushed) return flushed;
   }
   return {};

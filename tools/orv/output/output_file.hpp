@@ -28,6 +28,9 @@ class OutputFile {
 
   // Gathers small pieces. Fails quietly where a pipe's reader is gone.
   [[nodiscard]] Outcome<void> write(std::string_view text);
+  // What is gathered, to append to. It is to be flushed when it is full.
+  std::string& gathered() { return gathered_; }
+  bool isFull() const { return gathered_.size() >= enough; }
   // Writes what is gathered, so that it is seen before what else is written, and before anything is waited for.
   [[nodiscard]] Outcome<void> flush();
   // Writes what is gathered, after which nothing may follow; a file is there now even if that was nothing.
@@ -40,6 +43,8 @@ class OutputFile {
   Outcome<void> open();
   Outcome<void> openAside(const std::string& target, mode_t mode);
   Outcome<void> writeGathered();
+
+  static constexpr std::size_t enough = std::size_t{64} << 10;
 
   std::string name_;    // of the file, as it is given
   std::string target_;  // that is replaced in the end, behind all links; empty where nothing is

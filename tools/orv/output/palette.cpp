@@ -3,16 +3,11 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
-#include <array>
-#include <charconv>
 #include <cstdlib>
 
 namespace orv::tool {
 
 namespace {
-
-// In the order of Palette::Colour: grey, cyan, bold, blue, plain, yellow, magenta, red, red, green.
-constexpr std::array<std::string_view, 10> codes{"90", "36", "1", "34", "0", "33", "35", "1;31", "31", "32"};
 
 bool wantsColour(int descriptor) {
   const char* const noColour = std::getenv("NO_COLOR");
@@ -37,15 +32,7 @@ Palette::Palette(ColourChoice choice, int descriptor)
 
 void Palette::append(std::string& output, Colour colour, std::string_view text) const {
   if (text.empty()) return;
-  start(output, colour);
-  output += text;
-  stop(output);
-}
-
-void Palette::startColour(std::string& output, Colour colour) {
-  output += "\033[";
-  output += codes[static_cast<std::size_t>(colour)];
-  output += 'm';
+  output.append(start(colour)).append(text).append(stop());
 }
 
 }  // namespace orv::tool

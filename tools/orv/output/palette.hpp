@@ -1,6 +1,7 @@
 // Colours on a terminal.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <string>
@@ -37,16 +38,15 @@ class Palette {
   // Appends the text in the colour.
   void append(std::string& output, Colour colour, std::string_view text) const;
 
-  // What is appended from the start to the stop is in the colour.
-  void start(std::string& output, Colour colour) const {
-    if (isOn_) startColour(output, colour);
-  }
-  void stop(std::string& output) const {
-    if (isOn_) output += "\033[0m";
-  }
+  // What stands from the start to the stop is in the colour.
+  std::string_view start(Colour colour) const { return isOn_ ? codes[static_cast<std::size_t>(colour)] : ""; }
+  std::string_view stop() const { return isOn_ ? "\033[0m" : ""; }
 
  private:
-  static void startColour(std::string& output, Colour colour);
+  // In the order of Colour: grey, cyan, bold, blue, plain, yellow, magenta, red, red, green.
+  static constexpr std::array<std::string_view, 10> codes{"\033[90m", "\033[36m", "\033[1m",  "\033[34m",
+                                                          "\033[0m",  "\033[33m", "\033[35m", "\033[1;31m",
+                                                          "\033[31m", "\033[32m"};
 
   bool isOn_;
 };
