@@ -20,9 +20,11 @@ namespace orv::tool {
 // The forms that a message can be given, or shown, in.
 enum class Format : std::uint8_t { binary, hex, base64, text, json, html };
 
-// In the order of Format, as the options spell them.
-inline constexpr std::array<std::string_view, 6> formatNames{"binary", "hex",  "base64",
-                                                             "text",   "json", "html"};
+// As the options spell it.
+constexpr std::string_view nameOf(Format format) {
+  constexpr std::array<std::string_view, 6> names{"binary", "hex", "base64", "text", "json", "html"};
+  return names[static_cast<std::size_t>(format)];
+}
 
 // Whether the format spells out the binary encoding, byte by byte.
 constexpr bool isBytes(Format format) { return format <= Format::base64; }

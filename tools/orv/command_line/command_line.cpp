@@ -10,6 +10,7 @@
 #include <vector>
 
 #include <orv/spelling/nearest_name.hpp>
+#include <orv/spelling/value_text.hpp>
 #include "tools/orv/output/palette.hpp"
 
 namespace orv::tool {
@@ -96,8 +97,12 @@ std::optional<std::string> withoutEffect(const Options& options) {
   const PayloadPairing& payloads = options.payloads;
   if (options.keepsGoing && !options.isDelimited) return "--keep-going is for streams, with --delimited";
   if (options.selection.hasNumbers() && !options.isDelimited) return "-n is for streams, with --delimited";
+  const auto noField = [](std::string_view option, std::string_view path, const MessageType& type) {
+    return std::string(option) + ": " + spelling::quotedText(path) + " is no field of " +
+           std::string(type.fullName());
+  };
   if (const auto* const condition = options.selection.unmeetable(*options.type))
-    return "--only: \"" + *condition + "\" is no field of " + std::string(options.type->fullName());
+    return noField("--only", *condition, *options.type);
   for (const auto& [path, type] : options.innerTypes) {
     const MessageType* outer = options.type;
     std::string_view rest = path;
@@ -106,12 +111,10 @@ std::optional<std::string> withoutEffect(const Options& options) {
       outer = outerType;
       rest = std::string_view(path).substr(outerPath.size() + 1);
     }
-    if (!leadsToField(rest, *outer->descriptor))
-      return "--as: \"" + std::string(rest) + "\" is no field of " + std::string(outer->fullName());
+    if (!leadsToField(rest, *outer->descriptor)) return noField("--as", rest, *outer);
   }
   for (const std::string& path : options.ignored) {
-    if (!leadsToField(path, *options.type->descriptor))
-      return "--ignore: \"" + path + "\" is no field of " + std::string(options.type->fullName());
+    if (!leadsToField(path, *options.type->descriptor)) return noField("--ignore", path, *options.type);
   }
   if (options.showsUnknownFields && options.to != Format::json) return "--unknown is for --to json";
   if (options.hidesSecrets && isBytes(*options.to)) return "--redact is for text and JSON: bytes stay bytes";
@@ -178,7 +181,7 @@ std::variant<Request, Answer, Failure> parseCommandLine(std::span<char*> words) 
   const bool couldBeFile = first.empty() || first.starts_with('-') || ::access(words[1], F_OK) == 0;
   if (!couldBeFile) {
     if (const auto suggestion = spelling::suggestion(first, commands, &Command::name); !suggestion.empty())
-      return usageFailure("no file and no command \"" + std::string(first) + "\"" + suggestion).error();
+      return usageFailure("no file and no command " + spelling::quotedText(first) + suggestion).error();
   }
   auto parsed = parseCommand(commands.front(), words);
   // A command that stands behind options was taken for a file, unless there is one of this name.

@@ -4,6 +4,7 @@
 #include <charconv>
 #include <limits>
 
+#include <orv/spelling/value_text.hpp>
 #include "tools/orv/command_line/command.hpp"
 
 namespace orv::tool {
@@ -13,7 +14,7 @@ namespace {
 using Taken = std::expected<void, std::string>;
 
 Taken refuse(std::string_view value, std::string_view reason) {
-  return std::unexpected("\"" + std::string(value) + "\" " + std::string(reason));
+  return std::unexpected(spelling::quotedText(value) + " " + std::string(reason));
 }
 
 Taken takeType(Options& options, const Command&, std::string_view name) {
@@ -22,8 +23,6 @@ Taken takeType(Options& options, const Command&, std::string_view name) {
   options.type = *type;
   return {};
 }
-
-std::string_view nameOf(Format format) { return formatNames[static_cast<std::size_t>(format)]; }
 
 template <std::optional<Format> Options::*format, FormatChoice Command::*choice>
 Taken takeFormat(Options& options, const Command& command, std::string_view name) {

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include <orv/spelling/nearest_name.hpp>
+#include <orv/spelling/value_text.hpp>
 #include "tools/orv/output/output_file.hpp"
 #include "tools/orv/output/palette.hpp"
 
@@ -124,7 +125,7 @@ ExitStatus runHelp(const Options& options) {
   if (options.files.empty()) return writeWhole(helpText(width));
   const std::string& name = options.files.front();
   if (const Command* const command = findCommand(name)) return writeWhole(helpText(*command, width));
-  report({ExitStatus::usage, "orv: help: no command \"" + name + "\"" +
+  report({ExitStatus::usage, "orv: help: no command " + spelling::quotedText(name) +
                                  spelling::suggestion(name, commandTable.commands, &Command::name)});
   return ExitStatus::usage;
 }

@@ -117,8 +117,7 @@ MessageInput::MessageInput(InputFile file, const std::string& path, const Option
       reader_(FrameReader::make(file_, format_, options)) {
   if (format_ != Format::binary) file_.skipByteOrderMark();
   if (!options.from && options.isVerbose) {
-    const auto name = formatNames[static_cast<std::size_t>(format_)];
-    report({ExitStatus::done, file_.name() + ": read as " + std::string(name)});
+    report({ExitStatus::done, file_.name() + ": read as " + std::string(nameOf(format_))});
   }
 }
 
@@ -192,9 +191,8 @@ std::unexpected<Failure> MessageInput::failText(spelling::TextError error) const
 
 Outcome<void> MessageInput::check() const {
   if (!isBytes(format_)) return {};
-  const auto message = parseMessage(*options_.type, bytesOf(encoding_), PayloadPairing::closed());
-  if (!message) return std::unexpected(failureOf(message.error()));
-  return {};
+  const auto checked = message(PayloadPairing::closed());
+  return checked ? Outcome<void>() : std::unexpected(checked.error());
 }
 
 Outcome<OwnedMessage> MessageInput::message(const PayloadPairing& payloads) const {

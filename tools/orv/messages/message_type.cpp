@@ -7,6 +7,7 @@
 
 #include <orv/envelope.hpp>
 #include <orv/spelling/nearest_name.hpp>
+#include <orv/spelling/value_text.hpp>
 #include <orv/wire_reader.hpp>
 
 namespace orv::tool {
@@ -50,7 +51,7 @@ std::expected<const MessageType*, std::string> findMessageType(std::string_view 
     if (name == lastWord(type.fullName())) sameLastWord.push_back(&type);
   }
   if (sameLastWord.size() == 1) return sameLastWord.front();
-  const std::string quoted = "\"" + std::string(name) + "\"";
+  const std::string quoted = spelling::quotedText(name);
   if (sameLastWord.empty()) {
     return std::unexpected("unknown message type " + quoted +
                            spelling::suggestion(name, types, &MessageType::shortName));
@@ -90,7 +91,7 @@ std::expected<void, std::string> PayloadPairing::override(std::string_view pairi
   const std::string_view kind = pairing.substr(0, equals);
   const auto number = kindNumber(kind);
   if (!number) {
-    return std::unexpected("unknown envelope type \"" + std::string(kind) + "\"" +
+    return std::unexpected("unknown envelope type " + spelling::quotedText(kind) +
                            spelling::suggestion(kind, kindNames.entries(), &NameMap::Entry::name));
   }
   forKind_[*number] = *payload;

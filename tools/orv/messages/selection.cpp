@@ -4,6 +4,7 @@
 #include <charconv>
 
 #include <orv/spelling/hex.hpp>
+#include <orv/spelling/value_text.hpp>
 
 namespace orv::tool {
 
@@ -56,7 +57,7 @@ std::expected<void, std::string> Selection::addNumbers(std::string_view range) {
     read = std::from_chars(read.ptr + 1, end, last_);
   }
   if (read.ec == std::errc() && read.ptr == end && first_ != 0 && first_ <= last_) return {};
-  return std::unexpected("\"" + std::string(range) + "\" is no range of messages (6, 3-8, 3-)");
+  return std::unexpected(spelling::quotedText(range) + " is no range of messages (6, 3-8, 3-)");
 }
 
 void Selection::addCondition(std::string_view condition) {
