@@ -20,13 +20,14 @@ constexpr int threadCount = 4;
 template <class Work>
 void race(Work work) {
   std::barrier start(threadCount);
-  std::vector<std::jthread> threads;
+  std::vector<std::thread> threads;  // libc++ 19 has no std::jthread yet
   for (int index = 0; index < threadCount; ++index) {
     threads.emplace_back([&] {
       start.arrive_and_wait();
       work();
     });
   }
+  for (std::thread& thread : threads) thread.join();
 }
 
 // Whatever a message makes on its first use, if anything: defaults, names, cases.
