@@ -83,7 +83,7 @@ TEST(Differential, ReadsAndWritesAsTheOfficialCodeDoes) {
 
 // Two bytes for each type; ORV_TEST_LENGTH says otherwise. Of three there are three hundred million.
 TEST(Differential, ReadsEveryShortInputAsTheOfficialCodeDoes) {
-  const std::size_t longest = Random::fromEnvironment("ORV_TEST_LENGTH", 2);
+  const std::uint64_t longest = Random::fromEnvironment("ORV_TEST_LENGTH", 2);
   std::size_t acceptedCount = 0;
   std::size_t triedCount = 0;
   for (const MessagePointer& type : allMessages()) {

@@ -27,7 +27,8 @@ TEST(DelimitedParser, GivesTheMessagesWhateverPiecesAreAndHoweverTheyArePopped) 
           ASSERT_TRUE(bytes);
           if (!bytes->has_value()) return;
           popped.emplace_back(ByteView(**bytes).characters());
-          EXPECT_EQ(stream.substr(parser.messageOffset(), popped.back().size()), popped.back());
+          EXPECT_EQ(stream.substr(static_cast<std::size_t>(parser.messageOffset()), popped.back().size()),
+                    popped.back());
         }
       };
       for (std::size_t at = 0; at < stream.size(); at += pieceSize) {
