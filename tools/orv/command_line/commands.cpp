@@ -27,7 +27,7 @@ Taken takeType(Options& options, const Command&, std::string_view name) {
 template <std::optional<Format> Options::*format, FormatChoice Command::*choice>
 Taken takeFormat(Options& options, const Command& command, std::string_view name) {
   const auto allowed = (command.*choice).allowed;
-  const auto found = std::ranges::find(allowed, name, nameOf);
+  const auto found = std::ranges::find(allowed, name, [](Format one) { return nameOf(one); });
   if (found == allowed.end()) return refuse(name, "is none of " + listed({.allowed = allowed}));
   options.*format = *found;
   return {};
