@@ -1,5 +1,6 @@
 #include <orv/json/renderer.hpp>
 
+#include <algorithm>
 #include <utility>
 
 #include <orv/byte_view.hpp>
@@ -19,6 +20,9 @@ bool isControl(char32_t codePoint) {
   return codePoint < 0x20 || (codePoint >= 0x7F && codePoint < 0xA0) || codePoint == 0x2028 ||
          codePoint == 0x2029;
 }
+
+// ASCII that stands for itself.
+bool isPlain(char c) { return c >= 0x20 && c < 0x7F && c != '"' && c != '\\'; }
 
 }  // namespace
 
@@ -55,7 +59,11 @@ void Renderer::startMember(std::string_view name) {
 
 void appendQuoted(std::string_view utf8, std::string& output) {
   output += '"';
-  while (!utf8.empty()) {
+  for (;;) {
+    const auto plain = static_cast<std::size_t>(std::ranges::find_if_not(utf8, isPlain) - utf8.begin());
+    output += utf8.substr(0, plain);
+    utf8.remove_prefix(plain);
+    if (utf8.empty()) break;
     const utf8::Step step = utf8::step(utf8);
     switch (step.codePoint) {
       case '"': output += "\\\""; break;

@@ -14,12 +14,11 @@ class JsonRenderer final : public Renderer {
   JsonRenderer(const Options& options, std::string& output) : Renderer(output), options_(options) {}
 
   void beginMessage(const ExplainedMessage& message) override {
-    output_ += '{';
-    add("file", spelling::printable(message.path));
-    if (message.number != 0) add("message", message.number);
-    add("type", message.type.fullName());
-    add("offset", message.offset);
-    add("length", message.bytes.size());
+    add("{\"file\":", spelling::printable(message.path));
+    if (message.number != 0) add(",\"message\":", message.number);
+    add(",\"type\":", message.type.fullName());
+    add(",\"offset\":", message.offset);
+    add(",\"length\":", message.bytes.size());
     output_ += ",\"fields\":[";
     isFirst_ = true;
     message_ = &message;
@@ -29,21 +28,21 @@ class JsonRenderer final : public Renderer {
     const TracedRecord& record = explained.record;
     if (!isFirst_) output_ += ',';
     isFirst_ = false;
-    output_ += options_.isDelimited ? "{" : "\n  {";
-    add("path", record.path);
+    if (!options_.isDelimited) output_ += "\n  ";
+    add("{\"path\":", record.path);
     if (!record.isAbsent()) {
-      add("number", record.tag.fieldNumber());
-      add("offset", explained.offset);
-      add("header", record.header.size());
-      add("length", record.value.size());
+      add(",\"number\":", record.tag.fieldNumber());
+      add(",\"offset\":", explained.offset);
+      add(",\"header\":", record.header.size());
+      add(",\"length\":", record.value.size());
     }
-    add("kind", explained.kind());
-    if (!record.type) addLiteral("unknown", "true");
-    if (record.isAbsent()) addLiteral("absent", "true");
+    add(",\"kind\":", explained.kind());
+    if (!record.type) addLiteral(",\"unknown\":", "true");
+    if (record.isAbsent()) addLiteral(",\"absent\":", "true");
     if (explained.message != nullptr) {
-      add("message", explained.message->fullName);
+      add(",\"message\":", explained.message->fullName);
     } else if (explained.isHidden) {
-      add("value", "<redacted>");
+      add(",\"value\":", "<redacted>");
     } else if (!record.isAbsent() || record.field->kind == FieldKind::implicitPresence) {
       addValue(record);
     }
@@ -51,10 +50,9 @@ class JsonRenderer final : public Renderer {
   }
 
   void error(const ExplainedError& error) override {
-    output_ += "],\"error\":{";
-    add("offset", message_->offset + error.error.offset);
-    add("path", error.error.path.text());
-    add("reason", error.error.reason());
+    add("],\"error\":{\"offset\":", message_->offset + error.error.offset);
+    add(",\"path\":", error.error.path.text());
+    add(",\"reason\":", error.error.reason());
     output_ += '}';
     hasError_ = true;
   }
@@ -66,22 +64,15 @@ class JsonRenderer final : public Renderer {
   }
 
  private:
-  void addName(std::string_view name) {
-    if (!output_.ends_with('{')) output_ += ',';
-    output_.append("\"").append(name).append("\":");
-  }
-  void add(std::string_view name, std::string_view text) {
-    addName(name);
+  // The start is what stands before the value: a comma or bracket, and the name.
+  void add(std::string_view start, std::string_view text) {
+    output_ += start;
     json::appendQuoted(text, output_);
   }
-  void add(std::string_view name, std::uint64_t number) { addLiteral(name, std::to_string(number)); }
-  void addLiteral(std::string_view name, std::string_view literal) {
-    addName(name);
-    output_ += literal;
-  }
+  void add(std::string_view start, std::uint64_t number) { addLiteral(start, std::to_string(number)); }
+  void addLiteral(std::string_view start, std::string_view literal) { output_.append(start).append(literal); }
   void addBytes(std::span<const std::byte> bytes) {
-    addName("value");
-    output_ += '"';
+    output_ += ",\"value\":\"";
     spelling::appendBase64(charactersOf(bytes), output_);
     output_ += '"';
   }
@@ -91,19 +82,19 @@ class JsonRenderer final : public Renderer {
     if (!record.type) {
       const bool isNumber =
           record.tag.wireType() != WireType::lengthDelimited && record.tag.wireType() != WireType::startGroup;
-      return isNumber ? add("value", std::string_view(std::to_string(record.number)))
+      return isNumber ? add(",\"value\":", std::string_view(std::to_string(record.number)))
                       : addBytes(record.value);
     }
     switch (*record.type) {
-      case ValueType::string: return add("value", charactersOf(record.value));
+      case ValueType::string: return add(",\"value\":", charactersOf(record.value));
       case ValueType::bytes: return addBytes(record.value);
-      case ValueType::boolean: return addLiteral("value", record.number != 0 ? "true" : "false");
+      case ValueType::boolean: return addLiteral(",\"value\":", record.number != 0 ? "true" : "false");
       case ValueType::uint32:
-        return addLiteral("value", std::to_string(static_cast<std::uint32_t>(record.number)));
+        return addLiteral(",\"value\":", std::to_string(static_cast<std::uint32_t>(record.number)));
       case ValueType::message: return;
       case ValueType::enumeration:
-        if (const std::string_view name = record.caseName(); !name.empty()) return add("value", name);
-        addLiteral("value", std::to_string(static_cast<std::int32_t>(record.number)));
+        if (const std::string_view name = record.caseName(); !name.empty()) return add(",\"value\":", name);
+        addLiteral(",\"value\":", std::to_string(static_cast<std::int32_t>(record.number)));
     }
   }
 
