@@ -15,8 +15,8 @@ namespace {
 // Input that is one message, read as a whole.
 class WholeInput final : public FrameReader {
  public:
-  WholeInput(InputFile& file, Format format, std::size_t maximumSize)
-      : FrameReader(file.name(), maximumSize), source_(file, format, /*isStream=*/false) {}
+  WholeInput(InputFile& file, Format format, const Options& options)
+      : FrameReader(file.name(), options.maximumSize), source_(file, format, options) {}
 
   Outcome<std::optional<Frame>> next() override {
     if (std::exchange(isRead_, true)) return std::nullopt;
@@ -41,10 +41,10 @@ class WholeInput final : public FrameReader {
 // Encodings, each behind its length.
 class DelimitedInput final : public FrameReader {
  public:
-  DelimitedInput(InputFile& file, Format format, std::size_t maximumSize)
-      : FrameReader(file.name(), maximumSize),
-        source_(file, format, /*isStream=*/true),
-        reader_([this](std::span<std::byte> buffer) { return source_.read(buffer); }, maximumSize) {}
+  DelimitedInput(InputFile& file, Format format, const Options& options)
+      : FrameReader(file.name(), options.maximumSize),
+        source_(file, format, options),
+        reader_([this](std::span<std::byte> buffer) { return source_.read(buffer); }, options.maximumSize) {}
 
   Outcome<std::optional<Frame>> next() override {
     ++number_;
@@ -78,10 +78,9 @@ std::string bytePlace(std::uint64_t offset) {
 }
 
 std::unique_ptr<FrameReader> FrameReader::make(InputFile& file, Format format, const Options& options) {
-  const std::size_t size = options.maximumSize;
-  if (!options.isDelimited) return std::make_unique<WholeInput>(file, format, size);
-  if (isBytes(format)) return std::make_unique<DelimitedInput>(file, format, size);
-  return std::make_unique<TextStream>(file, format, size);
+  if (!options.isDelimited) return std::make_unique<WholeInput>(file, format, options);
+  if (isBytes(format)) return std::make_unique<DelimitedInput>(file, format, options);
+  return std::make_unique<TextStream>(file, format, options.maximumSize);
 }
 
 std::unexpected<Failure> FrameReader::failTooLarge(const Frame& frame) const {

@@ -72,11 +72,17 @@ std::ptrdiff_t InputFile::readDescriptor(std::span<std::byte> buffer) {
   }
 }
 
-ByteSource::ByteSource(InputFile& file, Format format, bool isStream) : file_(file) {
+spelling::TextError redacted(spelling::TextError error, const Options& options) {
+  if (options.hidesSecrets) error.reason = "malformed, <redacted>";
+  return error;
+}
+
+ByteSource::ByteSource(InputFile& file, Format format, const Options& options)
+    : file_(file), options_(options) {
   using Runs = spelling::Base64Reader::Runs;
   if (format == Format::hex) spelling_.emplace<spelling::HexReader>();
   if (format == Format::base64)
-    spelling_.emplace<spelling::Base64Reader>(isStream ? Runs::several : Runs::one);
+    spelling_.emplace<spelling::Base64Reader>(options.isDelimited ? Runs::several : Runs::one);
 }
 
 std::ptrdiff_t ByteSource::read(std::span<std::byte> buffer) {
@@ -100,7 +106,8 @@ std::ptrdiff_t ByteSource::readSpelled(std::span<std::byte> buffer) {
     const std::string_view characters = charactersOf(std::span(piece).first(static_cast<std::size_t>(count)));
     if (const auto done = spell(characters); !done) {
       isAtEnd_ = true;
-      failure_ = Failure{ExitStatus::malformed, file_.name() + ": " + done.error().message()};
+      failure_ =
+          Failure{ExitStatus::malformed, file_.name() + ": " + redacted(done.error(), options_).message()};
     }
   }
   // What stands before an error is handed out before it shows.

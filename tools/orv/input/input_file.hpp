@@ -20,6 +20,9 @@ namespace orv::tool {
 // What some editors put before UTF-8.
 inline constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 
+// The error, without what its reason quotes of the text where secrets are to be hidden.
+spelling::TextError redacted(spelling::TextError error, const Options& options);
+
 // A file, or standard input for "-", read from its beginning to its end. Whenever more of it is waited for, what
 // was made of it so far is written.
 class InputFile {
@@ -58,8 +61,8 @@ class InputFile {
 // Reads a file in one of the formats that spell bytes.
 class ByteSource {
  public:
-  // The file must outlive the source. In a stream padded runs of base64 follow one another.
-  ByteSource(InputFile& file, Format format, bool isStream);
+  // The file and the options must outlive the source. In a stream padded runs of base64 follow one another.
+  ByteSource(InputFile& file, Format format, const Options& options);
 
   // As InputFile::read; after a negative answer failure() says what was wrong.
   std::ptrdiff_t read(std::span<std::byte> buffer);
@@ -71,6 +74,7 @@ class ByteSource {
   std::expected<void, spelling::TextError> spell(std::string_view piece);
 
   InputFile& file_;
+  const Options& options_;
   std::variant<std::monostate, spelling::HexReader, spelling::Base64Reader> spelling_;
   std::string pending_;  // bytes that were read and not yet handed out, from taken_ on
   std::size_t taken_ = 0;

@@ -182,9 +182,9 @@ Outcome<std::string> MessageInput::encodeJson() const {
   return std::move(*encoded);
 }
 
-// The reason quotes the text. Without a line it says the place itself.
+// Without a line the reason says the place.
 std::unexpected<Failure> MessageInput::failText(spelling::TextError error) const {
-  if (options_.hidesSecrets) error.reason = "malformed, <redacted>";
+  error = redacted(std::move(error), options_);
   return std::unexpected(error.line == 0 ? reader_->malformed(frame_, error.reason)
                                          : reader_->malformedText(frame_, std::move(error)));
 }
