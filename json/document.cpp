@@ -126,7 +126,7 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
   bool number_unsigned(std::uint64_t value) override { return add(value) != nullptr; }
   bool number_float(double value, const std::string&) override { return add(value) != nullptr; }
   bool string(std::string& value) override { return add(std::move(value)) != nullptr; }
-  bool binary(Node::binary_t&) override { return false; }
+  bool binary(Node::binary_t&) override { return false; }  // not covered: JSON has no such values
   bool start_object(std::size_t) override { return open(Node::object()); }
   bool end_object() override { return close(); }
   bool start_array(std::size_t) override { return open(Node::array()); }
@@ -134,14 +134,15 @@ class DocumentBuilder final : public nlohmann::json_sax<Node> {
   bool key(std::string& name) override {
     Open& innermost = open_.back();
     innermost.memberName = name;
-    return innermost.names.insert(std::move(name)).second || fail("the object has this member twice");
+    if (innermost.names.insert(std::move(name)).second) return true;
+    return fail("the object has this member twice");
   }
   // The position counts the bytes that were read, the offending one included.
   bool parse_error(std::size_t position, const std::string& token,
                    const nlohmann::detail::exception& cause) override {
     constexpr int numberOverflow = 406;
     const std::size_t length = cause.id == numberOverflow ? token.size() : 1;
-    const std::size_t at = position < length ? 0 : position - length;
+    const std::size_t at = position - length;
     return failAt(at, reasonOf(cause.what(), at < text_.size() ? text_[at] : ' '));
   }
 

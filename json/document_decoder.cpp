@@ -152,7 +152,7 @@ DocumentDecoder::Result DocumentDecoder::readUnknownFields(const MessageDescript
       if (known != nullptr && wireTypeOf(known->type) == record.tag.wireType())
         return fail("field " + std::to_string(known->number) + " is " + std::string(known->name));
     }
-    if (auto appended = unknownFields.append(bytesOf(bytes)); !appended) return fail("malformed");
+    (void)unknownFields.append(bytesOf(bytes));  // they were just checked
   }
   itemIndex_.reset();
   return {};

@@ -128,7 +128,7 @@ void Renderer::appendUnknown(const UnknownField& field) {
       }
       close(']');
       break;
-    case WireType::endGroup: break;
+    case WireType::endGroup: break;  // not covered: it stands in no record of its own
   }
   if (!field.isShortest()) {
     startMember("record");

@@ -93,7 +93,7 @@ FieldWriter::Place FieldWriter::makeRoom(std::size_t size, char* at, char* limit
   if (static_cast<std::size_t>(limit - at) >= size) return {at, limit};
   const auto kept = static_cast<std::size_t>(at - target.begin);
   const std::size_t needed = kept + size;
-  if (size > Target::largestEncoding || needed > Target::largestEncoding) {
+  if (needed > Target::largestEncoding) {
     target.error = EncodeError::tooLarge;
     return {nullptr, nullptr};
   }

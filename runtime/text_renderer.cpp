@@ -73,15 +73,14 @@ class LenientReader {
   std::optional<std::uint64_t> readFixed32() { return valueOf(reader_.readFixed32()); }
   std::optional<std::span<const std::byte>> readLengthDelimited() {
     const auto length = static_cast<std::uint32_t>(readVarint().value_or(unreadable));
-    if (length > reader_.remaining() || length >= unreadable) return std::nullopt;
+    if (length > reader_.remaining()) return std::nullopt;
     const std::span body(reader_.position(), length);
     reader_ = WireReader({body.data() + length, reader_.remaining() - length});
     return body;
   }
 
  private:
-  static constexpr std::uint32_t unreadable = std::uint32_t{1}
-                                              << 31;  // also the first length that is too large
+  static constexpr std::uint32_t unreadable = std::uint32_t{1} << 31;  // a length above all that remains
 
   template <class Number>
   static std::optional<std::uint64_t> valueOf(const WireResult<Number>& result) {
@@ -126,8 +125,10 @@ class TextRenderer::UnknownFieldsRenderer {
   bool renderValue(LenientReader& input, Tag tag, Levels left) {
     const std::string name = std::to_string(tag.fieldNumber());
     const auto number = [&](std::optional<std::uint64_t> value, std::size_t hexDigits) {
-      return value && renderer_.plain(name, hexDigits == 0 ? std::to_string(*value)
-                                                           : "0x" + internal::hexNumber(*value, hexDigits));
+      if (!value) return false;
+      (void)renderer_.plain(
+          name, hexDigits == 0 ? std::to_string(*value) : "0x" + internal::hexNumber(*value, hexDigits));
+      return true;
     };
     switch (tag.wireType()) {
       case WireType::varint: return number(input.readVarint(), 0);

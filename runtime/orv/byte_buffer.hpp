@@ -77,7 +77,8 @@ class ByteView {
     using Element = std::remove_extent_t<Array>;
     if constexpr (std::same_as<Element, const char> || std::same_as<Element, const char8_t>)
       return *std::rbegin(array) == 0;
-    return false;
+    else
+      return false;
   }
 
   std::string_view characters_;

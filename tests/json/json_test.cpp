@@ -47,8 +47,19 @@ TEST(Json, ReadsEnvelopes) {
        "$.version: expected a whole number from 0 to 4294967295, found another number"},
       {"fraction", R"({"version":0.5})",
        "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"number beyond 63 bits", R"({"version":9223372036854775808})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
+      {"number far too small", R"({"version":-1e30})",
+       "$.version: expected a whole number from 0 to 4294967295, found another number"},
       {"string with more than digits", R"({"version":" 1"})",
        "$.version: expected a whole number from 0 to 4294967295, found \" 1\""},
+      {"string with more behind the digits", R"({"version":"1 "})",
+       "$.version: expected a whole number from 0 to 4294967295, found \"1 \""},
+      {"string of forty bytes", R"({"version":"4444444444444444444444444444444444444444"})",
+       "$.version: expected a whole number from 0 to 4294967295, found "
+       "\"4444444444444444444444444444444444444444\""},
+      {"string of more", R"({"version":"44444444444444444444444444444444444444444"})",
+       "$.version: expected a whole number from 0 to 4294967295, found a string of 41 bytes"},
       {"string too large", R"({"version":"4294967296"})",
        "$.version: expected a whole number from 0 to 4294967295, found \"4294967296\""},
       {"empty string for a number", R"({"version":""})",
@@ -60,6 +71,8 @@ TEST(Json, ReadsEnvelopes) {
       {"enumeration without a name", R"({"type":9})", "10 09"},
       {"negative enumeration", R"({"type":-1})", "10 FF FF FF FF FF FF FF FF FF 01"},
       {"enumeration beyond 32 bits", R"({"type":2147483648})",
+       "$.type: expected a name or a whole number of 32 bits, found another number"},
+      {"enumeration between two numbers", R"({"type":0.5})",
        "$.type: expected a name or a whole number of 32 bits, found another number"},
       {"enumeration misspelled", R"({"type":"groupmesage"})",
        "$.type: unknown name \"groupmesage\" (did you mean \"groupMessage\"?)"},
@@ -155,6 +168,53 @@ TEST(Json, ReadsTexts) {
   for (const Case& each : cases) EXPECT_EQ(outcome<Approval>(each.document), each.outcome) << each.name;
 }
 
+TEST(Json, ShowsNamesInPathsAsTheyAreSpelled) {
+  const std::pair<std::string, std::string> cases[] = {
+      {"azAZ09_", ".azAZ09_"}, {"", R"([""])"},   {"`", R"(["`"])"}, {"{", R"(["{"])"},
+      {"@", R"(["@"])"},       {"[", R"(["["])"}, {"/", R"(["/"])"}, {":", R"([":"])"},
+  };
+  for (const auto& [name, step] : cases)
+    EXPECT_EQ(outcome<Group>("{\"" + name + "\":0}"), "$" + step + ": unknown field");
+}
+
+TEST(Json, RefusesWhatItsLimitsDoNotAllow) {
+  const struct {
+    std::string_view document;
+    DecodeLimits limits;  // one less than it needs
+    std::size_t DecodeLimits::*limit;
+    std::string_view error;
+  } cases[] = {
+      {R"({"memberLeft":{}})",
+       {.inputBytes = 16},
+       &DecodeLimits::inputBytes,
+       "$: more bytes of input than the limit of 16 allows"},
+      {"{}", {.listElements = 0}, &DecodeLimits::listElements, "$: more values than the limit of 0 allows"},
+      {R"({"initialize":{"groupUUID":"AQ","members":[{},{}]}})",
+       {.listElements = 5},
+       &DecodeLimits::listElements,
+       "$.initialize.members[1]: more values than the limit of 5 allows"},
+      {R"({"memberLeft":{"usesToken":true}})",
+       {.listElements = 2},
+       &DecodeLimits::listElements,
+       "$.memberLeft.usesToken: more values than the limit of 2 allows"},
+  };
+  for (const auto& row : cases) {
+    SCOPED_TRACE(row.error);
+    const auto refused = json::parse<Group>(row.document, row.limits);
+    ASSERT_FALSE(refused);
+    EXPECT_EQ(::testing::PrintToString(refused.error()), row.error);
+    DecodeLimits enough = row.limits;
+    ++(enough.*row.limit);
+    EXPECT_TRUE(json::parse<Group>(row.document, enough));
+  }
+}
+
+TEST(Json, GivesADocumentAway) {
+  auto first = json::Document::parse("[1]").value(), second = json::Document::parse("true").value();
+  first = std::move(second);
+  EXPECT_TRUE(first.root().boolean());
+}
+
 TEST(Json, KeepsWhatWasReadBeforeAnError) {
   const auto document = json::Document::parse(R"({"handle":"a","tokenID":1})");
   ASSERT_TRUE(document.has_value());
@@ -204,9 +264,9 @@ TEST(Json, IsRenderedInOneLineOrIndented) {
 }
 
 TEST(Json, ShowsNothingThatActsOnATerminal) {
-  // Quote, backslash, escape, delete, a control character of two bytes, a line separator.
-  EXPECT_EQ(rendered<Member>("0A 09 22 5C 1B 7F C2 9B E2 80 A8"),
-            R"({"handle":"\"\\\u001b\u007f\u009b\u2028"})");
+  // Quote, backslash, escape, delete, a control character of two bytes, line and paragraph separators, the names.
+  EXPECT_EQ(rendered<Member>("0A 10 22 5C 1B 7F C2 9B E2 80 A8 E2 80 A9 0D 0A 09 20"),
+            R"({"handle":"\"\\\u001b\u007f\u009b\u2028\u2029\r\n\t "})");
 }
 
 TEST(Json, ShowsUnknownFieldsOnDemand) {
@@ -293,16 +353,37 @@ TEST(Json, RefusesUnknownFieldsThatAreNone) {
       {"no value", R"([{"number":9,"wireType":"varint"}])", "$.unknownFields[0]: \"value\" is no varint"},
       {"negative value", R"([{"number":9,"wireType":"varint","value":-1}])",
        "$.unknownFields[0]: \"value\" is no varint"},
+      {"value between two numbers", R"([{"number":9,"wireType":"varint","value":0.5}])",
+       "$.unknownFields[0]: \"value\" is no varint"},
+      {"value with more than digits", R"([{"number":9,"wireType":"varint","value":"1 "}])",
+       "$.unknownFields[0]: \"value\" is no varint"},
+      {"value of 65 bits", R"([{"number":9,"wireType":"varint","value":"18446744073709551616"}])",
+       "$.unknownFields[0]: \"value\" is no varint"},
+      {"no fixed value", R"([{"number":9,"wireType":"fixed64"}])",
+       "$.unknownFields[0]: \"value\" is out of range"},
       {"value too large", R"([{"number":9,"wireType":"fixed32","value":4294967296}])",
        "$.unknownFields[0]: \"value\" is out of range"},
       {"no base64", R"([{"number":9,"wireType":"lengthDelimited","value":"!"}])",
        "$.unknownFields[0]: \"value\" is no base64"},
+      {"no bytes", R"([{"number":9,"wireType":"lengthDelimited"}])",
+       "$.unknownFields[0]: \"value\" is no base64"},
+      {"a number for bytes", R"([{"record":1}])", "$.unknownFields[0]: \"record\" is no base64"},
+      {"no base64 in a record", R"([{"record":"!"}])", "$.unknownFields[0]: \"record\" is no base64"},
+      {"a number for a type", R"([{"number":9,"wireType":0}])", "$.unknownFields[0]: \"wireType\" is none"},
+      {"no value of a group", R"([{"number":9,"wireType":"startGroup"}])",
+       "$.unknownFields[0]: \"value\" is no list"},
+      {"a mistake in a group", R"([{"number":9,"wireType":"startGroup","value":[0]}])",
+       "$.unknownFields[0]: expected an object, found a number"},
       {"no group", R"([{"number":9,"wireType":"startGroup","value":""}])",
        "$.unknownFields[0]: \"value\" is no list"},
       {"malformed record", R"([{"record":"Cg=="}])",
        "$.unknownFields[0]: malformed: the input ends inside a record"},
       {"known field", R"([{"number":1,"wireType":"lengthDelimited","value":"/w=="}])",
        "$.unknownFields[0]: field 1 is handle"},
+      {"largest number", R"([{"number":9,"wireType":"varint","value":9223372036854775807}])",
+       "48 FF FF FF FF FF FF FF FF 7F"},
+      {"number above it", R"([{"number":9,"wireType":"varint","value":9223372036854775808}])",
+       "$.unknownFields[0]: \"value\" is no varint"},
       {"null", "null", ""},
   };
   for (const Case& each : cases)

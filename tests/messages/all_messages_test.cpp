@@ -116,6 +116,29 @@ TEST(AllMessages, AreReplacedWhenTheirMemoryIsUsedAgain) {
   });
 }
 
+// A field of another wire type than its own is unknown, and leaves nothing of what the memory held.
+TEST(AllMessages, AreReplacedByFieldsOfEveryWireType) {
+  for (const MessagePointer& type : allMessages()) {
+    for (const FieldDescriptor& field : type->descriptor().fields) {
+      const auto tag = [&](WireType wireType) {
+        return varint(field.number << 3 | static_cast<unsigned>(wireType));
+      };
+      const std::string records[] = {tag(WireType::varint) + hex("01"), tag(WireType::fixed64) + hex("01*8"),
+                                     tag(WireType::fixed32) + hex("01*4"),
+                                     tag(WireType::lengthDelimited) + hex("00"),
+                                     tag(WireType::startGroup) + tag(WireType::endGroup)};
+      for (const std::string& held : records) {
+        for (const std::string& bytes : records) {
+          const MessagePointer reused = type->parse(held).value();
+          ASSERT_TRUE(reused->reparse(bytes));
+          EXPECT_EQ(encoded(*reused), encoded(*type->parse(bytes).value()))
+              << type->fullName() << ": " << toHex(held) << ", and then " << toHex(bytes);
+        }
+      }
+    }
+  }
+}
+
 TEST(AllMessages, KeepWhatWasReadBeforeAnError) {
   forRandomEncodings([](const AnyMessage& type, const std::string& left, const std::string& right) {
     const MessagePointer merged = type.parse(left).value();

@@ -34,7 +34,10 @@ TEST(Printing, ShowsValuesAndErrors) {
       {printed(error.path), "orv.Group.memberAdded"},
       {printed(streamError), "orv.Group.memberAdded: length 5 runs 5 bytes past the end, at byte 7"},
       {printed(streamError.cause), "malformed message"},
+      {printed(DecodeError()), "the input ends inside a record, at byte 0"},
+      {printed(FieldPath()), ""},
       {printed(EncodeError::bufferTooSmall), "the buffer is too small for the encoding"},
+      {printed(EncodeError::tooLarge), "the encoding would have more than 2^31-1 bytes"},
       {printed(Text::checked("ab\xff").error()), "ill-formed UTF-8 at byte 2"},
   };
   for (const auto& [text, expected] : cases) EXPECT_EQ(text, expected);
@@ -170,6 +173,16 @@ class OwnMessage final : public Message<OwnMessage> {
   bool flag_ = true;
   static constexpr std::tuple fields{field<&OwnMessage::flag_>(1, "f\u00FCr")};
 };
+
+TEST(Printing, ShowsByNumberWhatStandsInNoMessage) {
+  for (const bool hidesSecrets : {false, true}) {
+    std::string text;
+    TextRenderer renderer(text, {.isOneLine = true, .hidesSecrets = hidesSecrets});
+    EXPECT_TRUE(renderer.visitAnyValue(true, 7));
+    EXPECT_TRUE(renderer.visitSingularMessageField(Member(), 8));
+    EXPECT_EQ(text, hidesSecrets ? "7: <redacted> 8: <redacted> " : "7: true 8 { } ");
+  }
+}
 
 TEST(Printing, CutsBetweenCharacters) {
   struct Renderer : TextRenderer {

@@ -88,6 +88,10 @@ TEST(Schema, HasTheFieldNamesOfTheNameMaps) {
   forEachMessage([](const AnyMessage& message, const Descriptor& type) {
     const NameMap names = message.nameMap();
     ASSERT_EQ(names.entries().size(), static_cast<std::size_t>(type.field_count()));
+    bool nestsMessages = false;
+    for (int at = 0; at < type.field_count(); ++at)
+      nestsMessages = nestsMessages || type.field(at)->message_type() != nullptr;
+    EXPECT_EQ(message.descriptor().nestsMessages(), nestsMessages);
     std::int64_t last = 0;
     for (const NameMap::Entry& entry : names.entries()) {
       EXPECT_LT(std::exchange(last, entry.number), entry.number) << "not in ascending order";
@@ -145,6 +149,8 @@ TEST(Schema, HasTheTypeAndPresenceOfEveryField) {
       const bool isVarint = field->type() == FieldDescriptor::TYPE_BOOL ||
                             field->type() == FieldDescriptor::TYPE_UINT32 ||
                             field->type() == FieldDescriptor::TYPE_ENUM;
+      EXPECT_EQ(wireTypeOf(message.descriptor().field(number)->type),
+                isVarint ? WireType::varint : WireType::lengthDelimited);
       const std::string defaultValue = varint(number << 3 | (isVarint ? 0 : 2)) + '\0';
       const bool isEmitted = field->has_presence() || field->is_repeated();
       EXPECT_EQ(message.parse(defaultValue).value()->serialize(), isEmitted ? defaultValue : "");

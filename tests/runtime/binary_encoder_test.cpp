@@ -35,6 +35,16 @@ TEST(BinaryEncoder, WritesTagsAndLengthsOfEverySize) {
   }
 }
 
+TEST(BinaryEncoder, SaysThatABufferIsTooSmall) {
+  const Group group = Group::parse(hex("0A 02 12 00")).value();
+  std::array<std::byte, 3> room;
+  BinaryEncoder walked(room);
+  EXPECT_EQ(group.traverse(walked), std::unexpected(EncodeError::bufferTooSmall));
+  BinaryEncoder visited(room);
+  EXPECT_FALSE(visited.visitSingularMessageField(group, 1));
+  EXPECT_EQ(visited.error(), EncodeError::bufferTooSmall);
+}
+
 TEST(BinaryEncoder, RefusesMoreThanTheFormatAllows) {
 #ifdef __SANITIZE_THREAD__
   GTEST_SKIP() << "the thread sanitizer would take ten gigabytes to watch two";

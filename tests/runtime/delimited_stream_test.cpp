@@ -183,7 +183,9 @@ TEST(DelimitedStream, GoesOnInAReaderThatWasMovedTo) {
   EXPECT_EQ(first.read<SessionMessage>().value()->version(), 1U);
   DelimitedReader second(readerOf("", 1));
   second = std::move(first);
-  EXPECT_EQ(second.read<SessionMessage>().value()->version(), 2U);
+  DelimitedReader third(std::move(second));
+  EXPECT_EQ(third.read<SessionMessage>().value()->version(), 2U);
+  EXPECT_FALSE(third.read<SessionMessage>().value());
 }
 
 }  // namespace

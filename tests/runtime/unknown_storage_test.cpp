@@ -43,6 +43,9 @@ TEST(UnknownStorage, GivesItsFieldsOneByOne) {
     ++at;
   }
   EXPECT_EQ(at, std::size(expected));
+  auto second = storage.begin();
+  second++;
+  EXPECT_EQ(second->tag.fieldNumber(), 3U);
   EXPECT_TRUE(UnknownStorage().begin() == UnknownStorage().end());
 }
 

@@ -51,6 +51,15 @@ TEST(Utf8, IsWellFormedWhereAnotherLibrarySaysSo) {
       }
     }
   }
+  // In a block, of which all bytes are looked at together.
+  for (int lead = 0x80; lead < 0x100; ++lead) {
+    for (int second = 0; second < 0x100; ++second) {
+      for (const char* const tail : {"", "\x80", "\x80\x80", "\xBF\xC0", "\xBF\xBF\x80"}) {
+        const std::string text{static_cast<char>(lead), static_cast<char>(second)};
+        countFault(std::string(50, 'a') + text + tail + std::string(50, 'a'), faults);
+      }
+    }
+  }
   EXPECT_EQ(faults, 0U);
 }
 
@@ -64,6 +73,13 @@ TEST(Utf8, IsCheckedToTheLastByteWhateverTheLength) {
       EXPECT_FALSE(utf8::isWellFormed(text));
       EXPECT_EQ(utf8::wellFormedPrefix(text), at);
     }
+  }
+}
+
+TEST(Utf8, IsRefusedWhereABlockHasNoBeginningOfALetter) {
+  for (const char* const start : {"", "a", "\xC3", "\xF4"}) {
+    const std::string text = std::string(64, 'a') + start + std::string(200, '\x80');
+    EXPECT_EQ(utf8::wellFormedPrefix(text), expectedPrefix(text));
   }
 }
 

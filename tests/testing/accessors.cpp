@@ -115,12 +115,11 @@ Accessors row(std::string_view field, Get get, std::type_identity_t<void (M::*)(
 
 // A oneof as a whole.
 template <class M, class Group>
-Accessors groupRow(std::string_view name, const Group& (M::*get)() const, void (M::*set)(Group),
+Accessors groupRow(std::string_view name, auto caseOf, const Group& (M::*get)() const, void (M::*set)(Group),
                    Group& (M::*change)()) {
   Accessors row{M::protoMessageName, name, {}, {}, {}, {}, {}};
   row.get = [=](AnyMessage& message) {
-    const Group& group = (as<M>(message).*get)();
-    return varint(group ? group->index() + 1 : 0);
+    return varint(static_cast<std::uint64_t>((as<M>(message).*caseOf)()));
   };
   row.set = [=](AnyMessage& message, std::string_view bytes) {
     const M other = Spelling<M>::make(bytes);
@@ -168,7 +167,7 @@ std::vector<Accessors> makeRows() {
       row<A>("handle", &A::handle, &A::setHandle, &A::mutableHandle),
       row<A>("denied", &A::denied, &A::setDenied, &A::mutableDenied),
       row<A>("approved", &A::approved, &A::setApproved, &A::mutableApproved),
-      groupRow<A>("operation", &A::operation, &A::setOperation, &A::mutableOperation),
+      groupRow<A>("operation", &A::operationCase, &A::operation, &A::setOperation, &A::mutableOperation),
       row<A::ApprovalContent>("invitationData", &A::ApprovalContent::invitationData,
                               &A::ApprovalContent::setInvitationData),
       row<J>("publicKey", &J::publicKey, &J::setPublicKey, &J::mutablePublicKey, &J::hasPublicKey,
@@ -188,7 +187,7 @@ std::vector<Accessors> makeRows() {
       row<R>("identifier", &R::identifier, &R::setIdentifier, &R::mutableIdentifier),
       row<R>("denied", &R::denied, &R::setDenied, &R::mutableDenied),
       row<R>("approved", &R::approved, &R::setApproved, &R::mutableApproved),
-      groupRow<R>("operation", &R::operation, &R::setOperation, &R::mutableOperation),
+      groupRow<R>("operation", &R::operationCase, &R::operation, &R::setOperation, &R::mutableOperation),
       row<P>("sessionIdentifier", &P::sessionIdentifier, &P::setSessionIdentifier,
              &P::mutableSessionIdentifier),
       row<P>("memberHandles", &P::memberHandles, &P::setMemberHandles, &P::mutableMemberHandles),
@@ -201,7 +200,7 @@ std::vector<Accessors> makeRows() {
       row<G>("memberAdded", &G::memberAdded, &G::setMemberAdded, &G::mutableMemberAdded),
       row<G>("memberRemoved", &G::memberRemoved, &G::setMemberRemoved, &G::mutableMemberRemoved),
       row<G>("memberLeft", &G::memberLeft, &G::setMemberLeft, &G::mutableMemberLeft),
-      groupRow<G>("event", &G::event, &G::setEvent, &G::mutableEvent),
+      groupRow<G>("event", &G::eventCase, &G::event, &G::setEvent, &G::mutableEvent),
       row<I>("groupUUID", &I::groupUuid, &I::setGroupUuid),
       row<I>("members", &I::members, &I::setMembers, &I::mutableMembers),
       row<L>("groupUUID", &L::groupUuid, &L::setGroupUuid),

@@ -80,7 +80,7 @@ concept StorageOfAField = StorageTraits<Storage>::isKnown &&
     }();
 
 template <class Value>
-constexpr ValueType valueTypeOf() {
+consteval ValueType valueTypeOf() {
   if constexpr (std::same_as<Value, Text>) return ValueType::string;
   if constexpr (std::same_as<Value, ByteBuffer>) return ValueType::bytes;
   if constexpr (std::same_as<Value, bool>) return ValueType::boolean;
@@ -114,7 +114,7 @@ inline constexpr Secrecy secret = Secrecy::secret;
 
 template <auto Pointer, class Case = void>
 requires internal::StorageOfAField<internal::PointedTo<Pointer>, Case>
-constexpr Field<Pointer, Case> field(std::uint32_t number, std::string_view name,
+consteval Field<Pointer, Case> field(std::uint32_t number, std::string_view name,
                                      Secrecy secrecy = Secrecy::open) {
   return {number, name, secrecy == secret};
 }

@@ -254,7 +254,8 @@ std::expected<std::string, EncodeError> Message<M>::serialize() const {
   // Bold guesses need some room beyond the encoding.
   constexpr std::size_t slack = 8;
   const std::size_t size = encodedSize();
-  if (size > BinaryEncoder::largestEncoding) return std::unexpected(EncodeError::tooLarge);
+  if (size > BinaryEncoder::largestEncoding)
+    return std::unexpected(EncodeError::tooLarge);  // not covered: by orv_size_tests
   std::expected<std::string, EncodeError> bytes;
   bytes->resize_and_overwrite(size + slack, [&](char* begin, std::size_t room) {
     const auto written = serializeInto(std::as_writable_bytes(std::span(begin, room)));

@@ -104,8 +104,10 @@ class Message {
   // As ==, for a message of any type: a message of another type is never equal.
   template <class Other>
   bool isEqualTo(const Other& other) const {
-    if constexpr (std::is_same_v<M, Other>) return self() == other;
-    return false;
+    if constexpr (std::is_same_v<M, Other>)
+      return self() == other;
+    else
+      return false;
   }
 
   // An order for sets and maps, which agrees with ==: field by field as they are compared there, what is
@@ -207,7 +209,7 @@ class Message {
   // M's table; a template, because M is not complete where this class is.
   struct Rows {
     template <class Complete>
-    static constexpr const auto& of() {
+    static consteval const auto& of() {
       return Complete::fields;
     }
   };

@@ -187,7 +187,7 @@ class FieldReader {
     return read;
   }
 
-  Step handleConflictingOneOf() { return askHook(*frame_); }
+  Step handleConflictingOneOf() { return askHook(*frame_); }  // not covered: decodeCase asks itself
 
   // One occurrence of a oneof member, in place wherever that is possible: a repeated member is not copied,
   // which with many repeats is the difference between linear and quadratic time.

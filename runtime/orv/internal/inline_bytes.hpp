@@ -45,7 +45,7 @@ class InlineBytes {
   // compiler drops where others are written at once (docs/decisions/inline-bytes.md).
   constexpr InlineBytes() noexcept {
     if (std::is_constant_evaluated()) {
-      for (unsigned char& byte : raw_) byte = 0;
+      for (unsigned char& byte : raw_) byte = 0;  // not covered: in constants
     } else {
       const std::uint64_t zero = 0;
       [&]<std::size_t... words>(std::index_sequence<words...>) {

@@ -39,14 +39,11 @@ using NextNumberOf = typename NextNumberOfDecoder<D>::Type;
 // What operations on any enumeration may rely on: the concepts try them with this one.
 class SomeEnumeration {
  public:
-  constexpr explicit SomeEnumeration(std::int64_t rawValue) : rawValue_(rawValue) {}
-  constexpr std::int64_t rawValue() const { return rawValue_; }
-  static constexpr NameMap _protobuf_nameMap() { return {}; }
+  explicit SomeEnumeration(std::int64_t rawValue);
+  std::int64_t rawValue() const;
+  static NameMap _protobuf_nameMap();
   template <class Hasher>
-  void hash(Hasher&) const {}
-
- private:
-  std::int64_t rawValue_;
+  void hash(Hasher&) const;
 };
 
 }  // namespace orv::internal

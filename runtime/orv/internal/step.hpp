@@ -17,7 +17,7 @@ class [[nodiscard]] Step {
   constexpr Step(std::unexpected<Failed>) : isTaken_(false) {}  // NOLINT(google-explicit-constructor)
 
   constexpr explicit operator bool() const { return isTaken_; }
-  constexpr Failed error() const { return {}; }
+  constexpr Failed error() const { return {}; }  // not covered: for whoever wraps a decoder or visitor
 
  private:
   bool isTaken_ = true;

@@ -2,11 +2,24 @@
 #include <gtest/gtest.h>
 
 #include <orv/binary_decoder.hpp>
+#include <orv/instantiate.hpp>
 #include "tests/testing/heap.hpp"
 #include "tests/testing/hex.hpp"
 #include "tests/testing/nested_messages.hpp"
 
 namespace orv::test {
+
+// As deep as none of the others.
+class Shelf final : public Message<Shelf> {
+ public:
+  static constexpr std::string_view protoMessageName = "test.Shelf";
+
+ private:
+  friend Message;
+  std::vector<Folder> folders_;
+  static constexpr std::tuple fields{field<&Shelf::folders_>(1, "folders")};
+};
+
 namespace {
 
 TEST(OwnMessage, IsReadWrittenComparedAndNamedByItsTable) {
@@ -23,6 +36,24 @@ TEST(OwnMessage, IsReadWrittenComparedAndNamedByItsTable) {
   EXPECT_EQ(other.hashValue(), message.hashValue());
   EXPECT_EQ(Wrapper::parse(hex("0A 04 22 02 0A 09")).error().message(),
             "test.Wrapper.group.memberLeft.groupUUID: length 9 runs 9 bytes past the end, at byte 5");
+  EXPECT_EQ(Wrapper::parse(hex("0A 02 12 00 0A 06 12 00 12 02 0A 09")).error().message(),
+            "test.Wrapper.group.memberAdded.groupUUID: length 9 runs 9 bytes past the end, at byte 11");
+}
+
+TEST(OwnMessage, ShowsFiveStepsOfAPath) {
+  const DecodeError shallow = Shelf::parse(hex("0A 08 12 06 0A 04 0A 02 12 05")).error();
+  EXPECT_EQ(shallow.message(),
+            "test.Shelf.folders.wrapper.group.initialize.members: "
+            "length 5 runs 5 bytes past the end, at byte 9");
+  const DecodeError deep = Shelf::parse(hex("0A 0A 12 08 0A 06 0A 04 12 02 0A 05")).error();
+  EXPECT_EQ(deep.message(),
+            "test.Shelf.folders.wrapper.group.initialize.members.(1 deeper): "
+            "length 5 runs 5 bytes past the end, at byte 11");
+  EXPECT_NE(deep.path, shallow.path);
+  EXPECT_NE(deep, shallow);
+  FieldPath unnamed;
+  unnamed.assign(Shelf::descriptor(), std::array<std::uint32_t, 2>{5, 1}, 0);
+  EXPECT_EQ(unnamed.text(), "test.Shelf.5.1");
 }
 
 TEST(OwnMessage, ReadsAPayloadInAMessageThatComesAgainBeforeTheHookIsAsked) {
@@ -79,3 +110,5 @@ TEST(OwnMessage, AsksTheHookAboutAOneofInAMessageThatComesAgain) {
 
 }  // namespace
 }  // namespace orv::test
+
+template class orv::Message<orv::test::Shelf>;

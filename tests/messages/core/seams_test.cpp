@@ -3,6 +3,8 @@
 
 #include <algorithm>
 
+#include <orv/any_value_decoder.hpp>
+#include <orv/any_value_visitor.hpp>
 #include <orv/orv.hpp>
 #include "tests/testing/any_message.hpp"
 #include "tests/testing/hex.hpp"
@@ -208,6 +210,117 @@ TEST(CustomVisitor, EndsTheWalkWithTheErrorOfItsNthVisit) {
       EXPECT_EQ(visitor.visits(), Calls(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(count)));
     }
   }
+}
+
+// Takes every second value, and refuses that of one call.
+class EverySecond : public AnyValueDecoder<EverySecond, std::size_t> {
+ public:
+  EverySecond(std::span<const std::uint32_t> numbers, std::size_t refused)
+      : numbers_(numbers), refused_(refused) {}
+
+  template <class M>
+  std::expected<std::optional<std::uint32_t>, Error> nextFieldNumber(M&) {
+    if (numbers_.empty()) return std::nullopt;
+    const std::uint32_t number = numbers_.front();
+    numbers_ = numbers_.subspan(1);
+    return number;
+  }
+  template <class T>
+  std::expected<bool, Error> readAnyValue(T& value) {
+    value = T(1);
+    return answer();
+  }
+  std::expected<bool, Error> readAnyValue(Text& value) {
+    value = "x";
+    return answer();
+  }
+  std::expected<bool, Error> readAnyValue(ByteBuffer& value) {
+    value = ByteBuffer("x");
+    return answer();
+  }
+  template <class M>
+  std::expected<bool, Error> readAnyMessage(M& message) {
+    EXPECT_TRUE(message.merge(hex("78 01")));
+    return answer();
+  }
+
+ private:
+  std::expected<bool, Error> answer() {
+    if (count_ == refused_) return std::unexpected(count_);
+    return count_++ % 2 == 0;
+  }
+
+  std::span<const std::uint32_t> numbers_;
+  std::size_t refused_;
+  std::size_t count_ = 0;
+};
+
+TEST(AnyValueDecoder, StoresWhatItsReaderTakes) {
+  AllMessages::forEach([]<class M>() {
+    for (const FieldDescriptor& field : M::descriptor().fields) {
+      SCOPED_TRACE(std::string(M::protoMessageName) + "." + std::string(field.name));
+      // What is taken once, and what is taken twice, with one that is not taken between them.
+      const std::vector<std::uint32_t> numbers(3, field.number);
+      const auto decoded = [&](std::size_t count, std::size_t refused = SIZE_MAX) {
+        EverySecond decoder{std::span(numbers).first(count), refused};
+        M message;
+        const auto result = message.decodeMessage(decoder);
+        if (refused < count) {
+          EXPECT_EQ(result, std::unexpected(refused));
+        } else {
+          EXPECT_TRUE(result);
+        }
+        return message;
+      };
+      EXPECT_NE(decoded(1), M());
+      EXPECT_EQ(decoded(2), decoded(1));
+      EXPECT_EQ(decoded(3, 0), M());
+      EXPECT_EQ(decoded(3, 2), decoded(1));
+      const bool isAdded = field.kind == FieldKind::repeated || field.type == ValueType::message;
+      EXPECT_EQ(decoded(3) != decoded(1), isAdded);
+    }
+  });
+}
+
+// Counts what it is handed, the beginnings of messages too, and refuses one.
+class Counting : public AnyValueVisitor<Counting, std::size_t> {
+ public:
+  explicit Counting(std::size_t refused) : refused_(refused) {}
+  std::size_t count() const { return count_; }
+
+  template <class T>
+  Result visitAnyValue(const T&, std::uint32_t) {
+    return answer();
+  }
+  template <class M>
+  Result beginMessage(const M& message, std::size_t fieldCount) {
+    if (auto answered = answer(); !answered) return answered;
+    return AnyValueVisitor::beginMessage(message, fieldCount);
+  }
+
+ private:
+  Result answer() {
+    if (count_ == refused_) return std::unexpected(count_);
+    ++count_;
+    return {};
+  }
+
+  std::size_t refused_;
+  std::size_t count_ = 0;
+};
+
+TEST(AnyValueVisitor, EndsTheWalkWithTheErrorOfItsReader) {
+  Random random;
+  AllMessages::forEach([&]<class M>() {
+    const M message = M::parse(randomEncoding(M::protoMessageName, random)).value();
+    Counting complete(SIZE_MAX);
+    ASSERT_TRUE(message.traverse(complete));
+    for (std::size_t refused = 0; refused < complete.count(); ++refused) {
+      Counting visitor(refused);
+      EXPECT_EQ(message.traverse(visitor), std::unexpected(refused)) << M::protoMessageName;
+      EXPECT_EQ(visitor.count(), refused);
+    }
+  });
 }
 
 }  // namespace

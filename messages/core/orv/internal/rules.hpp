@@ -37,8 +37,9 @@ template <class Table, std::size_t index, class M, class D, class Next, class Ta
       if (!isAtField(next)) return {};
     }
     return takeFieldsFrom<Table, index + 1>(message, decoder, next, isKnown, take);
+  } else {
+    return {};
   }
-  return {};
 }
 
 // The decode loop: `take` is called with the index of each field's row and the decoder that stands at it. A
@@ -217,7 +218,8 @@ template <class Table, class M>
   const auto areEqual = [&]<std::size_t index>() {
     if constexpr (Table::template isFirstRow<index>)
       return Table::template storage<index>(left) == Table::template storage<index>(right);
-    return true;
+    else
+      return true;
   };
   return [&]<std::size_t... indices>(std::index_sequence<indices...>) {
     return (areEqual.template operator()<indices>() && ...);
@@ -254,8 +256,10 @@ std::size_t likelySize(const Storage& storage) {
   } else if constexpr (requires { storage.size(); }) {
     return headSize + storage.size();
   } else if constexpr (requires { storage.has_value(); }) {
-    if constexpr (requires { storage->isEmpty(); }) return storage.has_value() ? likelySize(*storage) : 0;
-    return headSize;
+    if constexpr (requires { storage->isEmpty(); })
+      return storage.has_value() ? likelySize(*storage) : 0;
+    else
+      return headSize;
   } else {
     return headSize;
   }

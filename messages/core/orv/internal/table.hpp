@@ -86,19 +86,19 @@ class UncheckedTable {
   static constexpr std::array<std::string_view, size> names =
       std::apply([](const auto&... row) { return std::array<std::string_view, size>{row.name...}; }, rows);
 
-  static constexpr bool areNumbersAscending() {
+  static consteval bool areNumbersAscending() {
     for (std::size_t at = 1; at < size; ++at) {
       if (numbers[at - 1] >= numbers[at]) return false;
     }
     return true;
   }
   // 19000 to 19999 are the format's own (protobuf.dev, "Assigning Field Numbers").
-  static constexpr bool areNumbersValid() {
+  static consteval bool areNumbersValid() {
     return std::ranges::all_of(numbers, [](std::uint32_t number) {
       return number >= 1 && number < 1U << 29 && (number < 19000 || number > 19999);
     });
   }
-  static constexpr bool areNamesDistinct() {
+  static consteval bool areNamesDistinct() {
     for (std::size_t at = 0; at < size; ++at) {
       for (std::size_t other = 0; other < at; ++other) {
         if (names[at] == names[other]) return false;
@@ -106,7 +106,7 @@ class UncheckedTable {
     }
     return true;
   }
-  static constexpr bool haveCasesOneRowEach() {
+  static consteval bool haveCasesOneRowEach() {
     bool all = true;
     forEachIndex([&]<std::size_t index>() {
       if constexpr (isCase<index>) {
@@ -123,7 +123,7 @@ class UncheckedTable {
     });
     return all;
   }
-  static constexpr bool haveStoragesOneRowEach() {
+  static consteval bool haveStoragesOneRowEach() {
     bool all = true;
     forEachIndex([&]<std::size_t index>() {
       if constexpr (!isCase<index>) all = all && isFirstRow<index>;
@@ -146,7 +146,7 @@ class Table : public UncheckedTable<M, Rows> {
   static_assert(Base::haveStoragesOneRowEach(), "field table: each storage has its row once");
 
   template <std::size_t index>
-  static constexpr FieldDescriptor describe() {
+  static consteval FieldDescriptor describe() {
     using Value = typename Base::template Value<index>;
     FieldDescriptor field{.number = Base::numbers[index],
                           .name = Base::names[index],
@@ -161,7 +161,7 @@ class Table : public UncheckedTable<M, Rows> {
     return field;
   }
   template <std::size_t index>
-  static constexpr std::uint8_t oneofIndex() {
+  static consteval std::uint8_t oneofIndex() {
     std::uint8_t before = 0;
     Base::forEachIndex([&]<std::size_t other>() {
       if (Base::template isCase<other> && Base::template isFirstRow<other> &&
