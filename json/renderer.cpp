@@ -22,7 +22,7 @@ bool isControl(char32_t codePoint) {
 }
 
 // ASCII that stands for itself.
-bool isPlain(char c) { return c >= 0x20 && c < 0x7F && c != '"' && c != '\\'; }
+bool standsForItself(char c) { return c >= 0x20 && c < 0x7F && c != '"' && c != '\\'; }
 
 }  // namespace
 
@@ -60,7 +60,8 @@ void Renderer::startMember(std::string_view name) {
 void appendQuoted(std::string_view utf8, std::string& output) {
   output += '"';
   for (;;) {
-    const auto plain = static_cast<std::size_t>(std::ranges::find_if_not(utf8, isPlain) - utf8.begin());
+    const auto plain =
+        static_cast<std::size_t>(std::ranges::find_if_not(utf8, standsForItself) - utf8.begin());
     output += utf8.substr(0, plain);
     utf8.remove_prefix(plain);
     if (utf8.empty()) break;

@@ -47,7 +47,7 @@ class Inside {
     auto* const bytes = static_cast<char*>(target);
 #ifdef __SSE2__
     const auto two = [&](std::size_t at) {
-      return _mm_set_epi64x(static_cast<long long>(words_[at + 1]), static_cast<long long>(words_[at]));
+      return _mm_set_epi64x(static_cast<std::int64_t>(words_[at + 1]), static_cast<std::int64_t>(words_[at]));
     };
     _mm_storeu_si128(reinterpret_cast<__m128i*>(bytes), two(0));
     _mm_storeu_si128(reinterpret_cast<__m128i*>(bytes + 16), two(2));

@@ -226,8 +226,7 @@ TextRenderer::Result TextRenderer::plain(std::string_view name, std::string_view
 TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_view bytes) {
   // Long ones piece by piece, so that the room for the longest escapes is never much more than the text takes.
   constexpr std::size_t pieceSize = 4096;
-  std::size_t done = 0;
-  do {
+  for (std::size_t done = 0;;) {
     const std::string_view piece = bytes.substr(done, pieceSize);
     append(name, longestEscape * piece.size() + 4, [&](char* at) {
       if (done == 0) at = put(": \"", startLine(name, at));
@@ -235,8 +234,8 @@ TextRenderer::Result TextRenderer::quoted(std::string_view name, std::string_vie
       return done + piece.size() == bytes.size() ? endLine(put("\"", at)) : at;
     });
     done += piece.size();
-  } while (done < bytes.size() && !isCut_);
-  return {};
+    if (done == bytes.size() || isCut_) return {};
+  }
 }
 
 TextRenderer::Result TextRenderer::visitUnknownFields(const UnknownStorage& unknownFields) {

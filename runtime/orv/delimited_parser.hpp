@@ -42,8 +42,7 @@ class DelimitedParser {
   // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>
   [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
-    auto bytes = next();
-    return decoded<M>(std::move(bytes));
+    return decoded<M>(next());
   }
 
   // To be asked where the stream has ended and every message is popped: whether it ended between two messages.
@@ -59,8 +58,8 @@ class DelimitedParser {
 
   // The message that next answered.
   template <class M>
-  std::expected<std::optional<M>, StreamError> decoded(Bytes bytes) const {
-    if (!bytes) return std::unexpected(std::move(bytes.error()));
+  std::expected<std::optional<M>, StreamError> decoded(const Bytes& bytes) const {
+    if (!bytes) return std::unexpected(bytes.error());
     if (!bytes->has_value()) return std::nullopt;
     auto message = M::parse(**bytes, limits_);
     if (!message) return std::unexpected(malformedMessage(message.error()));

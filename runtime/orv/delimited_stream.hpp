@@ -51,8 +51,7 @@ class DelimitedReader {
   // As next, decoded. A message that cannot be decoded is an error, malformedMessage.
   template <class M>
   [[nodiscard]] std::expected<std::optional<M>, StreamError> read() {
-    auto bytes = next();
-    return parser().decoded<M>(std::move(bytes));
+    return parser().decoded<M>(next());
   }
 
   // Where in the stream the message that was read last begins, behind its length.

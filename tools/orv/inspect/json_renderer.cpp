@@ -14,12 +14,12 @@ class JsonRenderer final : public Renderer {
   JsonRenderer(const Options& options, std::string& output) : Renderer(output), options_(options) {}
 
   void beginMessage(const ExplainedMessage& message) override {
-    add("{\"file\":", spelling::printable(message.path));
-    if (message.number != 0) add(",\"message\":", message.number);
-    add(",\"type\":", message.type.fullName());
-    add(",\"offset\":", message.offset);
-    add(",\"length\":", message.bytes.size());
-    output_ += ",\"fields\":[";
+    add(R"({"file":)", spelling::printable(message.path));
+    if (message.number != 0) add(R"(,"message":)", message.number);
+    add(R"(,"type":)", message.type.fullName());
+    add(R"(,"offset":)", message.offset);
+    add(R"(,"length":)", message.bytes.size());
+    output_ += R"(,"fields":[)";
     isFirst_ = true;
     message_ = &message;
   }
@@ -29,20 +29,20 @@ class JsonRenderer final : public Renderer {
     if (!isFirst_) output_ += ',';
     isFirst_ = false;
     if (!options_.isDelimited) output_ += "\n  ";
-    add("{\"path\":", record.path);
+    add(R"({"path":)", record.path);
     if (!record.isAbsent()) {
-      add(",\"number\":", record.tag.fieldNumber());
-      add(",\"offset\":", explained.offset);
-      add(",\"header\":", record.header.size());
-      add(",\"length\":", record.value.size());
+      add(R"(,"number":)", record.tag.fieldNumber());
+      add(R"(,"offset":)", explained.offset);
+      add(R"(,"header":)", record.header.size());
+      add(R"(,"length":)", record.value.size());
     }
-    add(",\"kind\":", explained.kind());
-    if (!record.type) addLiteral(",\"unknown\":", "true");
-    if (record.isAbsent()) addLiteral(",\"absent\":", "true");
+    add(R"(,"kind":)", explained.kind());
+    if (!record.type) addLiteral(R"(,"unknown":)", "true");
+    if (record.isAbsent()) addLiteral(R"(,"absent":)", "true");
     if (explained.message != nullptr) {
-      add(",\"message\":", explained.message->fullName);
+      add(R"(,"message":)", explained.message->fullName);
     } else if (explained.isHidden) {
-      add(",\"value\":", "<redacted>");
+      add(R"(,"value":)", "<redacted>");
     } else if (!record.isAbsent() || record.field->kind == FieldKind::implicitPresence) {
       addValue(record);
     }
@@ -50,9 +50,9 @@ class JsonRenderer final : public Renderer {
   }
 
   void error(const ExplainedError& error) override {
-    add("],\"error\":{\"offset\":", message_->offset + error.error.offset);
-    add(",\"path\":", error.error.path.text());
-    add(",\"reason\":", error.error.reason());
+    add(R"(],"error":{"offset":)", message_->offset + error.error.offset);
+    add(R"(,"path":)", error.error.path.text());
+    add(R"(,"reason":)", error.error.reason());
     output_ += '}';
     hasError_ = true;
   }
@@ -72,7 +72,7 @@ class JsonRenderer final : public Renderer {
   void add(std::string_view start, std::uint64_t number) { addLiteral(start, std::to_string(number)); }
   void addLiteral(std::string_view start, std::string_view literal) { output_.append(start).append(literal); }
   void addBytes(std::span<const std::byte> bytes) {
-    output_ += ",\"value\":\"";
+    output_ += R"(,"value":")";
     spelling::appendBase64(charactersOf(bytes), output_);
     output_ += '"';
   }
@@ -82,19 +82,19 @@ class JsonRenderer final : public Renderer {
     if (!record.type) {
       const bool isNumber =
           record.tag.wireType() != WireType::lengthDelimited && record.tag.wireType() != WireType::startGroup;
-      return isNumber ? add(",\"value\":", std::string_view(std::to_string(record.number)))
+      return isNumber ? add(R"(,"value":)", std::string_view(std::to_string(record.number)))
                       : addBytes(record.value);
     }
     switch (*record.type) {
-      case ValueType::string: return add(",\"value\":", charactersOf(record.value));
+      case ValueType::string: return add(R"(,"value":)", charactersOf(record.value));
       case ValueType::bytes: return addBytes(record.value);
-      case ValueType::boolean: return addLiteral(",\"value\":", record.number != 0 ? "true" : "false");
+      case ValueType::boolean: return addLiteral(R"(,"value":)", record.number != 0 ? "true" : "false");
       case ValueType::uint32:
-        return addLiteral(",\"value\":", std::to_string(static_cast<std::uint32_t>(record.number)));
+        return addLiteral(R"(,"value":)", std::to_string(static_cast<std::uint32_t>(record.number)));
       case ValueType::message: return;
       case ValueType::enumeration:
-        if (const std::string_view name = record.caseName(); !name.empty()) return add(",\"value\":", name);
-        addLiteral(",\"value\":", std::to_string(static_cast<std::int32_t>(record.number)));
+        if (const std::string_view name = record.caseName(); !name.empty()) return add(R"(,"value":)", name);
+        addLiteral(R"(,"value":)", std::to_string(static_cast<std::int32_t>(record.number)));
     }
   }
 
