@@ -213,8 +213,8 @@ std::vector<std::optional<std::string_view>> messagesIn(std::string_view stream)
       messages.emplace_back();
       break;
     }
-    messages.emplace_back(stream.substr(length, size));
-    stream.remove_prefix(length + size);
+    messages.emplace_back(stream.substr(length, static_cast<std::size_t>(size)));
+    stream.remove_prefix(length + messages.back()->size());
   }
   return messages;
 }
