@@ -183,7 +183,7 @@ TEST(DecodeLimits, AreFarAboveThePeakWhateverTheOrderOfArrival) {
     const HeapMeter meter;
     const auto group = Group::parse(row.input);
     ASSERT_TRUE(group);
-    EXPECT_LE(meter.peakBytes(), meter.liveBytes() * 3 / 2 + 2000);
+    EXPECT_LE(meter.peakBytes(), meter.liveBytes() * 3 / 2 + 4096);  // a large block is whole pages
   }
 }
 
