@@ -33,17 +33,20 @@ std::optional<std::uint64_t> numberOf(std::optional<Value> value) {
   if (!value) return std::nullopt;
   if (value->kind() == Value::Kind::number) {
     const auto number = value->integer();
-    return number && *number >= 0 ? std::optional(static_cast<std::uint64_t>(*number)) : std::nullopt;
+    if (number && *number >= 0) return static_cast<std::uint64_t>(*number);
+    return std::nullopt;
   }
   if (value->kind() != Value::Kind::text) return std::nullopt;
   const std::string_view digits = value->text();
   std::uint64_t number = 0;
   const auto [end, status] = std::from_chars(digits.data(), digits.data() + digits.size(), number);
-  return status == std::errc() && end == digits.data() + digits.size() ? std::optional(number) : std::nullopt;
+  if (status == std::errc() && end == digits.data() + digits.size()) return number;
+  return std::nullopt;
 }
 
 std::optional<std::string> bytesOfBase64(std::optional<Value> value) {
-  return value && value->kind() == Value::Kind::text ? spelling::decodeBase64(value->text()) : std::nullopt;
+  if (value && value->kind() == Value::Kind::text) return spelling::decodeBase64(value->text());
+  return std::nullopt;
 }
 
 // Appends the bytes of an unknown field that is shown so. Answers what is wrong with it, if anything is.

@@ -15,11 +15,9 @@ namespace orv::inline v0::json {
 
 namespace {
 
-// Characters that would act on a terminal, or end a line there or in a script, rather than be shown.
-bool isControl(char32_t codePoint) {
-  return codePoint < 0x20 || (codePoint >= 0x7F && codePoint < 0xA0) || codePoint == 0x2028 ||
-         codePoint == 0x2029;
-}
+// Of the characters that do not stand for themselves: those that would act on a terminal, or end a line there or in a
+// script, rather than be shown.
+bool isControl(char32_t codePoint) { return codePoint < 0xA0 || codePoint == 0x2028 || codePoint == 0x2029; }
 
 // ASCII that stands for itself.
 bool standsForItself(char c) { return c >= 0x20 && c < 0x7F && c != '"' && c != '\\'; }

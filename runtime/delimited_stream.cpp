@@ -28,7 +28,7 @@ class DelimitedReader::Source {
       const std::ptrdiff_t count =
           read_(std::span(static_cast<std::byte*>(buffer), static_cast<std::size_t>(size)));
       const bool isPossible = count >= 0 && count <= size;
-      hasFailed_ = hasFailed_ || !isPossible;
+      hasFailed_ = !isPossible;  // nobody reads on after a failure
       return isPossible ? static_cast<int>(count) : -1;
     }
     bool hasFailed() const { return hasFailed_; }

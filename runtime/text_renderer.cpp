@@ -147,7 +147,7 @@ class TextRenderer::UnknownFieldsRenderer {
         renderer_.close();
         return isWhole;
       }
-      case WireType::endGroup: break;
+      case WireType::endGroup: break;  // not covered: renderRecords ends at it
     }
     return false;
   }

@@ -237,7 +237,9 @@ TEST(Json, RefusesDeepNestingAndLongInputInTime) {
     outside += "{\"" + std::string(50, 'n') + "\":";
     inside += '}';
   }
-  EXPECT_LT(outcome<Group>(outside + "{\"x\":0,\"x\":0}" + inside).size(), 300U);
+  const std::string twice = outcome<Group>(outside + "{\"x\":0,\"x\":0}" + inside);
+  EXPECT_LT(twice.size(), 300U);
+  EXPECT_TRUE(twice.starts_with("$…n")) << twice;
   const std::string name(100'000, 'n');
   EXPECT_EQ(outcome<Group>("{\"" + name + "\":0}"), "$[\"" + name.substr(0, 60) + "…\"]: unknown field");
 }
@@ -267,6 +269,12 @@ TEST(Json, ShowsNothingThatActsOnATerminal) {
   // Quote, backslash, escape, delete, a control character of two bytes, line and paragraph separators, the names.
   EXPECT_EQ(rendered<Member>("0A 10 22 5C 1B 7F C2 9B E2 80 A8 E2 80 A9 0D 0A 09 20"),
             R"({"handle":"\"\\\u001b\u007f\u009b\u2028\u2029\r\n\t "})");
+  EXPECT_EQ(rendered<Member>("0A 04 C2 A0 C3 A9"), "{\"handle\":\"\u00A0\u00E9\"}");
+  // Of what stands in no message nobody knows whether it is a secret.
+  std::string output;
+  json::Renderer renderer(output, {.hidesSecrets = true});
+  EXPECT_TRUE(renderer.visitSingularBoolField(true, 7));
+  EXPECT_NE(output.find(R"("7":"<redacted>")"), std::string::npos) << output;
 }
 
 TEST(Json, ShowsUnknownFieldsOnDemand) {

@@ -146,6 +146,10 @@ TEST(Printing, CutsWhatIsTooLongAndLetsItCostNothing) {
   for (const std::string& bytes : cases) {
     SCOPED_TRACE(toHex(bytes.substr(0, 100)));
     const Group group = Group::parse(bytes).value();
+    std::string reversible;
+    TextRenderer small(reversible, {.isReversible = true, .maximumSizeInBytes = 5});
+    EXPECT_TRUE(group.traverse(small));
+    EXPECT_LE(reversible.size(), std::string_view("12345…").size());
     for (const bool isOneLine : {false, true}) {
       const auto rendered = [&](std::size_t maximum) {
         std::string text = "before ";
