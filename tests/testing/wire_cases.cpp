@@ -171,6 +171,7 @@ std::span<const MalformedCase> malformedCases() {
       {"wire type 6 of a field that some define", "0E 00", reservedWireType, 0},
       {"wire type 7 of a field that some define", "17 00", reservedWireType, 0},
       {"wire type 6 of a long tag", "FE 80 00 00", reservedWireType, 0},
+      {"wire type 7 of the highest tag", "FF FF FF FF 0F", reservedWireType, 0},
       {"a group without an end", "7B", unterminatedGroup, 1},
       {"a group that is not ended after a field", "7B 78 00", unterminatedGroup, 3},
       {"the inner of two groups is ended", "7B 7B 7C", unterminatedGroup, 3},
