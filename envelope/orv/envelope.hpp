@@ -16,8 +16,8 @@
 #include <orv/connection_request.hpp>
 #include <orv/connection_response.hpp>
 #include <orv/group.hpp>
-#include <orv/internal/bad_access.hpp>
 #include <orv/internal/printing.hpp>
+#include <orv/internal/standard.hpp>
 #include <orv/join_request.hpp>
 #include <orv/join_response.hpp>
 #include <orv/session_message.hpp>

@@ -12,8 +12,8 @@
 #include <type_traits>
 
 #include <orv/hasher.hpp>
-#include <orv/internal/compiler.hpp>
 #include <orv/internal/inline_bytes.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

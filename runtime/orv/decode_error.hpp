@@ -11,7 +11,7 @@
 #include <string_view>
 
 #include <orv/descriptor.hpp>
-#include <orv/internal/bad_access.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

@@ -11,7 +11,7 @@
 
 #include <orv/byte_buffer.hpp>
 #include <orv/decode_limits.hpp>
-#include <orv/internal/compiler.hpp>
+#include <orv/internal/standard.hpp>
 #include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {

@@ -13,7 +13,7 @@
 #include <orv/decode_limits.hpp>
 #include <orv/delimited_parser.hpp>
 #include <orv/delimited_writer.hpp>
-#include <orv/internal/compiler.hpp>
+#include <orv/internal/standard.hpp>
 #include <orv/stream_error.hpp>
 
 namespace orv::inline v0 {

@@ -9,7 +9,7 @@
 #include <string_view>
 
 #include <orv/encode_error.hpp>
-#include <orv/internal/compiler.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

@@ -6,7 +6,7 @@
 #include <iosfwd>
 #include <string_view>
 
-#include <orv/internal/bad_access.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <string_view>
 
-#include <orv/internal/compiler.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

@@ -8,7 +8,7 @@
 #include <string_view>
 
 #include <orv/decode_error.hpp>
-#include <orv/internal/bad_access.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

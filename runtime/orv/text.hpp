@@ -11,9 +11,8 @@
 #include <string_view>
 
 #include <orv/hasher.hpp>
-#include <orv/internal/bad_access.hpp>
-#include <orv/internal/compiler.hpp>
 #include <orv/internal/inline_bytes.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0 {
 

@@ -8,8 +8,8 @@
 #include <utility>
 
 #include <orv/decode_error.hpp>
-#include <orv/internal/compiler.hpp>
 #include <orv/internal/seam.hpp>
+#include <orv/internal/standard.hpp>
 #include <orv/wire_reader.hpp>
 
 namespace orv::inline v0 {

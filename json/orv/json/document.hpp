@@ -9,7 +9,7 @@
 #include <string_view>
 
 #include <orv/decode_limits.hpp>
-#include <orv/internal/compiler.hpp>
+#include <orv/internal/standard.hpp>
 #include <orv/json/error.hpp>
 
 namespace orv::inline v0::json {

@@ -7,8 +7,8 @@
 #include <string>
 #include <string_view>
 
-#include <orv/internal/bad_access.hpp>
 #include <orv/internal/printing.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0::json {
 

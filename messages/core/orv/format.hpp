@@ -15,7 +15,7 @@
 
 #include <orv/enumeration.hpp>
 #include <orv/field.hpp>
-#include <orv/internal/bad_access.hpp>
+#include <orv/internal/standard.hpp>
 #include <orv/stream_error.hpp>
 
 namespace orv::inline v0::internal {

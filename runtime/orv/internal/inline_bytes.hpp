@@ -13,7 +13,7 @@
 #include <type_traits>
 #include <utility>
 
-#include <orv/internal/compiler.hpp>
+#include <orv/internal/standard.hpp>
 
 namespace orv::inline v0::internal {
 
