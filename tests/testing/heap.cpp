@@ -34,9 +34,13 @@ void* operator new(std::size_t size) {
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
   return allocationsLeft == 0 ? nullptr : operator new(size);
 }
+// Those for arrays do the same by themselves, but where a sanitizer brings its own.
+void* operator new[](std::size_t size) { return operator new(size); }
 void operator delete(void* block) noexcept { forget(block); }
 void operator delete(void* block, std::size_t) noexcept { forget(block); }
 void operator delete(void* block, const std::nothrow_t&) noexcept { forget(block); }
+void operator delete[](void* block) noexcept { forget(block); }
+void operator delete[](void* block, std::size_t) noexcept { forget(block); }
 
 namespace orv::test {
 
