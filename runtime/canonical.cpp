@@ -58,6 +58,11 @@ void orderMarks(std::vector<char32_t>& codePoints) {
   }
 }
 
+// libstdc++ 12 orders the vectors themselves by a quarter of their bytes where the highest byte comes first.
+std::u32string_view asString(const std::vector<char32_t>& codePoints) {
+  return {codePoints.data(), codePoints.size()};
+}
+
 }  // namespace
 
 std::vector<char32_t> canonicalDecomposition(std::string_view utf8) {
@@ -86,7 +91,7 @@ std::strong_ordering canonicalOrder(std::string_view left, std::string_view righ
   left.remove_prefix(shared);
   right.remove_prefix(shared);
   if (utf8::isAscii(left) && utf8::isAscii(right)) return left <=> right;
-  return canonicalDecomposition(left) <=> canonicalDecomposition(right);
+  return asString(canonicalDecomposition(left)) <=> asString(canonicalDecomposition(right));
 }
 
 }  // namespace orv
